@@ -1,0 +1,57 @@
+#pragma once
+
+#include <HostSources/VRecording.h>
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace HostSources
+{
+
+/// What a recording holds, in figures, for people and programs to read.
+struct VRecordingInfo
+{
+  struct VGap
+  {
+    std::string Label;
+    std::uint64_t Missing = 0;
+  };
+  struct VPlate
+  {
+    std::string Name;
+    std::uint32_t Type = 0;
+    CoreMoxelTypes::D3 Corners[4]; ///< mm, world
+    CoreMoxelTypes::D3 Origin;     ///< mm, plate frame
+    std::uint64_t SampleCount = 0;
+    double PeakForce = 0; ///< greatest |Fz|, N
+    std::uint64_t PeakSample = 0;
+    std::int64_t PeakFrame = 0;    ///< index from 0
+    CoreMoxelTypes::D3 PeakCentre; ///< mm, world; NaN where there is none
+  };
+
+  std::string Name, Format, Form, Unit;
+  std::uint64_t PointCount = 0;
+  std::vector< std::string > Labels;
+  std::int64_t FrameCount = 0, FirstFrame = 0, LastFrame = 0;
+  double RateHz = 0, DurationSeconds = 0;
+  std::uint64_t SampleCount = 0, GapCount = 0, UnlabelledCount = 0;
+  std::vector< VGap > Gaps; ///< the points that have any
+  VRecordingBounds Bounds;
+  double AnalogRateHz = 0;
+  std::vector< VAnalogChannel > AnalogChannels;
+  std::vector< VPlate > ForcePlates;
+  std::vector< VRecordingEvent > Events;
+  EUpAxis UpAxis = EUpAxis::Z;
+  std::string UpAxisReason;
+  std::vector< std::string > Notes;
+
+  /// Lines for a terminal, ending in a line feed.
+  std::string Text() const;
+  /// One JSON object, indented; numbers that are not finite become null.
+  std::string Json() const;
+};
+
+VRecordingInfo DescribeRecording( const VRecording& i_rRecording );
+
+} // namespace HostSources
