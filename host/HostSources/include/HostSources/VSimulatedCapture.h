@@ -1,0 +1,59 @@
+#pragma once
+
+#include <HostSources/IFrameSource.h>
+
+#include <cstdint>
+#include <memory>
+
+namespace HostSources
+{
+
+/// What the simulated capture shows. Values outside their range are moved to its nearer end.
+struct VSimulatedCaptureOptions
+{
+  std::uint32_t Seed = 1;
+  std::uint32_t Cameras = 12;     ///< 0 to 256
+  std::uint32_t Performers = 2;   ///< 0 to 16
+  double RateHz = 120;            ///< 25 to 1000
+  double NoiseMm = 0.3;           ///< standard deviation of a reconstruction on each axis, 0 to 50
+  double GapProbability = 0.0005; ///< that a marker begins a gap of up to a fifth of a second in a fifth of a second
+  std::uint32_t ExtraPoints = 3;  ///< unlabelled points that come and go, 0 to 1000
+  bool bObjects = true;           ///< a prop and a calibration wand
+  bool bForcePlates = true;
+};
+
+/// A capture without hardware: people who walk in circles on a floor of 6 by 6 m, within a ring of cameras.
+///
+/// Never ends; the same options and the same frame give the same values, in whatever order frames are asked for.
+/// z is up, millimetres. `SetUpAxis` changes what the state claims (0x1029), not the points.
+///
+/// Each state holds: 0x1000 and 0x100a of each camera (names "Camera 1", ... under the device selector); 0x1012 and
+/// 0x1013 of each performer (names "Ada", "Ben", ... under the object selector); 0x1023 and 0x1025 of the two plates
+/// "Plate 1" and "Plate 2"; 0x1029; 0x1031; 0x100d and 0x100f. A label's `SubjectId` is `VSubject::Id`, its `MarkerId`
+/// the index into `VSubject::Markers`, which is also `VMarker::Id`. Prop, wand and extra points have no label.
+/// 0x1025 holds the samples of the frame's own time, at a whole multiple of the rate near 1000 Hz. All but 0x100d,
+/// 0x100f and 0x1025 are the same objects in every state; 0x100f and 0x1025 are handed on while nothing changed.
+class VSimulatedCapture final : public IFrameSource
+{
+public:
+  explicit VSimulatedCapture( const VSimulatedCaptureOptions& i_rOptions = {} );
+  ~VSimulatedCapture() override;
+
+  /// As they were taken, within their ranges.
+  const VSimulatedCaptureOptions& Options() const;
+
+  std::string Name() const override;
+  double RateHz() const override;
+  std::int64_t FrameCount() const override { return -1; }
+  std::int64_t FrameNumber( std::int64_t i_Index ) const override { return i_Index; }
+  EUpAxis UpAxis() const override;
+  std::string UpAxisReason() const override;
+  void SetUpAxis( EUpAxis i_Axis ) override;
+  ZEK::IResult MakeState( std::int64_t i_Index, const VStateMaker& i_rMaker, ZEK::VFlowStateRef& o_rState ) override;
+
+private:
+  struct VImpl;
+  std::unique_ptr< VImpl > m_pImpl;
+};
+
+} // namespace HostSources
