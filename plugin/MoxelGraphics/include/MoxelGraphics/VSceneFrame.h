@@ -1,0 +1,129 @@
+#pragma once
+
+#include <MoxelGraphics/ETracking.h>
+#include <MoxelGraphics/VSceneOptions.h>
+#include <MoxelGraphics/VSelectionRegistry.h>
+
+#include <ZEK/Selection.h>
+
+#include <QtCore/QPoint>
+#include <QtCore/QSize>
+#include <QtCore/QString>
+#include <QtCore/QVariantMap>
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+class QOpenGLContextGroup;
+class QOpenGLFramebufferObject;
+
+namespace CoreGraphics
+{
+class VCameraController;
+class VRenderContext;
+} // namespace CoreGraphics
+
+namespace MoxelGraphics
+{
+class VMoxelScene;
+
+/// What a view asks of its next frame. Points are pixels of the frame from its top left.
+struct VFrameInput
+{
+  bool bVisible = true;
+  bool bReporting = false; ///< measure with glFinish after each stage
+  VSceneOptions Options;
+  QPoint Pointer;
+  QPoint BandStart;
+  int PickMode = EPickNone;
+  int PreselectColour = 0; ///< 0 no modifier, 1 Shift, 2 Shift and Control, 3 Control
+  float PixelRatio = 1.0f;
+  ETracking Tracking = ETrackNone;
+  ZEK::VSelection TrackedSelection;
+  bool bFit = false; ///< move the camera so that the tracked selection fills the view
+};
+
+/// What the last pick found.
+struct VPickResult
+{
+  int Mode = -1; ///< the pick mode of the frame that picked; -1 when none did
+  ZEK::VSelection Selection;
+  std::vector< std::string > Labels;
+  std::vector< std::uint32_t > Ids;
+  int Layers = 0;
+};
+
+struct VFrameFigures
+{
+  double UpdateMs = 0; ///< bringing the render types up to date
+  double SelectMs = 0;
+  double HighlightMs = 0;
+  double DrawMs = 0;
+  std::uint64_t DrawCalls = 0; ///< of the whole frame
+  std::uint64_t BytesUploaded = 0;
+  std::uint64_t Frames = 0; ///< drawn since the start
+};
+
+/// Draws the frames of one view of a scene: the fixed sequence of picking, highlight mask, visible passes and
+/// overlay. Runs in any current OpenGL context, with or without Qt Quick: one object per view, all calls with the
+/// same context current. Thread: render thread.
+class VSceneFrame
+{
+public:
+  VSceneFrame( std::shared_ptr< VMoxelScene > i_pScene,
+               std::shared_ptr< CoreGraphics::VCameraController > i_pController );
+  ~VSceneFrame();
+
+  /// Makes the off-screen targets for a frame of that size in device pixels. `Input` is read.
+  void Resize( QSize i_Size );
+  VFrameInput& Input() { return m_Input; }
+  const VFrameInput& Input() const { return m_Input; }
+
+  /// Draws into the target, which is bound and has the size of `Resize`. The caller's OpenGL state is not kept.
+  /// False when nothing was drawn: not visible, no size, or a context that the scene cannot be drawn in.
+  bool Render( QOpenGLFramebufferObject& io_rTarget );
+
+  const VPickResult& Result() const { return m_Result; }
+  const VFrameFigures& Figures() const { return m_Figures; }
+  /// Vendor, renderer, version, GLSL version, profile, width, height and samples; empty before the first frame.
+  const QVariantMap& Gl() const { return m_Gl; }
+  /// What a person should know about this view; empty when all is well.
+  const QString& Notice() const { return m_Notice; }
+  const std::shared_ptr< VMoxelScene >& Scene() const { return m_pScene; }
+  CoreGraphics::VCameraController& Controller() { return *m_pController; }
+  /// Null before the first frame.
+  CoreGraphics::VRenderContext* Context() { return m_pContext.get(); }
+
+private:
+  bool Prepare();
+  void ReadGl( const QOpenGLFramebufferObject& i_rTarget );
+  void UpdateCamera();
+  void SelectAndHighlight();
+  bool IsBand() const;
+  void PickPoint();
+  void PickBand();
+  bool PickLayer( const QRect& i_rBand );
+  void Resolve( bool i_bBand );
+  void DrawView();
+  void PaintOverlay( const QOpenGLFramebufferObject& i_rTarget );
+  void Release();
+
+  std::shared_ptr< VMoxelScene > m_pScene;
+  std::shared_ptr< CoreGraphics::VCameraController > m_pController;
+  std::unique_ptr< CoreGraphics::VRenderContext > m_pContext;
+  std::unique_ptr< QOpenGLFramebufferObject > m_pSelectionTarget;
+  std::unique_ptr< QOpenGLFramebufferObject > m_pOutlineTarget;
+  VFrameInput m_Input;
+  VPickResult m_Result;
+  VFrameFigures m_Figures;
+  QVariantMap m_Gl;
+  QString m_Notice;
+  QSize m_Size;
+  bool m_bRefused = false;
+  std::vector< std::uint32_t > m_Pixels;
+  std::vector< std::uint32_t > m_Found; ///< sorted
+};
+
+} // namespace MoxelGraphics

@@ -1,0 +1,180 @@
+#pragma once
+
+#include <MoxelGraphics/ETracking.h>
+#include <MoxelGraphics/VSceneOptions.h>
+
+#include <ZEK/Selection.h>
+
+#include <QtCore/QList>
+#include <QtCore/QPointF>
+#include <QtCore/QPointer>
+#include <QtCore/QVariantMap>
+#include <QtQml/QQmlPropertyMap>
+#include <QtQuick/QQuickFramebufferObject>
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace CoreGraphics
+{
+class VCameraController;
+}
+
+namespace MoxelGraphics
+{
+class VMoxelScene;
+class VSceneFrame;
+struct VPickResult;
+
+/// The QML item that shows one view of a scene and takes its input. Registered in QML as `SceneFramebufferObject`.
+///
+/// It is redrawn by its own `update()`; a timer must call that, updating the window alone redraws nothing.
+/// Thread: GUI thread; renderer and item meet in `synchronize` alone, and what the renderer found is announced by
+/// signals of a later turn.
+class VSceneFramebufferObject : public QQuickFramebufferObject
+{
+  Q_OBJECT
+  Q_PROPERTY( QObject* scene READ Scene WRITE SetScene )
+  Q_PROPERTY( QObject* cameraGrid READ CameraGrid WRITE SetCameraGrid )
+  Q_PROPERTY( QObject* sceneOptions READ SceneOptionsObject NOTIFY SceneOptionsChanged )
+  Q_PROPERTY( QString previewCamera READ PreviewCamera WRITE SetPreviewCamera NOTIFY PreviewCameraChanged )
+  Q_PROPERTY( int cameraType READ CameraType WRITE SetCameraType )
+  Q_PROPERTY( QString toolTipText READ ToolTipText NOTIFY ToolTipTextChanged )
+  Q_PROPERTY( QPoint mousePos READ MousePos NOTIFY MouseMoved )
+  Q_PROPERTY( bool showCameraNumbers READ ShowCameraNumbers WRITE SetShowCameraNumbers NOTIFY ShowCameraNumbersChanged )
+  Q_PROPERTY( QList< QObject* > cameraObjects READ CameraObjects NOTIFY CamerasChanged )
+  Q_PROPERTY( QList< QObject* > subjectObjects READ SubjectObjects NOTIFY SubjectsChanged )
+  Q_PROPERTY( bool focusSelection READ FocusSelection WRITE SetFocusSelection )
+  Q_PROPERTY( MoxelGraphics::ETracking tracking READ Tracking WRITE SetTracking )
+  Q_PROPERTY( QString notice READ Notice NOTIFY NoticeChanged )
+
+public:
+  explicit VSceneFramebufferObject( QQuickItem* i_pParent = nullptr );
+  ~VSceneFramebufferObject() override;
+
+  Renderer* createRenderer() const override;
+
+  QObject* Scene() const;
+  /// A `VMoxelScene`, taken once: the renderer keeps the first one that it was made with.
+  void SetScene( QObject* i_pScene );
+  QObject* CameraGrid() const { return m_pCameraGrid; }
+  void SetCameraGrid( QObject* i_pGrid ) { m_pCameraGrid = i_pGrid; }
+  QObject* SceneOptionsObject() const { return m_pOptionsMap; }
+  QQmlPropertyMap& OptionsMap() const { return *m_pOptionsMap; }
+  const VSceneOptions& Options() const { return m_Options; }
+  QString PreviewCamera() const { return m_PreviewCamera; }
+  void SetPreviewCamera( const QString& i_rURN );
+  int CameraType() const { return m_CameraType; }
+  /// The view type of the camera controller: 0 "Perspective" to 6 "Bottom". Others are ignored.
+  void SetCameraType( int i_Type );
+  QString ToolTipText() const { return m_ToolTipText; }
+  QPoint MousePos() const { return m_Pointer.toPoint(); }
+  bool ShowCameraNumbers() const { return m_bShowCameraNumbers; }
+  void SetShowCameraNumbers( bool i_bShow );
+  QList< QObject* > CameraObjects() const { return m_CameraObjects; }
+  QList< QObject* > SubjectObjects() const { return m_SubjectObjects; }
+  bool FocusSelection() const { return false; }
+  /// Every true asks once for the selection to be framed; nothing is kept.
+  void SetFocusSelection( bool i_bFocus );
+  ETracking Tracking() const { return m_Tracking; }
+  void SetTracking( ETracking i_Tracking );
+  QString Notice() const { return m_Notice; }
+
+  const std::shared_ptr< CoreGraphics::VCameraController >& Controller() const { return m_pController; }
+  /// What lies under the pointer or in the band, as of the last pick that was delivered.
+  const ZEK::VSelection& Preselection() const { return m_Preselection; }
+  const std::vector< std::string >& PickedLabels() const { return m_PickedLabels; }
+
+  /// Sets one option as a person would: the map, the record, bindings and the view follow.
+  Q_INVOKABLE void setOption( const QString& i_rKey, const QVariant& i_rValue );
+  /// To be called after options were restored as a whole: announces `SceneOptionsChanged` once.
+  void OptionsRestored();
+  /// Measures the stages of each frame with glFinish, which slows frames down. Off at first.
+  Q_INVOKABLE void setReporting( bool i_bOn ) { m_bReporting = i_bOn; }
+  /// "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "labels", "notice" of the last frame that
+  /// was synchronised; one more frame brings the figures of this one.
+  Q_INVOKABLE QVariantMap frameReport() const;
+
+public slots:
+  void OnFocusChanged();
+  void OnSceneOptionsMapChanged( const QString& i_rKey, const QVariant& i_rValue );
+
+signals:
+  void SceneOptionsChanged();
+  void PreviewCameraChanged();
+  void ToolTipTextChanged();
+  void MouseMoved();
+  void ShowCameraNumbersChanged();
+  void CamerasChanged();
+  void SubjectsChanged();
+  /// Emitted when a pick was committed.
+  void SelectionChanged();
+  void TrackSelectionChanged();
+  void NoticeChanged();
+
+protected:
+  void mousePressEvent( QMouseEvent* i_pEvent ) override;
+  void mouseMoveEvent( QMouseEvent* i_pEvent ) override;
+  void mouseReleaseEvent( QMouseEvent* i_pEvent ) override;
+  void mouseUngrabEvent() override;
+  void mouseDoubleClickEvent( QMouseEvent* i_pEvent ) override;
+  void wheelEvent( QWheelEvent* i_pEvent ) override;
+  void keyPressEvent( QKeyEvent* i_pEvent ) override;
+  void keyReleaseEvent( QKeyEvent* i_pEvent ) override;
+  void hoverEnterEvent( QHoverEvent* i_pEvent ) override;
+  void hoverMoveEvent( QHoverEvent* i_pEvent ) override;
+  void hoverLeaveEvent( QHoverEvent* i_pEvent ) override;
+
+private:
+  friend class VSceneFramebufferRenderer;
+  struct VPicked;
+
+  void TakeModifiers( Qt::KeyboardModifiers i_Modifiers );
+  void SetPointer( const QPointF& i_rPosition );
+  /// Sync phase: hands the frame its orders, takes what the last one found.
+  void FillInput( VSceneFrame& io_rFrame );
+  void TakeResult( const VSceneFrame& i_rFrame );
+  void TakeReport( VSceneFrame& i_rFrame );
+  void CheckGraphicsApi();
+  void SetNotice( const QString& i_rNotice );
+  /// GUI thread, a later turn: what a pick changes.
+  void ApplyPick( const VPicked& i_rPicked );
+  void SetToolTip( const std::vector< std::string >& i_rLabels );
+
+  QPointer< QObject > m_pSceneObject;
+  std::shared_ptr< VMoxelScene > m_pScene;
+  QPointer< QObject > m_pCameraGrid;
+  std::shared_ptr< CoreGraphics::VCameraController > m_pController;
+  QQmlPropertyMap* m_pOptionsMap = nullptr;
+  VSceneOptions m_Options;
+  QString m_PreviewCamera;
+  int m_CameraType = 0;
+  QString m_ToolTipText;
+  QString m_Notice;
+  QList< QObject* > m_CameraObjects;
+  QList< QObject* > m_SubjectObjects;
+  bool m_bShowCameraNumbers = false;
+  bool m_bReporting = false;
+  bool m_bApiRefused = false;
+
+  QPointF m_Pointer;
+  QPointF m_PressPoint;
+  QPointF m_BandStart;
+  int m_PickMode = 0;
+  int m_PreselectColour = 0;
+  ZEK::ESelectionEdit m_Edit = ZEK::ESelectionEdit::Replace;
+  bool m_bClickPending = false;
+  bool m_bFocusPending = false;
+  ETracking m_Tracking = ETrackNone;
+  ETracking m_SyncedTracking = ETrackNone;
+  ZEK::VSelection m_TrackedSelection;
+
+  ZEK::VSelection m_Preselection;
+  std::vector< std::string > m_PickedLabels;
+  ZEK::VSelection m_DeliveredSelection;
+  std::vector< std::string > m_DeliveredLabels;
+  QVariantMap m_Report;
+};
+
+} // namespace MoxelGraphics

@@ -1,0 +1,121 @@
+#pragma once
+
+// How render types draw many spheres: each owns a VSphereBatch per kind, fills it when its data change, and hands it
+// to the scene's VSphereHelper in Render. One batch is one buffer write when it changed and one instanced draw; a
+// batch that did not change touches no buffer, and a batch without anything selected is not drawn into the
+// highlight mask at all.
+
+#include <MoxelGraphics/VSelectionRegistry.h>
+
+#include <QtGui/QMatrix4x4>
+
+#include <array>
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <vector>
+
+class QRect;
+
+namespace CoreGraphics
+{
+class VRenderContext;
+class VResources;
+} // namespace CoreGraphics
+
+namespace MoxelGraphics
+{
+class VMoxelScene;
+
+/// How the spheres of a batch are sized in one draw.
+struct VSphereSizing
+{
+  float FixedRadius = -1.0f; ///< mm; negative: each sphere's own
+  float Scale = 1.0f;
+  friend bool operator==( const VSphereSizing&, const VSphereSizing& ) = default;
+};
+
+/// The spheres of one kind. Geometry, colours and selection are set apart, and each is taken to the GPU only after
+/// it was set anew. Thread: render thread; OpenGL objects are made when it is first drawn.
+class VSphereBatch
+{
+public:
+  VSphereBatch();
+  ~VSphereBatch();
+
+  /// World positions and radii in mm. A sphere whose position is not finite is kept, so that indices hold, and is
+  /// neither drawn nor picked. Colours and flags are kept as far as the count is the same.
+  void SetSpheres( std::span< const VScenePoint > i_Spheres );
+  /// One colour for all, red, green, blue, alpha, 0 to 1.
+  void SetColour( const std::array< float, 4 >& i_rColour );
+  /// A colour each, 0xAABBGGRR; as many as there are spheres, others are ignored.
+  void SetColours( std::span< const std::uint32_t > i_Colours );
+  /// The ids of the present state: sphere i has `i_FirstId` + i, or none of them when it is 0.
+  /// `i_Flags` is empty, or holds for each sphere the bits of its word from EIdSelected up, shifted down by 21.
+  void SetIds( std::uint32_t i_FirstId, std::span< const std::uint8_t > i_Flags );
+
+  std::size_t Count() const { return m_Spheres.size(); }
+  bool IsEmpty() const { return m_Spheres.empty(); }
+  const std::vector< VScenePoint >& Spheres() const { return m_Spheres; }
+  std::uint32_t FirstId() const { return m_FirstId; }
+  /// Whether any sphere is selected or preselected.
+  bool AnyMarked() const { return m_bAnyMarked; }
+
+private:
+  friend class VSphereHelper;
+  struct VGl;
+
+  void MeasureBox();
+
+  std::vector< VScenePoint > m_Spheres;
+  std::vector< std::uint32_t > m_Colours; ///< empty: one colour
+  std::array< float, 4 > m_Colour{ 1, 1, 1, 1 };
+  std::vector< std::uint8_t > m_Flags; ///< as many as spheres, or empty: none set
+  std::uint32_t m_FirstId = 0;
+  bool m_bAnyMarked = false;
+  std::array< float, 3 > m_BoxMin{}, m_BoxMax{};
+  float m_LargestRadius = 0;
+  std::uint64_t m_SpheresGeneration = 1;
+  std::uint64_t m_ColoursGeneration = 1;
+  std::uint64_t m_FlagsGeneration = 1;
+  std::unique_ptr< VGl > m_pGl;
+};
+
+/// Draws batches of spheres, and knows what was drawn since the last clear so that a band can be tested against it.
+/// One per scene; the scene makes a new one for each of its views, so nobody keeps it.
+class VSphereHelper
+{
+public:
+  explicit VSphereHelper( std::shared_ptr< CoreGraphics::VResources > i_pResources );
+  ~VSphereHelper();
+
+  /// The start of a view: nothing is drawn yet.
+  void Clear();
+  /// Draws the batch as the context's render mode asks. The batch must live until the next `Clear`.
+  void Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene, VSphereBatch& io_rBatch,
+             const VSphereSizing& i_rSizing );
+  /// Appends the id of every sphere drawn since `Clear` whose centre lies in the rectangle, bounds included, unless
+  /// it lies behind the eye. The rectangle is in pixels of the context's frame, y up.
+  void PickInRect( const CoreGraphics::VRenderContext& i_rContext, const QRect& i_rRect,
+                   std::vector< std::uint32_t >& io_rIds ) const;
+
+private:
+  struct VGl;
+  struct VDrawn
+  {
+    const VSphereBatch* pBatch = nullptr;
+    QMatrix4x4 ViewProjection;
+  };
+
+  void MakeObjects();
+  void Upload( VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing );
+  void UploadFlags( VSphereBatch& io_rBatch, const VMoxelScene& i_rScene, int i_RenderMode );
+  bool IsNear( const CoreGraphics::VRenderContext& i_rContext, const VSphereBatch& i_rBatch,
+               const VSphereSizing& i_rSizing ) const;
+
+  std::shared_ptr< CoreGraphics::VResources > m_pResources;
+  std::unique_ptr< VGl > m_pGl;
+  std::vector< VDrawn > m_Drawn;
+};
+
+} // namespace MoxelGraphics
