@@ -1,0 +1,166 @@
+#include <Flow2Graphics/VFlowRenderReconstructions.h>
+
+#include <CoreMoxelTypes/FlowTypes.h>
+#include <MoxelGraphics/VMoxelScene.h>
+
+namespace Flow2Graphics
+{
+namespace
+{
+using CoreMoxelTypes::VReconstruction;
+using CoreMoxelTypes::VReconstructionLabelSet;
+using CoreMoxelTypes::VReconstructionSet;
+using MoxelGraphics::VScenePoint;
+using ZEK::EFlowTimeMatch;
+
+/// Labelled points whose marker has no radius of its own, mm.
+constexpr float DefaultMarkerRadius = 7.0F;
+constexpr unsigned FlagShift = 21;
+
+bool Take( ZEK::VFlowItemRef& io_rHeld, const ZEK::IFlowState& i_rState, std::uint32_t i_Tag )
+{
+  ZEK::VFlowItemRef New;
+  i_rState.FindItem( New, i_Tag, EFlowTimeMatch::Overlap );
+  const bool bOther = IsOtherValue( io_rHeld, New );
+  io_rHeld = std::move( New );
+  return bOther;
+}
+
+VScenePoint PointOf( const VReconstruction& i_rReconstruction )
+{
+  return { static_cast< float >( i_rReconstruction.Position.x ), static_cast< float >( i_rReconstruction.Position.y ),
+           static_cast< float >( i_rReconstruction.Position.z ), i_rReconstruction.Radius };
+}
+
+/// The flags of a range's members, empty when none has any.
+void MarkMembers( std::vector< std::uint8_t >& o_rFlags, const MoxelGraphics::IRangeResolver& i_rMembers,
+                  std::size_t i_Count, const MoxelGraphics::VSelectionRegistry& i_rRegistry )
+{
+  o_rFlags.clear();
+  for ( const MoxelGraphics::VSelectionRegistry::VMark& rMark : i_rRegistry.Marks() )
+  {
+    std::uint32_t Index = 0;
+    if ( i_rMembers.FindIndex( rMark.Item, Index ) )
+    {
+      o_rFlags.resize( i_Count, 0 );
+      o_rFlags[Index] = static_cast< std::uint8_t >( rMark.Flags >> FlagShift );
+    }
+  }
+}
+} // namespace
+
+void VFlowRenderReconstructions::Update( const ZEK::IFlowState& i_rState )
+{
+  if ( TakeItems( i_rState ) )
+  {
+    Rebuild();
+  }
+  GiveIds();
+}
+
+bool VFlowRenderReconstructions::TakeItems( const ZEK::IFlowState& i_rState )
+{
+  const bool bSet = Take( m_Set, i_rState, ZEK::FlowTag< CoreMoxelTypes::FlowReconstructionSet > );
+  const bool bLabels = Take( m_Labels, i_rState, ZEK::FlowTag< CoreMoxelTypes::FlowReconstructionLabelSet > );
+  const bool bSubjects = TakeSubjects( i_rState );
+  return bSet || bLabels || bSubjects;
+}
+
+bool VFlowRenderReconstructions::TakeSubjects( const ZEK::IFlowState& i_rState )
+{
+  std::vector< VLabellingSubject >& rSubjects = m_LabelledPoints.Subjects;
+  bool bOther = false;
+  std::size_t Count = 0;
+  constexpr std::uint32_t SubjectTag = ZEK::FlowTag< CoreMoxelTypes::FlowSubject >;
+  constexpr std::uint32_t DataTag = ZEK::FlowTag< CoreMoxelTypes::FlowSubjectApplicationData >;
+  ZEK::VFlowCursor It, End, DataIt, DataEnd;
+  i_rState.TagBegin( It, SubjectTag, EFlowTimeMatch::Overlap );
+  i_rState.TagEnd( End, SubjectTag, EFlowTimeMatch::Overlap );
+  i_rState.TagBegin( DataIt, DataTag, EFlowTimeMatch::Overlap );
+  i_rState.TagEnd( DataEnd, DataTag, EFlowTimeMatch::Overlap );
+  const auto DataOf = [&]( std::string_view i_Name ) -> ZEK::IFlowItem*
+  {
+    for ( ZEK::VFlowCursor Data = DataIt; Data != DataEnd; ++Data )
+    {
+      std::string_view Name;
+      if ( Data->pItem->Value().GetName( ZEK::EFlowNameObject, Name ) && Name == i_Name )
+      {
+        return Data->pItem;
+      }
+    }
+    return nullptr;
+  };
+  for ( ; It != End; ++It )
+  {
+    const auto* const pSubject = ZEK::FlowPayload< CoreMoxelTypes::VSubject >( It->pItem );
+    std::string_view Name;
+    if ( !pSubject || !FlowTimeMatches( EFlowTimeMatch::Overlap, It->Key, i_rState.GetKey() ) ||
+         !It->pItem->Value().GetName( ZEK::EFlowNameObject, Name ) )
+    {
+      continue;
+    }
+    VLabellingSubject& rSlot = Count < rSubjects.size() ? rSubjects[Count] : rSubjects.emplace_back();
+    const ZEK::VFlowItemRef Subject( It->pItem );
+    const ZEK::VFlowItemRef Data( DataOf( Name ) );
+    bOther = bOther || IsOtherValue( rSlot.Subject, Subject ) || IsOtherValue( rSlot.ApplicationData, Data );
+    rSlot = { Subject, Data, pSubject, ZEK::FlowPayload< CoreMoxelTypes::VSubjectApplicationData >( Data.Get() ) };
+    ++Count;
+  }
+  bOther = bOther || Count != rSubjects.size();
+  rSubjects.resize( Count );
+  return bOther;
+}
+
+void VFlowRenderReconstructions::Rebuild()
+{
+  m_UnlabelledPoints.Clear();
+  m_LabelledPoints.ClearPoints();
+  if ( const auto* const pSet = ZEK::FlowPayload< VReconstructionSet >( m_Set.Get() ) )
+  {
+    const std::vector< VReconstruction >& rItems = pSet->Items;
+    m_bLabelled.assign( rItems.size(), 0 );
+    if ( const auto* const pLabels = ZEK::FlowPayload< VReconstructionLabelSet >( m_Labels.Get() ) )
+    {
+      for ( const VReconstructionLabelSet::L& rLabel : pLabels->Labels )
+      {
+        if ( rLabel.Reconstruction >= rItems.size() || m_bLabelled[rLabel.Reconstruction] != 0 )
+        {
+          continue;
+        }
+        VScenePoint Point = PointOf( rItems[rLabel.Reconstruction] );
+        Point.Radius = Point.Radius > 0 ? Point.Radius : DefaultMarkerRadius;
+        m_bLabelled[rLabel.Reconstruction] = m_LabelledPoints.Add( rLabel, Point ) ? 1 : 0;
+      }
+    }
+    for ( std::size_t Index = 0; Index < rItems.size(); ++Index )
+    {
+      if ( m_bLabelled[Index] == 0 )
+      {
+        m_UnlabelledPoints.Points.push_back( PointOf( rItems[Index] ) );
+        m_UnlabelledPoints.Reconstruction.push_back( static_cast< std::uint32_t >( Index ) );
+        m_UnlabelledPoints.Ids.push_back( rItems[Index].Id );
+      }
+    }
+  }
+  SetReconstructions( m_UnlabelledPoints.Points );
+  SetLabelled( m_LabelledPoints.Points );
+  SetLabelledColours( m_LabelledPoints.Colours );
+}
+
+void VFlowRenderReconstructions::GiveIds()
+{
+  MoxelGraphics::VSelectionRegistry& rRegistry = m_rScene.Registry();
+  const auto Give = [&]( const auto& i_rPoints, std::vector< std::uint8_t >& io_rFlags )
+  {
+    MarkMembers( io_rFlags, i_rPoints, i_rPoints.Points.size(), rRegistry );
+    return i_rPoints.Points.empty()
+               ? 0
+               : rRegistry.AllocateRange( static_cast< std::uint32_t >( i_rPoints.Points.size() ), i_rPoints );
+  };
+  const std::uint32_t FirstUnlabelled = Give( m_UnlabelledPoints, m_UnlabelledFlags );
+  SetReconstructionIds( FirstUnlabelled, m_UnlabelledFlags );
+  const std::uint32_t FirstLabelled = Give( m_LabelledPoints, m_LabelledFlags );
+  SetLabelledIds( FirstLabelled, m_LabelledFlags );
+}
+
+} // namespace Flow2Graphics

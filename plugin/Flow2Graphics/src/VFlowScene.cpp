@@ -1,0 +1,138 @@
+#include <Flow2Graphics/VFlowScene.h>
+
+#include <Flow2Graphics/VFlowRenderFloorGrid.h>
+#include <Flow2Graphics/VFlowRenderReconstructions.h>
+
+#include <CoreMoxelTypes/FlowTypes.h>
+#include <MoxelGraphics/VRenderAxis.h>
+
+namespace Flow2Graphics
+{
+namespace
+{
+constexpr std::uint32_t UpIsY = 1;
+}
+
+VFlowScene::~VFlowScene() = default;
+
+void VFlowScene::Initialise( CoreGraphics::VRenderContext& io_rContext )
+{
+  VMoxelScene::Initialise( io_rContext );
+  CreateRenderTypes();
+}
+
+void VFlowScene::CreateRenderTypes()
+{
+  if ( !m_RenderList.empty() )
+  {
+    return;
+  }
+  // The order of the lines is the order of drawing and of updating: the floor lies under everything that follows, and
+  // the gizmo is drawn over it.
+  const auto pFloor = std::make_shared< VFlowRenderFloorGrid >( Resources() );
+  const auto pReconstructions = std::make_shared< VFlowRenderReconstructions >( *this );
+  const auto pAxis = std::make_shared< MoxelGraphics::VRenderAxis >( Resources() );
+
+  m_RenderList = { pFloor, pReconstructions, pAxis };
+  m_FlowRenderTypes = { pFloor, pReconstructions };
+}
+
+bool VFlowScene::ProcessPending()
+{
+  const bool bRan = VMoxelScene::ProcessPending();
+  if ( !TakeDirty() )
+  {
+    return bRan;
+  }
+  const ZEK::VFlowStateRef State = FetchState();
+  if ( State && State->ItemCount() != 0 )
+  {
+    UpdateFromState( *State, {} );
+  }
+  else
+  {
+    // Nothing to show yet: the last picture stays, and the next frame asks again.
+    MarkDirty();
+  }
+  return bRan;
+}
+
+void VFlowScene::UpdateFromState( const ZEK::IFlowState& i_rState, const VSubjectChanges& i_rChanges )
+{
+  ClearLabels();
+  Registry().Reset();
+  for ( const std::shared_ptr< IFlowRenderType >& rpType : m_FlowRenderTypes )
+  {
+    rpType->UpdateFromState( i_rState, i_rChanges );
+  }
+  ZEK::VFlowItemRef Axis;
+  i_rState.FindItem( Axis, ZEK::FlowTag< CoreMoxelTypes::FlowWorldAxis >, ZEK::EFlowTimeMatch::Overlap );
+  if ( const auto* const pAxis = ZEK::FlowPayload< CoreMoxelTypes::VWorldAxis >( Axis.Get() ) )
+  {
+    SetYUp( pAxis->Up == UpIsY );
+  }
+  emit Updated();
+}
+
+std::vector< MoxelGraphics::VScenePoint > VFlowScene::GetSelectionPositions( const ZEK::VSelection& i_rSelection )
+{
+  std::vector< MoxelGraphics::VScenePoint > Points;
+  for ( const ZEK::VSelectionItem& rItem : i_rSelection )
+  {
+    MoxelGraphics::VScenePoint Point;
+    if ( Registry().GetPosition( rItem, Point ) )
+    {
+      Points.push_back( Point );
+    }
+  }
+  return Points;
+}
+
+bool VFlowScene::GetSelectionPose( const ZEK::VSelection& i_rSelection, MoxelGraphics::VScenePose& o_rPose )
+{
+  return i_rSelection.size() == 1 && Registry().GetPose( i_rSelection.front(), o_rPose );
+}
+
+ZEK::VSelection VFlowScene::ResolveIds( std::span< const std::uint32_t > i_Ids, std::vector< std::string >& o_rLabels )
+{
+  return Registry().ResolveAll( i_Ids, o_rLabels );
+}
+
+std::vector< std::uint32_t > VFlowScene::SelectionItemsToIds( const ZEK::VSelection& i_rSelection )
+{
+  std::vector< std::uint32_t > Ids;
+  for ( const ZEK::VSelectionItem& rItem : i_rSelection )
+  {
+    if ( const std::uint32_t Id = Registry().FindId( rItem ) )
+    {
+      Ids.push_back( Id );
+    }
+  }
+  return Ids;
+}
+
+QString VFlowScene::GetSelectedCameraURN()
+{
+  ZEK::VSelection Cameras;
+  const auto& rpService = SelectionService();
+  if ( !rpService || !rpService->Get( ZEK::ISelectionService::EPrimary, { ZEK::ESelectCamera }, Cameras ) ||
+       Cameras.size() != 1 )
+  {
+    return {};
+  }
+  return QString::fromStdString( rpService->Text( Cameras.front() ) );
+}
+
+void VFlowScene::SelectDevice( const QString& i_rName, bool i_bPreselect )
+{
+  const auto& rpService = SelectionService();
+  if ( !rpService )
+  {
+    return;
+  }
+  const ZEK::VSelectionItem Item = rpService->FromName( i_rName.toStdString() );
+  rpService->Set( i_bPreselect ? ZEK::ISelectionService::ESecondary : ZEK::ISelectionService::EPrimary,
+                  Item.Kind != ZEK::ESelectNone ? ZEK::VSelection{ Item } : ZEK::VSelection{} );
+}
+
+} // namespace Flow2Graphics

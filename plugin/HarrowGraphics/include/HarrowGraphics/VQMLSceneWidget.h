@@ -1,0 +1,104 @@
+#pragma once
+
+#include <HarrowPluginInterface/IHarrowServices.h>
+#include <MoxelGraphics/VSceneFramebufferObject.h>
+#include <MoxelQtQuick/VQuickWidget.h>
+#include <ZEK/Selection.h>
+
+#include <QtCore/QPointer>
+#include <QtCore/QTimer>
+
+#include <memory>
+#include <string>
+
+namespace MoxelGraphics
+{
+class VMoxelScene;
+}
+
+namespace HarrowGraphics
+{
+
+/// The window kinds; they index the root document.
+enum EWindowKind : int
+{
+  EWindowKind3D = 0,
+  EWindowKindCameras = 1,
+  EWindowKindSubject = 2
+};
+
+/// What a scene widget is made from.
+struct VSceneWidgetArguments
+{
+  std::shared_ptr< MoxelGraphics::VMoxelScene > pScene;
+  std::shared_ptr< HarrowPluginInterface::IHarrowQuickHost > pQuickHost;
+  std::shared_ptr< ZEK::ISelectionService > pSelection;
+  std::shared_ptr< ZEK::IPostalService > pPostal;
+  std::shared_ptr< HarrowPluginInterface::IWidgetService > pWidgetService; ///< may be null
+  std::shared_ptr< HarrowPluginInterface::IActivityMode > pActivityMode;   ///< may be null
+  EWindowKind Kind = EWindowKind3D;
+  std::uint32_t FeatureFlags = 0;
+  bool bVolumeManipulator = false;
+};
+
+/// The widget of one scene window: publishes the scene and the modes to QML, loads the root document, repaints it
+/// every 16 ms and carries out the workspace commands of scene windows. Thread: GUI.
+class VQMLSceneWidget : public MoxelQtQuick::VQuickWidget
+{
+  Q_OBJECT
+  Q_PROPERTY( bool focusSupported READ focusSupported CONSTANT )
+  Q_PROPERTY( bool trackingSupported READ trackingSupported CONSTANT )
+  Q_PROPERTY( uint poseIndex READ poseIndex WRITE setPoseIndex NOTIFY PoseIndexChanged )
+
+public:
+  explicit VQMLSceneWidget( VSceneWidgetArguments i_Arguments );
+  ~VQMLSceneWidget() override;
+
+  bool focusSupported() const { return true; }
+  bool trackingSupported() const { return m_Arguments.Kind == EWindowKind3D; }
+  uint poseIndex() const { return m_PoseIndex; }
+  void setPoseIndex( uint i_Index );
+
+  /// The item of the loaded document; null until the document is ready, and when it failed.
+  MoxelGraphics::VSceneFramebufferObject* SceneItem() const { return m_pSceneItem; }
+  /// Whether the text was a command of this window kind whose condition held.
+  bool ExecuteCommand( const std::string& i_rText );
+  /// The path of a drag that can be dropped here: exactly one local file that ends in ".fbx", else empty.
+  static QString DroppedMesh( const QMimeData* i_pMimeData );
+
+public slots:
+  void OnViewSettingsToggled( bool i_bChecked );
+  void OnCameraTypeChanged( int i_Index );
+  void OnFocus();
+  bool altToSelect() const;
+  /// Swaps navigation and selection between the plain mouse and Alt, in every view.
+  void setAltToSelect( bool i_bOn );
+  bool selectionHasBounds() const;
+  bool selectionHasPose() const;
+  void setTracking( MoxelGraphics::ETracking i_Tracking );
+  MoxelGraphics::ETracking tracking() const;
+  /// Repaints the scene: the widget's own repaint would show the last picture again.
+  void update();
+
+signals:
+  void PoseIndexChanged();
+
+protected:
+  void dragEnterEvent( QDragEnterEvent* io_pEvent ) override;
+  void dropEvent( QDropEvent* io_pEvent ) override;
+
+private:
+  void PublishContext();
+  void FindSceneItem();
+  void OnActivityChanged();
+  bool Execute3DCommand( const std::string& i_rText );
+  void ScaleManipulator( float i_Factor );
+
+  VSceneWidgetArguments m_Arguments;
+  QTimer m_UpdateTimer;
+  QPointer< MoxelGraphics::VSceneFramebufferObject > m_pSceneItem;
+  uint m_PoseIndex = 0;
+  ZEK::VConnection m_ActivityConnection;
+};
+
+} // namespace HarrowGraphics

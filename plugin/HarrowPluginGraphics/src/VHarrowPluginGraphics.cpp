@@ -1,0 +1,73 @@
+#include "VHarrowPluginGraphics.h"
+
+#include <CoreGraphics/VHarrowInteractionMapper.h>
+#include <HarrowGraphics/VSceneManager.h>
+#include <HarrowGraphics/VSceneWindowContentFactory.h>
+#include <HarrowPluginInterface/IHarrowApplication.h>
+#include <HarrowPluginInterface/IHarrowWorkspace.h>
+#include <MoxelGraphics/VSceneFramebufferObject.h>
+#include <ZEK/ResultQml.h>
+
+#include <QtQml/QQmlEngine>
+
+namespace HarrowPluginGraphics
+{
+
+bool VHarrowPluginGraphics::RegisterGraphicsTypes( HarrowPluginInterface::IHarrowApplication& io_rApplication )
+{
+  CoreGraphics::SetInteractionMapper( ZEK::MakeShared< CoreGraphics::VHarrowInteractionMapper >(
+      io_rApplication.PostalService(), io_rApplication.Store() ) );
+  // A QML type cannot be taken back, so a module that stays loaded registers it once.
+  [[maybe_unused]] static const int Registered =
+      qmlRegisterType< MoxelGraphics::VSceneFramebufferObject >( "Flow2Graphics", 1, 0, "SceneFramebufferObject" );
+  ZEK::IO::RegisterResultQml();
+  return true;
+}
+
+bool VHarrowPluginGraphics::CreateWorkspaceContent( HarrowPluginInterface::IHarrowApplication& io_rApplication,
+                                                    HarrowPluginInterface::IHarrowWorkspace& io_rWorkspace )
+{
+  const auto pFactories = io_rWorkspace.ContentFactories();
+  const auto pResources = io_rWorkspace.RenderResources();
+  std::uint32_t Flags = 0;
+  io_rApplication.FeatureFlagSource()->GetFlags( Flags );
+
+  const auto pSceneManager = std::make_shared< HarrowGraphics::VSceneManager >( io_rApplication, io_rWorkspace );
+  pFactories->AddFactory(
+      "3D View", std::make_shared< HarrowGraphics::VSceneWindowContentFactory >(
+                     io_rApplication, io_rWorkspace, "3D View", pSceneManager, HarrowGraphics::EWindowKind3D ) );
+
+  if ( const auto pManipulator = io_rApplication.ObjectManipulator();
+       pManipulator &&
+       ( Flags & ( HarrowPluginInterface::EFeatureObjects | HarrowPluginInterface::EFeatureProps ) ) != 0 )
+  {
+    io_rWorkspace.Commands()->KeyedCommands()->AddCommand(
+        "Workspace3d", "Toggle Object Manipulator",
+        [pWeak = std::weak_ptr( pManipulator )]
+        {
+          if ( const auto pLocked = pWeak.lock() )
+          {
+            pLocked->SetShown( !pLocked->IsShown() );
+          }
+        },
+        "M" );
+  }
+  if ( io_rApplication.DeveloperMode() )
+  {
+    io_rWorkspace.Commands()->AddAction(
+        { "&Developer", "Reload &Shaders" },
+        [pResources]
+        {
+          pResources->Reload();
+        },
+        {}, "" );
+  }
+  return true;
+}
+
+void VHarrowPluginGraphics::ReleaseGraphics()
+{
+  CoreGraphics::SetInteractionMapper( nullptr );
+}
+
+} // namespace HarrowPluginGraphics
