@@ -1,0 +1,159 @@
+#include "VItemPool.h"
+
+#include "VTypedItem.h"
+
+#include <ZEK/DebugServices.h>
+
+#include <functional>
+#include <random>
+
+namespace HostFlow
+{
+namespace
+{
+
+/// Not zero, and another one for each process, so that ids of two processes do not meet.
+std::uint32_t ProcessSalt()
+{
+  return std::random_device()() | 1u;
+}
+
+std::size_t TableSlot( std::uint32_t i_Tag )
+{
+  return ( i_Tag ^ ( i_Tag >> 8 ) ) & 0xff;
+}
+
+} // namespace
+
+std::uint64_t NameHashPart( std::uint32_t i_Selector, std::string_view i_Name )
+{
+  return i_Name.empty() ? 0 : i_Selector * 0x9e3779b97f4a7c15u * ( std::hash< std::string_view >()( i_Name ) | 1u );
+}
+
+VPooledItem::VPooledItem( VItemPool& i_rPool )
+  : m_rPool( i_rPool )
+{
+  m_pValue = this;
+}
+
+bool VPooledItem::GetName( std::uint32_t i_Selector, std::string_view& o_rName ) const
+{
+  if ( i_Selector == 0 || i_Selector >= ZEK::EFlowNameCount || m_Names[i_Selector - 1].empty() )
+  {
+    return false;
+  }
+  o_rName = m_Names[i_Selector - 1];
+  return true;
+}
+
+void VPooledItem::SetName( std::uint32_t i_Selector, std::string_view i_Name )
+{
+  const bool bKnown = i_Selector > 0 && i_Selector < ZEK::EFlowNameCount;
+  if ( !DebugServices::Check( bKnown, "i_Selector > 0 && i_Selector < EFlowNameCount", __FILE__, __LINE__ ) )
+  {
+    return;
+  }
+  m_Names[i_Selector - 1].assign( i_Name );
+  m_NameHash = 0;
+  for ( std::size_t Name = 0; Name < m_Names.size(); ++Name )
+  {
+    m_NameHash += NameHashPart( static_cast< std::uint32_t >( Name + 1 ), m_Names[Name] );
+  }
+}
+
+void VPooledItem::Renew( std::uint32_t i_Salt, std::uint32_t i_Tag, std::int64_t i_Number )
+{
+  m_Id = { i_Salt, i_Tag, i_Number };
+}
+
+void VPooledItem::Destroy()
+{
+  ResetPayload();
+  if ( m_NameHash != 0 )
+  {
+    for ( std::string& rName : m_Names )
+    {
+      rName.clear();
+    }
+    m_NameHash = 0;
+  }
+  m_rPool.GiveBack( *this );
+}
+
+VPooledItem& VItemPool::Take()
+{
+  const std::lock_guard Lock( m_Guard );
+  VPooledItem* pItem = m_Free.Take();
+  if ( !pItem )
+  {
+    pItem = m_pMake( *this );
+  }
+  pItem->Renew( m_Salt, m_Tag, ++m_Number );
+  return *pItem;
+}
+
+void VItemPool::Trim()
+{
+  const std::lock_guard Lock( m_Guard );
+  while ( VPooledItem* pItem = m_Free.Take() )
+  {
+    delete pItem;
+  }
+}
+
+VItemPools& VItemPools::Instance()
+{
+  // Never destroyed: an item in a static of somebody else comes back after the statics of this library went.
+  static VItemPools& rPools = *new VItemPools;
+  return rPools;
+}
+
+VItemPools::VItemPools()
+{
+  const std::uint32_t Salt = ProcessSalt();
+  const auto Add = [&]< typename TFlow >( TFlow* )
+  {
+    using VItem = VTypedItem< typename ZEK::FlowValueType< TFlow >::type >;
+    constexpr std::uint32_t Tag = ZEK::FlowValueType< TFlow >::Descriptor.Tag;
+    m_Pools.push_back( std::make_unique< VItemPool >(
+        Tag, Salt,
+        []( VItemPool& i_rPool ) -> VPooledItem*
+        {
+          return new VItem( i_rPool );
+        },
+        typeid( VItem ) ) );
+    std::size_t Slot = TableSlot( Tag );
+    while ( m_Table[Slot] )
+    {
+      Slot = ( Slot + 1 ) % m_Table.size();
+    }
+    m_Table[Slot] = m_Pools.back().get();
+  };
+  static_assert( std::tuple_size_v< CoreMoxelTypes::VAllFlowTypes > <= std::tuple_size_v< decltype( m_Table ) > / 2 );
+  [&]< typename... TFlow >( std::tuple< TFlow*... >* )
+  {
+    ( Add( static_cast< TFlow* >( nullptr ) ), ... );
+  }( static_cast< CoreMoxelTypes::VAllFlowTypes* >( nullptr ) );
+}
+
+VItemPool* VItemPools::Find( std::uint32_t i_Tag ) const
+{
+  for ( std::size_t Slot = TableSlot( i_Tag ); m_Table[Slot]; Slot = ( Slot + 1 ) % m_Table.size() )
+  {
+    if ( m_Table[Slot]->Tag() == i_Tag )
+    {
+      return m_Table[Slot];
+    }
+  }
+  return nullptr;
+}
+
+void VItemPools::Trim()
+{
+  for ( const auto& rpPool : m_Pools )
+  {
+    rpPool->Trim();
+  }
+}
+
+} // namespace HostFlow

@@ -1,0 +1,115 @@
+#include "FlowTestItems.h"
+
+#include <TestSupport/LogGuard.h>
+
+#include <set>
+
+using namespace ZEK;
+using namespace CoreMoxelTypes;
+using namespace HostFlow;
+
+TEST( ItemStore, MakesEveryRegisteredKindWithItsCoreTypeAndRefusesOthers )
+{
+  const VFlowStoreRef Store = MakeItemStore();
+  const auto Check = [&]< typename TFlow >( TFlow* )
+  {
+    using T = typename FlowValueType< TFlow >::type;
+    VFlowItemRef Item;
+    IResult Status = IResult::Failed;
+    Store->CreateItem( Status, FlowValueType< TFlow >::Descriptor, Item );
+    ASSERT_TRUE( Status.IsOk() ) << FlowValueType< TFlow >::Descriptor.Name;
+    EXPECT_EQ( Item->Id().Type, FlowTag< TFlow > );
+    EXPECT_NE( Item->Id().Salt, 0u );
+    EXPECT_NE( FlowPayload< T >( Item.Get() ), nullptr ) << FlowValueType< TFlow >::Descriptor.Name;
+  };
+  [&]< typename... TFlow >( std::tuple< TFlow*... >* )
+  {
+    ( Check( static_cast< TFlow* >( nullptr ) ), ... );
+  }( static_cast< VAllFlowTypes* >( nullptr ) );
+
+  for ( const std::uint32_t Tag : { 0u, 2u, 0x1004u, 0x10001000u, 0xffffffffu } )
+  {
+    VFlowItemRef Item = NewItem< FlowSubject >();
+    IResult Status;
+    Store->CreateItem( Status, VFlowItemType{ "FlowUnknown", Tag, 1, 0, 0, "" }, Item );
+    EXPECT_EQ( Status, IResult( IResult::InvalidType ) ) << Tag;
+    EXPECT_FALSE( Item ) << Tag;
+  }
+}
+
+TEST( ItemStore, AReusedItemIsEmptyAndHasAnIdOfItsOwn )
+{
+  std::set< std::int64_t > Numbers;
+  const void* pFirst = nullptr;
+  bool bReused = false;
+  for ( int Round = 0; Round < 3; ++Round )
+  {
+    const VFlowItemRef Item = NewItem< FlowGreyscaleBlobSet >();
+    auto* pSet = FlowMutablePayload< VGreyscaleBlobSet >( Item.Get() );
+    ASSERT_NE( pSet, nullptr );
+    bReused = bReused || pSet == pFirst;
+    pFirst = pSet;
+    EXPECT_TRUE( Numbers.insert( Item->Id().Number ).second );
+    EXPECT_TRUE( pSet->Blobs.empty() && pSet->Lines.empty() && pSet->Pixels.empty() );
+    EXPECT_FALSE( pSet->Complete );
+    EXPECT_EQ( pSet->SensorScale.x, 1 );
+    EXPECT_EQ( NameOf( *Item, 2 ), "(none)" );
+    Item->MutableValue().SetName( 2, "a device with a name that needs memory of its own" );
+    pSet->Complete = true;
+    pSet->SensorScale = { 7, 7 };
+    pSet->Blobs.resize( 10 );
+    pSet->Lines.resize( 100 );
+    pSet->Pixels.resize( 1000 );
+  }
+  EXPECT_TRUE( bReused );
+
+  const void* pRoom = nullptr;
+  for ( int Round = 0; Round < 2; ++Round )
+  {
+    const VFlowItemRef Item = NewItem< FlowCentroidSet >();
+    auto& rCentroids = FlowMutablePayload< VCentroidSet >( Item.Get() )->Centroids;
+    EXPECT_TRUE( rCentroids.empty() );
+    EXPECT_TRUE( Round == 0 || rCentroids.capacity() >= 128 );
+    rCentroids.resize( 128 );
+    EXPECT_TRUE( Round == 0 || rCentroids.data() == pRoom );
+    pRoom = rCentroids.data();
+  }
+}
+
+TEST( ItemStore, NamesAnswerToTheirSelectorOnly )
+{
+  const VFlowItemRef Item = NewItem< FlowSubject >();
+  IFlowValue& rValue = Item->MutableValue();
+  rValue.SetName( EFlowNameObject, "Ada" );
+  rValue.SetName( EFlowNameDevice, "urn:1" );
+  EXPECT_EQ( NameOf( *Item, EFlowNameObject ), "Ada" );
+  EXPECT_EQ( NameOf( *Item, EFlowNameDevice ), "urn:1" );
+  EXPECT_EQ( NameOf( *Item, EFlowNameTarget ), "(none)" );
+  EXPECT_EQ( NameOf( *Item, 0 ), "(none)" );
+  EXPECT_EQ( NameOf( *Item, 4 ), "(none)" );
+  rValue.SetName( EFlowNameObject, "" );
+  EXPECT_EQ( NameOf( *Item, EFlowNameObject ), "(none)" );
+
+  const TestSupport::VAssertRecorder Recorder;
+  rValue.SetName( 0, "x" );
+  rValue.SetName( 4, "x" );
+  EXPECT_EQ( Recorder.Expressions().size(), 2u );
+  EXPECT_EQ( NameOf( *Item, EFlowNameDevice ), "urn:1" );
+}
+
+TEST( ItemStore, AnItemOutlivesItsHandleAndItsState )
+{
+  VFlowItemRef Kept;
+  {
+    const VFlowStateRef State = NewState( { 0, 1, 1 } );
+    const VFlowItemRef Item = NewItem< FlowWorldAxis >();
+    FlowMutablePayload< VWorldAxis >( Item.Get() )->Up = 2;
+    State->AddItem( Item );
+    EXPECT_EQ( Item->UseCount(), 2 );
+    State->FindItem( Kept, 0x1029, EFlowTimeMatch::Overlap );
+  }
+  TrimPools();
+  ASSERT_TRUE( Kept );
+  EXPECT_EQ( Kept->UseCount(), 1 );
+  EXPECT_EQ( FlowPayload< VWorldAxis >( Kept.Get() )->Up, 2u );
+}
