@@ -20,6 +20,7 @@ class VPlaybackClock final : public HarrowPluginInterface::IPlaybackRange
 public:
   /// Nanoseconds since any fixed moment, never falling.
   using VTimeFunction = std::function< std::int64_t() >;
+  static constexpr double MaximumRate = 1e6;
 
   /// An empty function stands for the steady clock.
   explicit VPlaybackClock( VTimeFunction i_Now = {} );
@@ -41,7 +42,8 @@ public:
   /// Pauses and moves by whole frames from the current one; at an end of the range it stays, or goes round when
   /// looping.
   void Step( std::int64_t i_Frames );
-  /// 1 is the speed of the recording, negative runs backwards. `InvalidArgument` for a number that is not finite.
+  /// 1 is the speed of the recording, negative runs backwards. `InvalidArgument` for a number that is not finite;
+  /// one beyond `MaximumRate` either way is cut to it, with `OkButModified`.
   ZEK::IResult SetRate( double i_Rate );
   void SetLoop( bool i_bLoop );
   /// Narrows what is played, ends included; clamped to the recording, and swapped when given the wrong way round.

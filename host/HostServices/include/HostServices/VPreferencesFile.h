@@ -42,12 +42,13 @@ public:
   void SetValue( const QString& i_rKey, const QJsonValue& i_rValue );
 
   /// Writes the file if something changed, all of it or nothing. `FileIOFailure`, with a log line of level 3, when
-  /// it cannot be written; the changes are kept for the next try.
+  /// it cannot be written; the changes are kept for the next try. `NotPermitted` over a file that could not be read.
   ZEK::IResult Save();
   const std::filesystem::path& Path() const { return m_Path; }
 
 private:
   void Load();
+  void SetRecentFiles( const QStringList& i_rFiles );
   void SetAside( const QString& i_rReason );
   void Put( const QString& i_rGroup, const QString& i_rName, const QJsonValue& i_rValue );
 

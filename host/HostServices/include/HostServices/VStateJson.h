@@ -7,8 +7,9 @@
 namespace HostServices
 {
 
-/// Writes a window's state as a JSON object with one object a group. A value that is neither a number, a bool, a
-/// text nor a list of texts is left out with a log line of level 3. Whole numbers keep all 64 bits.
+/// Writes a window's state as a JSON object with one object a group. A value that is neither a finite number, a bool,
+/// a text nor a list of texts, and a whole number beyond 63 bits, is left out with a log line of level 3. A group that
+/// is opened again goes on where it ended.
 class VStateJsonWriter final : public HarrowPluginInterface::IStateWriter
 {
 public:

@@ -1,0 +1,78 @@
+#include <HostServices/VPaths.h>
+
+#include <ZEK/Log.h>
+
+#include <QtCore/QStandardPaths>
+
+namespace HostServices
+{
+namespace
+{
+struct VKindFolder
+{
+  std::uint32_t Kind;
+  const char* pName;
+};
+constexpr VKindFolder KindFolders[] = {
+    { HarrowPluginInterface::EFolderSubjects, "Subjects" },
+    { HarrowPluginInterface::EFolderProps, "Props" },
+    { HarrowPluginInterface::EFolderTrackingSubjects, "TrackingSubjects" },
+    { HarrowPluginInterface::EFolderRetargetSubjects, "RetargetSubjects" },
+    { HarrowPluginInterface::EFolderSceneMeshes, "SceneMeshes" },
+};
+
+std::filesystem::path Root( std::filesystem::path i_Given )
+{
+  if ( i_Given.empty() )
+  {
+    i_Given = QStandardPaths::writableLocation( QStandardPaths::AppDataLocation ).toStdU16String();
+  }
+  std::error_code Ignored;
+  std::filesystem::path Absolute = std::filesystem::absolute( i_Given, Ignored );
+  return ( Absolute.empty() ? i_Given : Absolute ).lexically_normal();
+}
+} // namespace
+
+VPaths::VPaths( std::filesystem::path i_ContentRoot, std::filesystem::path i_UserRoot )
+  : m_ContentRoot( Root( std::move( i_ContentRoot ) ) )
+  , m_UserRoot( Root( std::move( i_UserRoot ) ) )
+{
+}
+
+std::vector< std::wstring >& VPaths::FoldersOfKind( std::vector< std::wstring >& o_rFolders,
+                                                    std::uint32_t i_KindMask ) const
+{
+  o_rFolders.clear();
+  for ( const VKindFolder& rKind : KindFolders )
+  {
+    if ( !( i_KindMask & rKind.Kind ) )
+    {
+      continue;
+    }
+    MakeFolder( m_ContentRoot / rKind.pName );
+    o_rFolders.push_back( ( m_ContentRoot / rKind.pName ).wstring() );
+    if ( m_UserRoot != m_ContentRoot )
+    {
+      MakeFolder( m_UserRoot / rKind.pName );
+      o_rFolders.push_back( ( m_UserRoot / rKind.pName ).wstring() );
+    }
+  }
+  return o_rFolders;
+}
+
+void VPaths::MakeFolder( const std::filesystem::path& i_rFolder ) const
+{
+  static ZEK::VLogCategory& rCategory = ZEK::GlobalLog().Category( "Paths" );
+  std::error_code Error;
+  std::filesystem::create_directories( i_rFolder, Error );
+  // Some file in the place of the folder is no error to the call above in every library version.
+  std::error_code Ignored;
+  const bool bThere = std::filesystem::is_directory( i_rFolder, Ignored );
+  if ( !bThere && m_Reported.insert( i_rFolder ).second )
+  {
+    ZEK::Log( rCategory, ZEK::ELogWarning, "Cannot create folder %1%: %2%", i_rFolder.string(),
+              Error ? Error.message() : std::string( "a file of that name is in its place" ) );
+  }
+}
+
+} // namespace HostServices

@@ -1,0 +1,244 @@
+#include <HostServices/VPostalService.h>
+
+#include <ZEK/Log.h>
+
+#include <QtCore/QCoreApplication>
+#include <QtCore/QEvent>
+#include <QtCore/QObject>
+
+#include <deque>
+#include <exception>
+#include <mutex>
+
+namespace HostServices
+{
+namespace
+{
+ZEK::VLogCategory& Category()
+{
+  static ZEK::VLogCategory& rCategory = ZEK::GlobalLog().Category( "PostalService" );
+  return rCategory;
+}
+
+QEvent::Type TurnEventType()
+{
+  static const auto Type = static_cast< QEvent::Type >( QEvent::registerEventType() );
+  return Type;
+}
+
+class VTurnEvent final : public QEvent
+{
+public:
+  explicit VTurnEvent( std::uint64_t i_Last )
+    : QEvent( TurnEventType() )
+    , Last( i_Last )
+  {
+  }
+  const std::uint64_t Last; ///< the function that this turn is for
+};
+
+void Run( const std::function< void() >& i_rFunction )
+{
+  try
+  {
+    i_rFunction();
+  }
+  catch ( const std::exception& rError )
+  {
+    ZEK::Log( Category(), ZEK::ELogFailure, "A posted function failed: %1%", rError.what() );
+  }
+  catch ( ... )
+  {
+    ZEK::Log( Category(), ZEK::ELogFailure, "A posted function failed" );
+  }
+}
+} // namespace
+
+struct VPostalService::VState
+{
+  /// Lives on the thread of the service and takes its events.
+  class VReceiver final : public QObject
+  {
+  public:
+    explicit VReceiver( std::weak_ptr< VState > i_pState )
+      : m_pState( std::move( i_pState ) )
+    {
+    }
+
+    bool event( QEvent* i_pEvent ) override
+    {
+      const auto pState = m_pState.lock();
+      if ( !pState )
+      {
+        return QObject::event( i_pEvent );
+      }
+      // The event was made under the guard by the thread that posted.
+      std::unique_lock Lock( pState->Guard );
+      if ( i_pEvent->type() != TurnEventType() )
+      {
+        Lock.unlock();
+        return QObject::event( i_pEvent );
+      }
+      const std::uint64_t Last = static_cast< VTurnEvent* >( i_pEvent )->Last;
+      Lock.unlock();
+      // The function may destroy the service, and this object with it: nothing of it is touched afterwards.
+      pState->RunUpTo( Last );
+      return true;
+    }
+
+  private:
+    std::weak_ptr< VState > m_pState;
+  };
+
+  struct VEntry
+  {
+    std::uint64_t Number;
+    std::function< void() > Function;
+  };
+
+  bool TakeFront( std::uint64_t i_Last, std::function< void() >& o_rFunction )
+  {
+    const std::lock_guard Lock( Guard );
+    if ( Queue.empty() || Queue.front().Number > i_Last )
+    {
+      return false;
+    }
+    o_rFunction = std::move( Queue.front().Function );
+    Queue.pop_front();
+    return true;
+  }
+
+  /// Events of functions that `DrainForTest` has run find nothing to do; they must not run a later one early.
+  void RunUpTo( std::uint64_t i_Last )
+  {
+    std::function< void() > Function;
+    while ( TakeFront( i_Last, Function ) )
+    {
+      Run( Function );
+    }
+  }
+
+  void Close()
+  {
+    std::deque< VEntry > Dropped;
+    std::unique_ptr< VReceiver > pGone;
+    const std::lock_guard Lock( Guard );
+    bOpen = false;
+    Dropped.swap( Queue );
+    pGone = std::move( pReceiver );
+    // Declared before the lock, the queue and the receiver are destroyed after it: a function that goes may post.
+  }
+
+  std::mutex Guard;
+  std::deque< VEntry > Queue;
+  std::uint64_t NextNumber = 1;
+  bool bOpen = true;
+  std::unique_ptr< VReceiver > pReceiver;
+};
+
+namespace
+{
+/// Closes what still is open when the application object goes: its event queue must not be reached afterwards.
+class VEndOfApplication
+{
+public:
+  static VEndOfApplication& Get()
+  {
+    static VEndOfApplication Instance;
+    return Instance;
+  }
+
+  void Add( std::function< bool() > i_Close )
+  {
+    const std::lock_guard Lock( m_Guard );
+    if ( m_Closers.empty() )
+    {
+      qAddPostRoutine( &VEndOfApplication::CloseAll );
+    }
+    m_Closers.push_back( std::move( i_Close ) );
+  }
+
+private:
+  static void CloseAll()
+  {
+    std::vector< std::function< bool() > > Closers;
+    {
+      const std::lock_guard Lock( Get().m_Guard );
+      Closers.swap( Get().m_Closers );
+    }
+    for ( const auto& rClose : Closers )
+    {
+      rClose();
+    }
+  }
+
+  std::mutex m_Guard;
+  std::vector< std::function< bool() > > m_Closers;
+};
+} // namespace
+
+VPostalService::VPostalService()
+  : m_pState( std::make_shared< VState >() )
+{
+  m_pState->pReceiver = std::make_unique< VState::VReceiver >( m_pState );
+  VEndOfApplication::Get().Add(
+      [pWeak = std::weak_ptr( m_pState )]
+      {
+        const auto pState = pWeak.lock();
+        if ( pState )
+        {
+          pState->Close();
+        }
+        return pState != nullptr;
+      } );
+}
+
+VPostalService::~VPostalService()
+{
+  Close();
+}
+
+void VPostalService::Post( std::function< void() > i_Function )
+{
+  if ( !i_Function )
+  {
+    return;
+  }
+  const auto pState = m_pState;
+  // Posting the event under the lock keeps events in the order of their numbers and the receiver alive.
+  const std::lock_guard Lock( pState->Guard );
+  if ( !pState->bOpen )
+  {
+    return;
+  }
+  const std::uint64_t Number = pState->NextNumber++;
+  pState->Queue.push_back( { Number, std::move( i_Function ) } );
+  QCoreApplication::postEvent( pState->pReceiver.get(), new VTurnEvent( Number ) );
+}
+
+bool VPostalService::DrainForTest()
+{
+  constexpr int MaximumTurns = 10'000;
+  const auto pState = m_pState;
+  for ( int Turn = 0; Turn < MaximumTurns; ++Turn )
+  {
+    std::uint64_t Last = 0;
+    {
+      const std::lock_guard Lock( pState->Guard );
+      if ( pState->Queue.empty() )
+      {
+        return true;
+      }
+      Last = pState->Queue.back().Number;
+    }
+    pState->RunUpTo( Last );
+  }
+  return false;
+}
+
+void VPostalService::Close()
+{
+  m_pState->Close();
+}
+
+} // namespace HostServices
