@@ -16,6 +16,8 @@
 // and in mode 2 a type with nothing selected or preselected does not touch OpenGL. Many equal objects are one
 // buffer and one instanced draw: see VSphereHelper.h. Nothing is allocated in Render, neither memory nor ids.
 
+#include <CoreGraphics/VRenderState.h>
+
 #include <cstdint>
 #include <vector>
 
@@ -31,13 +33,12 @@ namespace MoxelGraphics
 {
 struct VSceneOptions;
 
-/// `VRenderContext`'s render mode.
-enum ERenderMode : int
-{
-  ERenderModeNormal = 0,    ///< visible colours
-  ERenderModeSelection = 1, ///< every object writes its selection word; read back
-  ERenderModeHighlight = 2  ///< selected and preselected objects write their word into the highlight mask
-};
+/// `VRenderContext`'s render mode: visible colours; every object writes its selection word, to be read back; selected
+/// and preselected objects write theirs into the highlight mask.
+using CoreGraphics::ERenderMode;
+using CoreGraphics::ERenderModeHighlight;
+using CoreGraphics::ERenderModeNormal;
+using CoreGraphics::ERenderModeSelection;
 
 enum ERenderPass : std::uint32_t
 {

@@ -45,7 +45,7 @@ public:
   virtual bool RenderBackdrop( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions ) = 0;
 };
 
-/// A function that the render thread runs before its next frame, and before each one until `bDone` is set.
+/// A function that the render thread runs whenever it brings the scene up to date, until `bDone` is set.
 struct VRenderCallback
 {
   std::function< void() > Function;
@@ -103,6 +103,8 @@ public:
   /// Ids that the running band pick has found already, in no order; with the generation at which they last changed.
   const std::unordered_set< std::uint32_t >& IgnoredIds() const { return m_IgnoredIds; }
   std::uint64_t IgnoredGeneration() const { return m_IgnoredGeneration; }
+  /// The start of a view; `i_rScissor` is all that it will touch, in pixels, y up.
+  void Clear( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, const QRect& i_rScissor );
   void Clear( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   void DrawScene( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   void RenderPass( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, std::uint32_t i_Pass );
@@ -137,6 +139,8 @@ public:
   const std::shared_ptr< CoreGraphics::VResources >& Resources() const { return m_pResources; }
   VSelectionRegistry& Registry() { return *m_pRegistry; }
   const std::shared_ptr< VSelectionRegistry >& RegistryPtr() const { return m_pRegistry; }
+  /// False when the context of the last `Initialise` does not share objects with the scene's first.
+  bool CanDraw() const { return m_bCanDraw; }
   /// Null before the first `Initialise`.
   VSphereHelper* SphereHelper() const { return m_pSphereHelper.get(); }
   const std::shared_ptr< ZEK::ISelectionService >& SelectionService() const { return m_pSelectionService; }
@@ -164,7 +168,6 @@ private:
     void Mark();
   };
 
-  void ReloadSources();
   void PaintStatistics( QPainter& io_rPainter, const CoreGraphics::VRenderContext& i_rContext ) const;
 
   std::shared_ptr< CoreGraphics::VResources > m_pResources;
@@ -172,14 +175,13 @@ private:
   std::unordered_map< int, VSceneLabel > m_SecondLabels;
   std::vector< VCameraDefinition > m_CameraDefinitions;
   std::uint64_t m_CameraGeneration = 0;
-  std::shared_ptr< HarrowPluginInterface::IRenderResources > m_pRenderResources;
   std::shared_ptr< ZEK::ISelectionService > m_pSelectionService;
   std::shared_ptr< VSelectionRegistry > m_pRegistry;
   std::shared_ptr< HarrowPluginInterface::VMeshSceneCache > m_pMeshCache;
   std::shared_ptr< ZEK::IPostalService > m_pPostalService;
   std::shared_ptr< VSphereHelper > m_pSphereHelper;
-  std::uint64_t m_SourcesGeneration = 0;
   bool m_bDeveloperMode = false;
+  bool m_bCanDraw = false;
   std::atomic< bool > m_bYUp{ false };
   std::unordered_set< std::uint32_t > m_IgnoredIds;
   std::uint64_t m_IgnoredGeneration = 1;

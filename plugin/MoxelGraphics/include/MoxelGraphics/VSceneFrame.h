@@ -6,6 +6,7 @@
 
 #include <ZEK/Selection.h>
 
+#include <QtCore/QElapsedTimer>
 #include <QtCore/QPoint>
 #include <QtCore/QSize>
 #include <QtCore/QString>
@@ -16,7 +17,7 @@
 #include <string>
 #include <vector>
 
-class QOpenGLContextGroup;
+class QRect;
 class QOpenGLFramebufferObject;
 
 namespace CoreGraphics
@@ -38,7 +39,8 @@ struct VFrameInput
   QPoint Pointer;
   QPoint BandStart;
   int PickMode = EPickNone;
-  int PreselectColour = 0; ///< 0 no modifier, 1 Shift, 2 Shift and Control, 3 Control
+  ZEK::ESelectionEdit Edit = ZEK::ESelectionEdit::Replace; ///< travels with the pick's result
+  int PreselectColour = 0;                                 ///< 0 no modifier, 1 Shift, 2 Shift and Control, 3 Control
   float PixelRatio = 1.0f;
   ETracking Tracking = ETrackNone;
   ZEK::VSelection TrackedSelection;
@@ -48,7 +50,9 @@ struct VFrameInput
 /// What the last pick found.
 struct VPickResult
 {
-  int Mode = -1; ///< the pick mode of the frame that picked; -1 when none did
+  std::uint64_t Serial = 0; ///< grows with each pick
+  int Mode = -1;            ///< the pick mode of the frame that picked; -1 when the last frame did not
+  ZEK::ESelectionEdit Edit = ZEK::ESelectionEdit::Replace;
   ZEK::VSelection Selection;
   std::vector< std::string > Labels;
   std::vector< std::uint32_t > Ids;
@@ -76,6 +80,10 @@ public:
                std::shared_ptr< CoreGraphics::VCameraController > i_pController );
   ~VSceneFrame();
 
+  /// A target for `Render` as the views have it: with depth, multisampled in a free view on desktop OpenGL where
+  /// the device can do it. Null when the device refuses every form.
+  static std::unique_ptr< QOpenGLFramebufferObject > MakeTarget( QSize i_Size, bool i_bMultisampled );
+
   /// Makes the off-screen targets for a frame of that size in device pixels. `Input` is read.
   void Resize( QSize i_Size );
   VFrameInput& Input() { return m_Input; }
@@ -98,17 +106,20 @@ public:
 
 private:
   bool Prepare();
+  void Begin();
+  void DrawVisible( QOpenGLFramebufferObject& io_rTarget );
+  double Lap();
   void ReadGl( const QOpenGLFramebufferObject& i_rTarget );
   void UpdateCamera();
   void SelectAndHighlight();
   bool IsBand() const;
   void PickPoint();
-  void PickBand();
-  bool PickLayer( const QRect& i_rBand );
-  void Resolve( bool i_bBand );
+  int PickBand();
+  int PickLayers( const QRect& i_rBand );
+  void Draw( const QRect& i_rScissor );
+  void Highlight();
   void DrawView();
   void PaintOverlay( const QOpenGLFramebufferObject& i_rTarget );
-  void Release();
 
   std::shared_ptr< VMoxelScene > m_pScene;
   std::shared_ptr< CoreGraphics::VCameraController > m_pController;
@@ -122,8 +133,11 @@ private:
   QString m_Notice;
   QSize m_Size;
   bool m_bRefused = false;
+  bool m_bMaskDirty = true;
+  QElapsedTimer m_Clock;
   std::vector< std::uint32_t > m_Pixels;
-  std::vector< std::uint32_t > m_Found; ///< sorted
+  std::vector< std::uint32_t > m_Found; ///< in the order in which they were found
+  std::vector< std::uint32_t > m_Layer;
 };
 
 } // namespace MoxelGraphics

@@ -1,0 +1,460 @@
+#include <MoxelGraphics/VSceneFrame.h>
+
+#include "Log.h"
+
+#include <MoxelGraphics/VMoxelScene.h>
+
+#include <CoreGraphics/VCameraController.h>
+#include <CoreGraphics/VRenderContext.h>
+#include <CoreGraphics/VResources.h>
+
+#include <QtCore/QThread>
+#include <QtCore/QTime>
+#include <QtGui/QGuiApplication>
+#include <QtGui/QOpenGLContext>
+#include <QtGui/QPainter>
+#include <QtOpenGL/QOpenGLFramebufferObject>
+#include <QtOpenGL/QOpenGLPaintDevice>
+
+#include <cmath>
+
+namespace MoxelGraphics
+{
+namespace
+{
+constexpr int HighlightUnit = 7;
+const QString NotShared = QStringLiteral( "This window's OpenGL context does not share with the scene's first one" );
+
+QVector3D LightDirection( bool i_bYUp )
+{
+  return ( i_bYUp ? QVector3D( 1, 3, 1 ) : QVector3D( 1, 1, 3 ) ).normalized();
+}
+
+QString GlText( QOpenGLExtraFunctions& io_rGl, GLenum i_Name )
+{
+  return QString::fromLatin1( reinterpret_cast< const char* >( io_rGl.glGetString( i_Name ) ) );
+}
+
+std::unique_ptr< QOpenGLFramebufferObject > TryTarget( QSize i_Size, int i_Samples, GLenum i_Format )
+{
+  QOpenGLFramebufferObjectFormat Format;
+  Format.setAttachment( QOpenGLFramebufferObject::Depth );
+  Format.setSamples( i_Samples );
+  Format.setInternalTextureFormat( i_Format );
+  auto pTarget = std::make_unique< QOpenGLFramebufferObject >( i_Size, Format );
+  return pTarget->isValid() ? std::move( pTarget ) : nullptr;
+}
+} // namespace
+
+std::unique_ptr< QOpenGLFramebufferObject > VSceneFrame::MakeTarget( QSize i_Size, bool i_bMultisampled )
+{
+  const bool bES = QOpenGLContext::currentContext()->isOpenGLES();
+  const GLenum Format = bES ? GL_RGBA : GL_RGB;
+  auto pTarget = TryTarget( i_Size, i_bMultisampled && !bES ? 4 : 0, Format );
+  if ( !pTarget )
+  {
+    pTarget = TryTarget( i_Size, 0, Format );
+  }
+  return pTarget ? std::move( pTarget ) : TryTarget( i_Size, 0, GL_RGBA );
+}
+
+VSceneFrame::VSceneFrame( std::shared_ptr< VMoxelScene > i_pScene,
+                          std::shared_ptr< CoreGraphics::VCameraController > i_pController )
+  : m_pScene( std::move( i_pScene ) )
+  , m_pController( std::move( i_pController ) )
+  , m_pContext( std::make_unique< CoreGraphics::VRenderContext >() )
+{
+}
+
+VSceneFrame::~VSceneFrame()
+{
+  m_pSelectionTarget.reset();
+  m_pOutlineTarget.reset();
+  m_pContext.reset();
+  // A scene is an object of the GUI thread: where this is another one, the last reference must not end here.
+  if ( qGuiApp && m_pScene->thread() != QThread::currentThread() )
+  {
+    QMetaObject::invokeMethod(
+        qGuiApp, [pScene = std::move( m_pScene )] {}, Qt::QueuedConnection );
+  }
+}
+
+void VSceneFrame::Resize( QSize i_Size )
+{
+  m_pController->SetSize( i_Size );
+  m_Size = i_Size;
+  m_pSelectionTarget.reset();
+  m_pOutlineTarget.reset();
+  m_bMaskDirty = true;
+  if ( i_Size.isEmpty() )
+  {
+    return;
+  }
+  m_pSelectionTarget =
+      std::make_unique< QOpenGLFramebufferObject >( i_Size, QOpenGLFramebufferObject::Depth, GL_TEXTURE_2D );
+  m_pOutlineTarget =
+      std::make_unique< QOpenGLFramebufferObject >( i_Size, QOpenGLFramebufferObject::NoAttachment, GL_TEXTURE_2D );
+}
+
+bool VSceneFrame::Prepare()
+{
+  if ( m_pContext->IsInitialised() )
+  {
+    return !m_bRefused;
+  }
+  m_pContext->Initialise();
+  if ( !m_pContext->IsInitialised() )
+  {
+    return false;
+  }
+  m_pScene->Initialise( *m_pContext );
+  m_bRefused = !m_pScene->CanDraw();
+  m_Notice = m_bRefused ? NotShared : QString::fromStdString( m_pScene->Resources()->VersionNotice() );
+  if ( m_pContext->IsSoftwareRasteriser() )
+  {
+    ZEK::Log( LogCategory(), ZEK::ELogDetail,
+              "A software rasteriser draws this view: textures are not filtered along slopes" );
+  }
+  return !m_bRefused;
+}
+
+double VSceneFrame::Lap()
+{
+  if ( m_Input.bReporting )
+  {
+    m_pContext->Functions()->glFinish();
+  }
+  const double Passed = static_cast< double >( m_Clock.nsecsElapsed() ) * 1e-6;
+  m_Clock.start();
+  return Passed;
+}
+
+bool VSceneFrame::Render( QOpenGLFramebufferObject& io_rTarget )
+{
+  m_Result.Mode = -1;
+  const bool bReady = Prepare();
+  if ( m_bRefused && m_Input.bVisible )
+  {
+    // The picture shows nothing rather than what the memory held before.
+    m_pContext->Functions()->glClearColor( 0, 0, 0, 1 );
+    m_pContext->Functions()->glClear( GL_COLOR_BUFFER_BIT );
+  }
+  if ( !bReady || !m_Input.bVisible || m_Size.isEmpty() || !m_pSelectionTarget || !m_pSelectionTarget->isValid() )
+  {
+    return false;
+  }
+  if ( m_Gl.isEmpty() )
+  {
+    ReadGl( io_rTarget );
+  }
+  Begin();
+  m_Figures.UpdateMs = Lap();
+  SelectAndHighlight();
+  DrawVisible( io_rTarget );
+  m_Figures.DrawMs = Lap();
+  m_Figures.DrawCalls = m_pContext->DrawCalls();
+  m_Figures.BytesUploaded = m_pContext->BytesUploaded();
+  ++m_Figures.Frames;
+  return true;
+}
+
+void VSceneFrame::Begin()
+{
+  m_Clock.start();
+  m_pContext->ResetCounters();
+  m_pScene->Resources()->Update();
+  if ( m_pScene->IsPending() )
+  {
+    m_pScene->ProcessPending();
+  }
+  m_pContext->ResetState();
+  m_pContext->SetOutlineMask( m_pOutlineTarget.get() );
+  m_pContext->SetPreselectColourIndex( m_Input.PreselectColour );
+  UpdateCamera();
+  m_pContext->SetYUp( m_pScene->YUp() );
+  m_pContext->SetGlobalTime( static_cast< float >( QTime::currentTime().msecsSinceStartOfDay() ) * 0.001f );
+  m_pContext->SetPixelRatio( m_Input.PixelRatio );
+}
+
+void VSceneFrame::UpdateCamera()
+{
+  const auto Focus = [&]( const ZEK::VSelection& i_rSelection, bool i_bFit )
+  {
+    std::vector< QVector4D > Points;
+    for ( const VScenePoint& rPoint : m_pScene->GetSelectionPositions( i_rSelection ) )
+    {
+      if ( std::isfinite( rPoint.X ) && std::isfinite( rPoint.Y ) && std::isfinite( rPoint.Z ) )
+      {
+        Points.emplace_back( rPoint.X, rPoint.Y, rPoint.Z, std::isfinite( rPoint.Radius ) ? rPoint.Radius : 0.0f );
+      }
+    }
+    m_pController->SetFocusPoints( Points, i_bFit );
+  };
+  m_pController->SetYUp( m_pScene->YUp() );
+  if ( m_Input.bFit )
+  {
+    m_Input.bFit = false;
+    Focus( m_Input.TrackedSelection, true );
+  }
+  if ( m_Input.Tracking == ETrackCurrent )
+  {
+    Focus( m_Input.TrackedSelection, false );
+  }
+  else if ( m_Input.Tracking == ETrackSelection )
+  {
+    Focus( m_pScene->GetSelection(), false );
+  }
+  else if ( m_Input.Tracking == ELockCurrent )
+  {
+    VScenePose Pose;
+    if ( m_pScene->GetSelectionPose( m_Input.TrackedSelection, Pose ) )
+    {
+      // The record is column-major, the constructor reads rows.
+      m_pController->SetLockPose( QMatrix4x4( Pose.Matrix.data() ).transposed() );
+    }
+  }
+  m_pController->Step();
+  m_pController->Apply( *m_pContext );
+}
+
+bool VSceneFrame::IsBand() const
+{
+  const bool bBand = m_Input.PickMode == EPickBand || m_Input.PickMode == EPickBandDone;
+  return bBand && m_Input.BandStart != m_Input.Pointer;
+}
+
+void VSceneFrame::SelectAndHighlight()
+{
+  m_pContext->BindTexture( HighlightUnit, 0 );
+  m_pContext->SetRenderMode( ERenderModeSelection );
+  m_pContext->BindFramebuffer( m_pSelectionTarget.get() );
+  if ( m_Input.PickMode != EPickNone )
+  {
+    m_bMaskDirty = true;
+    m_Found.clear();
+    m_Result.Layers = IsBand() ? PickBand() : 0;
+    const bool bBand = m_Result.Layers > 0;
+    if ( !bBand )
+    {
+      PickPoint();
+      m_Result.Layers = 1;
+    }
+    m_pScene->SetIgnoredIds( {} );
+    ++m_Result.Serial;
+    m_Result.Mode = m_Input.PickMode;
+    m_Result.Edit = m_Input.Edit;
+    m_Result.Ids = m_Found;
+    m_Result.Labels.clear();
+    m_Result.Selection = m_pScene->ResolveIds( m_Found, m_Result.Labels );
+    if ( bBand )
+    {
+      std::erase_if( m_Result.Selection,
+                     []( const ZEK::VSelectionItem& i_rItem )
+                     {
+                       return i_rItem.Kind == ZEK::ESelectObjectManipulator;
+                     } );
+    }
+  }
+  m_Figures.SelectMs = Lap();
+  Highlight();
+  m_Figures.HighlightMs = Lap();
+}
+
+void VSceneFrame::Highlight()
+{
+  m_pContext->SetRenderMode( ERenderModeHighlight );
+  // Nothing has a flag, so nothing would draw; the mask that is empty already stays as it is.
+  if ( !m_pScene->Registry().Marks().empty() )
+  {
+    DrawView();
+    m_bMaskDirty = true;
+  }
+  else if ( m_bMaskDirty )
+  {
+    m_pScene->Clear( *m_pContext, m_Input.Options );
+    m_bMaskDirty = false;
+  }
+}
+
+void VSceneFrame::Draw( const QRect& i_rScissor )
+{
+  m_pScene->Clear( *m_pContext, m_Input.Options, i_rScissor );
+  m_pScene->DrawScene( *m_pContext, m_Input.Options );
+}
+
+void VSceneFrame::PickPoint()
+{
+  const QRect Frame( QPoint( 0, 0 ), m_Size );
+  const QRect Window =
+      QRect( m_Input.Pointer.x() - 5, m_Size.height() - m_Input.Pointer.y() - 5, 11, 11 ).intersected( Frame );
+  if ( Window.isEmpty() )
+  {
+    return;
+  }
+  m_Pixels.assign( static_cast< std::size_t >( Window.width() ) * static_cast< std::size_t >( Window.height() ), 0 );
+  m_pScene->SetIgnoredIds( {} );
+  Draw( Window );
+  m_pContext->ReadPixels( Window, m_Pixels.data(), GL_RGBA );
+
+  float Nearest = std::numeric_limits< float >::max();
+  std::uint32_t Winner = 0;
+  for ( int Row = 0; Row < Window.height(); ++Row )
+  {
+    for ( int Column = 0; Column < Window.width(); ++Column )
+    {
+      const std::uint32_t Id = m_Pixels[static_cast< std::size_t >( Row * Window.width() + Column )] & EIdPixelMask;
+      const float Distance = std::hypot( static_cast< float >( Column ) - static_cast< float >( Window.width() ) * 0.5f,
+                                         static_cast< float >( Row ) - static_cast< float >( Window.height() ) * 0.5f );
+      if ( Id != 0 && Distance < Nearest )
+      {
+        Nearest = Distance;
+        Winner = Id & EIdMask;
+      }
+    }
+  }
+  if ( Winner != 0 )
+  {
+    m_Found.push_back( Winner );
+  }
+}
+
+int VSceneFrame::PickBand()
+{
+  constexpr double Scale = 0.5;
+  const auto Scaled = [&]( QPoint i_Point )
+  {
+    return QPoint( static_cast< int >( std::round( i_Point.x() * Scale ) ),
+                   static_cast< int >( std::round( ( m_Size.height() - i_Point.y() ) * Scale ) ) );
+  };
+  const QRect Frame( 0, 0, static_cast< int >( std::round( m_Size.width() * Scale ) ),
+                     static_cast< int >( std::round( m_Size.height() * Scale ) ) );
+  const QPoint Start = Scaled( m_Input.BandStart );
+  const QPoint End = Scaled( m_Input.Pointer );
+  const QRect Band = QRect( std::min( Start.x(), End.x() ), std::min( Start.y(), End.y() ),
+                            std::abs( Start.x() - End.x() ), std::abs( Start.y() - End.y() ) )
+                         .intersected( Frame );
+  if ( Band.isEmpty() )
+  {
+    return 0;
+  }
+  const QRect Viewport = m_pContext->Viewport();
+  const QRect Scissor = m_pContext->Scissor();
+  m_pContext->SetViewport( Frame );
+  m_pContext->SetFrameSize( Frame.size() );
+  const int Layers = PickLayers( Band );
+  m_pContext->SetFrameSize( m_Size );
+  m_pContext->SetViewport( Viewport );
+  m_pContext->SetScissor( Scissor );
+  return Layers;
+}
+
+int VSceneFrame::PickLayers( const QRect& i_rBand )
+{
+  constexpr int MaximumLayers = 16;
+  m_Pixels.resize( static_cast< std::size_t >( i_rBand.width() ) * static_cast< std::size_t >( i_rBand.height() ) );
+  int Layers = 0;
+  bool bNew = true;
+  while ( bNew && Layers < MaximumLayers )
+  {
+    ++Layers;
+    // What was found no longer draws, so that the next layer shows what it hid.
+    m_pScene->SetIgnoredIds( m_Found );
+    Draw( i_rBand );
+    m_pContext->ReadPixels( i_rBand, m_Pixels.data(), GL_RGBA );
+    m_Layer.clear();
+    std::uint32_t Last = 0;
+    for ( const std::uint32_t Pixel : m_Pixels )
+    {
+      const std::uint32_t Id = Pixel & EIdMask;
+      if ( Id != Last && Id != 0 )
+      {
+        m_Layer.push_back( Id );
+      }
+      Last = Id;
+    }
+    std::sort( m_Layer.begin(), m_Layer.end() );
+    m_Layer.erase( std::unique( m_Layer.begin(), m_Layer.end() ), m_Layer.end() );
+    std::erase_if( m_Layer,
+                   [&]( std::uint32_t i_Id )
+                   {
+                     return m_pScene->IgnoredIds().contains( i_Id );
+                   } );
+    bNew = !m_Layer.empty();
+    m_Found.insert( m_Found.end(), m_Layer.begin(), m_Layer.end() );
+  }
+  m_pScene->SetIgnoredIds( m_Found );
+  m_Layer.clear();
+  m_pScene->PickInRect( *m_pContext, m_Input.Options, i_rBand, m_Layer );
+  std::sort( m_Layer.begin(), m_Layer.end() );
+  m_Layer.erase( std::unique( m_Layer.begin(), m_Layer.end() ), m_Layer.end() );
+  std::copy_if( m_Layer.begin(), m_Layer.end(), std::back_inserter( m_Found ),
+                [&]( std::uint32_t i_Id )
+                {
+                  return i_Id != 0 && !m_pScene->IgnoredIds().contains( i_Id );
+                } );
+  return Layers;
+}
+
+void VSceneFrame::DrawView()
+{
+  m_pScene->Clear( *m_pContext, m_Input.Options );
+  m_pContext->SetLightVector( LightDirection( m_pContext->YUp() ) );
+  // A camera view draws its scene once for each tile of its grid, and without a grid not at all.
+  if ( !m_Input.Options.CameraView )
+  {
+    m_pScene->DrawScene( *m_pContext, m_Input.Options );
+  }
+  m_pScene->DrawPost( *m_pContext, m_Input.Options );
+}
+
+void VSceneFrame::DrawVisible( QOpenGLFramebufferObject& io_rTarget )
+{
+  m_pContext->SetRenderMode( ERenderModeNormal );
+  m_pContext->SetDefaultFramebuffer( io_rTarget.handle() );
+  m_pContext->BindDefaultFramebuffer();
+  m_pContext->BindFramebufferTexture( HighlightUnit, m_pSelectionTarget.get() );
+  DrawView();
+  m_pContext->BindTexture( HighlightUnit, 0 );
+  m_pContext->ResetState();
+  PaintOverlay( io_rTarget );
+  m_pContext->ReleaseVertexArray();
+}
+
+void VSceneFrame::PaintOverlay( const QOpenGLFramebufferObject& i_rTarget )
+{
+  const bool bBand = m_Input.PickMode == EPickBand && m_Input.BandStart != m_Input.Pointer;
+  if ( !bBand && !m_pScene->WantsPaint( m_Input.Options ) )
+  {
+    return;
+  }
+  m_pContext->ReleaseVertexArray();
+  m_pContext->Functions()->glDisable( GL_SCISSOR_TEST );
+  QOpenGLPaintDevice Device( i_rTarget.size() );
+  QPainter Painter( &Device );
+  Painter.setRenderHint( QPainter::Antialiasing );
+  if ( bBand )
+  {
+    Painter.setPen( QColor( 231, 101, 0, 255 ) );
+    Painter.setBrush( QColor( 75, 120, 170, 64 ) );
+    Painter.drawRect( QRectF( m_Input.BandStart, m_Input.Pointer ).normalized() );
+  }
+  m_pScene->Paint( Painter, *m_pContext, m_Input.Options );
+  Painter.end();
+}
+
+void VSceneFrame::ReadGl( const QOpenGLFramebufferObject& i_rTarget )
+{
+  QOpenGLExtraFunctions& rGl = *m_pContext->Functions();
+  const QOpenGLContext& rContext = *m_pContext->Context();
+  const bool bCore = rContext.format().profile() == QSurfaceFormat::CoreProfile;
+  m_Gl[QStringLiteral( "vendor" )] = GlText( rGl, GL_VENDOR );
+  m_Gl[QStringLiteral( "renderer" )] = GlText( rGl, GL_RENDERER );
+  m_Gl[QStringLiteral( "version" )] = GlText( rGl, GL_VERSION );
+  m_Gl[QStringLiteral( "glsl" )] = GlText( rGl, GL_SHADING_LANGUAGE_VERSION );
+  m_Gl[QStringLiteral( "profile" )] = rContext.isOpenGLES() ? "es" : bCore ? "core" : "compatibility";
+  m_Gl[QStringLiteral( "width" )] = i_rTarget.width();
+  m_Gl[QStringLiteral( "height" )] = i_rTarget.height();
+  m_Gl[QStringLiteral( "samples" )] = i_rTarget.format().samples();
+}
+
+} // namespace MoxelGraphics
