@@ -1,0 +1,62 @@
+#include "SceneSetup.h"
+
+#include <CoreMoxelTypes/FlowTypes.h>
+#include <HostFlow/VFlowFramework.h>
+
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+
+namespace SceneBench
+{
+
+VOffscreen::VOffscreen()
+{
+  QSurfaceFormat Format;
+  Format.setVersion( 4, 3 );
+  Format.setProfile( QSurfaceFormat::CoreProfile );
+  Format.setDepthBufferSize( 24 );
+  m_Surface.setFormat( Format );
+  m_Surface.create();
+  m_Context.setFormat( Format );
+  if ( !m_Context.create() || !m_Context.makeCurrent( &m_Surface ) )
+  {
+    std::fprintf( stderr, "no OpenGL context\n" );
+    std::exit( 1 );
+  }
+  m_pTarget = std::make_unique< QOpenGLFramebufferObject >( Width, Height, QOpenGLFramebufferObject::Depth );
+}
+
+MoxelGraphics::VScenePoint PointAt( std::size_t i_Index, std::size_t i_Count, int i_Frame )
+{
+  const auto Place = static_cast< float >( i_Index ) / static_cast< float >( i_Count );
+  const float Angle = 40.0F * Place + 0.02F * static_cast< float >( i_Frame );
+  const float Radius = 400.0F + 2200.0F * Place;
+  return { Radius * std::cos( Angle ), Radius * std::sin( Angle ),
+           50.0F + 1700.0F * std::fmod( Place * 37.0F + 0.002F * static_cast< float >( i_Frame ), 1.0F ), 7.0F };
+}
+
+VReconstructionScene::VReconstructionScene( std::size_t i_Count )
+  : VFlowScene( nullptr, nullptr, nullptr, nullptr, false )
+{
+  const ZEK::VFlowStateFactoryRef Factory = HostFlow::MakeStateFactory();
+  const ZEK::VFlowStoreRef Store = HostFlow::MakeItemStore();
+  for ( int Frame = 0; Frame < FrameCount; ++Frame )
+  {
+    ZEK::IResult Status;
+    ZEK::VFlowItemRef Item;
+    Store->CreateItem( Status, ZEK::FlowValueType< CoreMoxelTypes::FlowReconstructionSet >::Descriptor, Item );
+    auto& rSet = *ZEK::FlowMutablePayload< CoreMoxelTypes::VReconstructionSet >( Item.Get() );
+    for ( std::size_t Index = 0; Index < i_Count; ++Index )
+    {
+      const MoxelGraphics::VScenePoint Point = PointAt( Index, i_Count, Frame );
+      rSet.Items.push_back( { static_cast< std::uint32_t >( Index + 1 ), { Point.X, Point.Y, Point.Z }, 7, 0, 3 } );
+    }
+    ZEK::VFlowStateRef State;
+    (void)Factory->CreateState( State, { Frame, 1, 1 }, {}, {} );
+    State->AddItem( Item );
+    m_States.push_back( std::move( State ) );
+  }
+}
+
+} // namespace SceneBench

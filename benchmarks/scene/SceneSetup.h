@@ -1,0 +1,71 @@
+#pragma once
+
+#include <CoreGraphics/VCameraController.h>
+#include <Flow2Graphics/VFlowScene.h>
+#include <MoxelGraphics/VSceneFrame.h>
+#include <ZEK/FlowState.h>
+
+#include <QtGui/QOffscreenSurface>
+#include <QtGui/QOpenGLContext>
+#include <QtOpenGL/QOpenGLFramebufferObject>
+
+#include <memory>
+#include <vector>
+
+namespace SceneBench
+{
+
+inline constexpr int Width = 1280;
+inline constexpr int Height = 720;
+inline constexpr int FrameCount = 60;
+
+/// A current 4.3 core context without a window, and a target without samples.
+class VOffscreen
+{
+public:
+  VOffscreen();
+  QOpenGLFramebufferObject& Target() { return *m_pTarget; }
+
+private:
+  QOffscreenSurface m_Surface;
+  QOpenGLContext m_Context;
+  std::unique_ptr< QOpenGLFramebufferObject > m_pTarget;
+};
+
+/// Where reconstruction `i_Index` is in frame `i_Frame`, mm: on circles through the volume.
+MoxelGraphics::VScenePoint PointAt( std::size_t i_Index, std::size_t i_Count, int i_Frame );
+
+/// Frames of state that hold only moving reconstructions, and the scene that draws them through its real path.
+class VReconstructionScene : public Flow2Graphics::VFlowScene
+{
+public:
+  explicit VReconstructionScene( std::size_t i_Count );
+
+  void Show( int i_Frame )
+  {
+    m_Newest = m_States[static_cast< std::size_t >( i_Frame % FrameCount )];
+    MarkDirty();
+  }
+
+protected:
+  ZEK::VFlowStateRef FetchState() override { return m_Newest; }
+
+private:
+  std::vector< ZEK::VFlowStateRef > m_States;
+  ZEK::VFlowStateRef m_Newest;
+};
+
+/// The least that draws the same spheres: one mapped buffer and one instanced draw, over a cleared target.
+class VSphereFloor
+{
+public:
+  explicit VSphereFloor( std::size_t i_Count );
+  ~VSphereFloor();
+  void Draw( int i_Frame );
+
+private:
+  struct VGl;
+  std::unique_ptr< VGl > m_pGl;
+};
+
+} // namespace SceneBench
