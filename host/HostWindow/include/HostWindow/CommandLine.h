@@ -1,0 +1,81 @@
+#pragma once
+
+#include <HostWindow/ViewAction.h>
+
+#include <HostSources/IFrameSource.h>
+
+#include <cstdint>
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace HostWindow
+{
+
+/// What the program ends with.
+enum EExit : int
+{
+  EExitOk = 0,
+  EExitUsage = 2,
+  EExitPlugin = 3,
+  EExitDisplay = 4,
+  EExitFile = 5
+};
+
+enum class EProgramMode
+{
+  Window,
+  Open,
+  Render,
+  Info
+};
+
+/// What holds for every mode.
+struct VCommonOptions
+{
+  std::filesystem::path Plugin; ///< empty: the module that lies beside the program
+  std::filesystem::path ContentRoot;
+  std::string Profile = "subjects";
+  std::optional< std::uint32_t > Flags; ///< overrules the profile
+  bool bDeveloper = false;
+  bool bCoreProfile = true;
+  int LogLevel = 3;
+  std::optional< HostSources::EUpAxis > Up;
+};
+
+struct VRenderOptions
+{
+  std::string Window = "3d";
+  std::vector< std::string > Sources{ "simulated" };
+  double Time = 0; ///< s
+  int Width = 1280;
+  int Height = 720;
+  double Ratio = 1;
+  std::vector< VViewAction > Actions; ///< in the order given
+  std::filesystem::path Output;
+  std::filesystem::path Report;
+  bool bAll = false;
+  std::filesystem::path OutputDir = "output";
+};
+
+struct VCommandLine
+{
+  EProgramMode Mode = EProgramMode::Window;
+  VCommonOptions Common;
+  VRenderOptions Render;
+  std::vector< std::string > Files; ///< of `open` and `info`
+  bool bJson = false;
+};
+
+/// How the reading of a command line ended.
+struct VParseResult
+{
+  std::optional< int > Exit; ///< set when the program has nothing more to do
+  std::string Output;        ///< for stdout
+  std::string Error;         ///< for stderr, one line
+};
+
+VParseResult ParseCommandLine( int i_Count, const char* const* i_ppArguments, VCommandLine& o_rLine );
+
+} // namespace HostWindow

@@ -1,0 +1,55 @@
+#pragma once
+
+#include <QtCore/QPointer>
+#include <QtCore/QStringList>
+#include <QtCore/QVariant>
+#include <QtQuick/QQuickItem>
+#include <QtQuickWidgets/QQuickWidget>
+#include <QtWidgets/QWidget>
+
+namespace HostWindow
+{
+
+/// The scene view inside the content of a workspace window, reached through Qt's meta-object alone: the host knows no
+/// class of the plug-in. Every operation is safe when the content is gone or its document failed to load. Thread: GUI.
+class VSceneView
+{
+public:
+  VSceneView() = default;
+  explicit VSceneView( QWidget* i_pContent )
+    : m_pContent( i_pContent )
+  {
+  }
+
+  QQuickWidget* Widget() const;
+  /// The item that draws the scene; null until the document is loaded, or when it has none.
+  QQuickItem* Item() const;
+  /// What went wrong with the document; empty when nothing did.
+  QString LoadErrors() const;
+
+  QStringList OptionKeys() const;
+  QVariant Option( const QString& i_rKey ) const;
+  /// False when the view has no such option.
+  bool SetOption( const QString& i_rKey, const QVariant& i_rValue );
+
+  void SetViewType( int i_Index );
+  void FocusSelected();
+  /// Runs a command of the window; false when it knows none of that text.
+  bool ExecuteCommand( const std::string& i_rText );
+
+  void SetReporting( bool i_bOn );
+  QVariantMap FrameReport() const;
+  /// The number of frames drawn so far.
+  qint64 Frames() const;
+  QString ToolTip() const;
+
+private:
+  QPointer< QWidget > m_pContent;
+  mutable QPointer< QQuickWidget > m_pWidget;
+  mutable QPointer< QQuickItem > m_pItem;
+};
+
+/// Those of `i_rNames` that look most like `i_rName`, for a message about a name that does not exist.
+QStringList Nearest( const QString& i_rName, const QStringList& i_rNames, int i_Most = 3 );
+
+} // namespace HostWindow

@@ -1,0 +1,107 @@
+#include <HostWindow/RecordingLoader.h>
+
+#include <HostSources/ReadRecording.h>
+
+#include <QtCore/QMetaObject>
+
+namespace HostWindow
+{
+
+struct VRecordingLoader::VJob
+{
+  QString Path;
+  std::atomic< bool > bCancel{ false };
+  std::shared_ptr< HostSources::VRecording > pRecording = std::make_shared< HostSources::VRecording >();
+  std::string Message;
+  ZEK::IResult Result;
+};
+
+VRecordingLoader::VRecordingLoader( QObject* i_pParent )
+  : QObject( i_pParent )
+{
+}
+
+VRecordingLoader::~VRecordingLoader()
+{
+  Abandon();
+}
+
+void VRecordingLoader::Abandon()
+{
+  if ( m_pJob )
+  {
+    m_pJob->bCancel = true;
+  }
+  m_pJob.reset();
+  if ( m_Thread.joinable() )
+  {
+    m_Thread.join();
+  }
+}
+
+void VRecordingLoader::Load( const QString& i_rPath )
+{
+  Abandon();
+  m_pJob = std::make_shared< VJob >();
+  m_pJob->Path = i_rPath;
+  m_Thread = std::thread(
+      [this, pJob = m_pJob]
+      {
+        int LastPercent = -1;
+        const auto OnProgress = [&]( double i_Fraction )
+        {
+          const int Percent = static_cast< int >( i_Fraction * 100 );
+          if ( Percent != LastPercent )
+          {
+            LastPercent = Percent;
+            QMetaObject::invokeMethod(
+                this,
+                [this, pJob, i_Fraction]
+                {
+                  if ( pJob == m_pJob )
+                  {
+                    emit Progress( pJob->Path, i_Fraction );
+                  }
+                },
+                Qt::QueuedConnection );
+          }
+          return !pJob->bCancel;
+        };
+        pJob->Result =
+            HostSources::ReadRecording( pJob->Path.toStdString(), *pJob->pRecording, pJob->Message, OnProgress );
+        QMetaObject::invokeMethod(
+            this,
+            [this, pJob]
+            {
+              Finish( pJob );
+            },
+            Qt::QueuedConnection );
+      } );
+}
+
+void VRecordingLoader::Cancel()
+{
+  if ( m_pJob )
+  {
+    m_pJob->bCancel = true;
+  }
+}
+
+void VRecordingLoader::Finish( const std::shared_ptr< VJob >& i_rpJob )
+{
+  if ( i_rpJob != m_pJob )
+  {
+    return;
+  }
+  m_Thread.join();
+  m_pJob.reset();
+  const QString Message = QString::fromStdString( i_rpJob->Message );
+  if ( i_rpJob->Result.IsError() )
+  {
+    emit Failed( i_rpJob->Path, Message, i_rpJob->Result.Code() );
+    return;
+  }
+  emit Loaded( i_rpJob->Path, i_rpJob->pRecording, Message );
+}
+
+} // namespace HostWindow
