@@ -85,6 +85,7 @@ void VSceneFrame::Resize( QSize i_Size )
   m_Size = i_Size;
   m_pSelectionTarget.reset();
   m_pOutlineTarget.reset();
+  m_Gl.clear();
   m_bMaskDirty = true;
   if ( i_Size.isEmpty() )
   {

@@ -171,6 +171,10 @@ std::uint32_t VSelectionRegistry::AllocateLabelled( const ZEK::VSelectionItem& i
   const std::uint32_t Id = Allocate( i_rItem, i_Count );
   if ( Id != 0 )
   {
+    if ( m_LabelCount > 0 && m_Labels[m_LabelCount - 1].Id == Id )
+    {
+      --m_LabelCount;
+    }
     if ( m_LabelCount == m_Labels.size() )
     {
       m_Labels.emplace_back();

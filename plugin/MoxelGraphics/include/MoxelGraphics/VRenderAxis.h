@@ -29,7 +29,6 @@ public:
 
 private:
   struct VGl;
-  std::shared_ptr< CoreGraphics::VResources > m_pResources;
   std::unique_ptr< VGl > m_pGl;
 };
 

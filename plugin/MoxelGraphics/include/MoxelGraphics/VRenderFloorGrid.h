@@ -25,15 +25,15 @@ public:
 
   /// x minimum, y minimum, x maximum, y maximum in mm.
   void SetExtents( const std::array< int, 4 >& i_rExtents ) { m_Extents = i_rExtents; }
-  const std::array< int, 4 >& Extents() const { return m_Extents; }
+  const std::array< int, 4 >& GetExtents() const { return m_Extents; }
   /// `i_Spacing` in mm between thick lines; thin ones divide it. Values of 0 or less leave what is set.
   void SetSpacing( float i_Spacing, int i_Subdivision );
 
 private:
   struct VGl;
-  void MakeObjects( CoreGraphics::VRenderContext& io_rContext );
+  void RenderGrid( CoreGraphics::VRenderContext& io_rContext, bool i_bTranslucent );
+  void RenderBorder( CoreGraphics::VRenderContext& io_rContext );
 
-  std::shared_ptr< CoreGraphics::VResources > m_pResources;
   std::unique_ptr< VGl > m_pGl;
   std::array< int, 4 > m_Extents{ -3000, -3000, 3000, 3000 };
   float m_Spacing = 1000.0f;

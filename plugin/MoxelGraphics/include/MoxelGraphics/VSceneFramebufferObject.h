@@ -12,6 +12,7 @@
 #include <QtQml/QQmlPropertyMap>
 #include <QtQuick/QQuickFramebufferObject>
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -56,7 +57,7 @@ public:
   Renderer* createRenderer() const override;
 
   QObject* Scene() const;
-  /// A `VMoxelScene`, taken once: the renderer keeps the first one that it was made with.
+  /// A `VMoxelScene` held by shared pointer, or null. Anything else is refused.
   void SetScene( QObject* i_pScene );
   QObject* CameraGrid() const { return m_pCameraGrid; }
   void SetCameraGrid( QObject* i_pGrid ) { m_pCameraGrid = i_pGrid; }
@@ -65,7 +66,7 @@ public:
   const VSceneOptions& Options() const { return m_Options; }
   QString PreviewCamera() const { return m_PreviewCamera; }
   void SetPreviewCamera( const QString& i_rURN );
-  int CameraType() const { return m_CameraType; }
+  int CameraType() const;
   /// The view type of the camera controller: 0 "Perspective" to 6 "Bottom". Others are ignored.
   void SetCameraType( int i_Type );
   QString ToolTipText() const { return m_ToolTipText; }
@@ -84,7 +85,12 @@ public:
   const std::shared_ptr< CoreGraphics::VCameraController >& Controller() const { return m_pController; }
   /// What lies under the pointer or in the band, as of the last pick that was delivered.
   const ZEK::VSelection& Preselection() const { return m_Preselection; }
+  const std::vector< std::string >& PreselectionLabels() const { return m_PreselectionLabels; }
+  /// What the last click or band picked, whatever it then did to the selection; `SelectionChanged` announces it.
+  const ZEK::VSelection& Picked() const { return m_Picked; }
   const std::vector< std::string >& PickedLabels() const { return m_PickedLabels; }
+  /// True while a click or a band waits for its pick; a few frames end that.
+  bool IsPickPending() const { return m_PickMode == EPickClick || m_PickMode == EPickBandDone; }
 
   /// Sets one option as a person would: the map, the record, bindings and the view follow.
   Q_INVOKABLE void setOption( const QString& i_rKey, const QVariant& i_rValue );
@@ -92,8 +98,10 @@ public:
   void OptionsRestored();
   /// Measures the stages of each frame with glFinish, which slows frames down. Off at first.
   Q_INVOKABLE void setReporting( bool i_bOn ) { m_bReporting = i_bOn; }
-  /// "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "labels", "notice" of the last frame that
-  /// was synchronised; one more frame brings the figures of this one.
+  /// Every frame asks for the next. For the next renderer that is made.
+  void SetContinuousUpdate( bool i_bOn ) { m_bContinuous = i_bOn; }
+  /// "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames" of the frame that was drawn before the last
+  /// one; "labels" of the preselection, "picked_labels" of the last commit, "notice".
   Q_INVOKABLE QVariantMap frameReport() const;
 
 public slots:
@@ -126,55 +134,62 @@ protected:
   void hoverMoveEvent( QHoverEvent* i_pEvent ) override;
   void hoverLeaveEvent( QHoverEvent* i_pEvent ) override;
 
+  QSGNode* updatePaintNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData ) override;
+
 private:
   friend class VSceneFramebufferRenderer;
-  struct VPicked;
+  struct VSynced;
 
+  double Ratio() const;
   void TakeModifiers( Qt::KeyboardModifiers i_Modifiers );
-  void SetPointer( const QPointF& i_rPosition );
-  /// Sync phase: hands the frame its orders, takes what the last one found.
-  void FillInput( VSceneFrame& io_rFrame );
-  void TakeResult( const VSceneFrame& i_rFrame );
-  void TakeReport( VSceneFrame& i_rFrame );
-  void CheckGraphicsApi();
-  void SetNotice( const QString& i_rNotice );
-  /// GUI thread, a later turn: what a pick changes.
-  void ApplyPick( const VPicked& i_rPicked );
-  void SetToolTip( const std::vector< std::string >& i_rLabels );
+  /// Asks for a frame, and for a second one that brings what the first has picked.
+  void Refresh();
+  void Change( QString& io_rText, const QString& i_rText, void ( VSceneFramebufferObject::*i_pSignal )() );
 
-  QPointer< QObject > m_pSceneObject;
+  // Sync phase, on the render thread with the GUI thread held.
+  void Exchange( VSceneFrame& io_rFrame );
+  void TakeResult( const VSceneFrame& i_rFrame );
+  void GiveOrders( VSceneFrame& io_rFrame );
+  void FollowTracking();
+  void Post( std::function< void() > i_Function );
+
+  /// GUI thread, a later turn: what a pick changes.
+  void ApplyPick( const VPickResult& i_rResult );
+  void Preselect( const ZEK::VSelection& i_rSelection, const std::vector< std::string >& i_rLabels );
+
   std::shared_ptr< VMoxelScene > m_pScene;
   QPointer< QObject > m_pCameraGrid;
   std::shared_ptr< CoreGraphics::VCameraController > m_pController;
   QQmlPropertyMap* m_pOptionsMap = nullptr;
   VSceneOptions m_Options;
   QString m_PreviewCamera;
-  int m_CameraType = 0;
   QString m_ToolTipText;
   QString m_Notice;
   QList< QObject* > m_CameraObjects;
   QList< QObject* > m_SubjectObjects;
   bool m_bShowCameraNumbers = false;
+  bool m_bContinuous = false;
   bool m_bReporting = false;
   bool m_bApiRefused = false;
 
-  QPointF m_Pointer;
+  QPointF m_Pointer; ///< item pixels, as the next
   QPointF m_PressPoint;
+  QPointF m_CommitPoint; ///< where the button was let go: a pick that commits looks there, wherever the pointer is
   QPointF m_BandStart;
-  int m_PickMode = 0;
+  int m_PickMode = EPickNone;
   int m_PreselectColour = 0;
   ZEK::ESelectionEdit m_Edit = ZEK::ESelectionEdit::Replace;
   bool m_bClickPending = false;
+  bool m_bFollowUp = false;
   bool m_bFocusPending = false;
   ETracking m_Tracking = ETrackNone;
-  ETracking m_SyncedTracking = ETrackNone;
   ZEK::VSelection m_TrackedSelection;
 
   ZEK::VSelection m_Preselection;
+  std::vector< std::string > m_PreselectionLabels;
+  ZEK::VSelection m_Picked;
   std::vector< std::string > m_PickedLabels;
-  ZEK::VSelection m_DeliveredSelection;
-  std::vector< std::string > m_DeliveredLabels;
-  QVariantMap m_Report;
+  std::unique_ptr< VSynced > m_pSynced;
 };
 
 } // namespace MoxelGraphics

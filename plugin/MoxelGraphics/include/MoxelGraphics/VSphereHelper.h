@@ -19,6 +19,7 @@ class QRect;
 
 namespace CoreGraphics
 {
+class VMesh;
 class VRenderContext;
 class VResources;
 } // namespace CoreGraphics
@@ -59,20 +60,26 @@ public:
   const std::vector< VScenePoint >& Spheres() const { return m_Spheres; }
   std::uint32_t FirstId() const { return m_FirstId; }
   /// Whether any sphere is selected or preselected.
-  bool AnyMarked() const { return m_bAnyMarked; }
+  bool AnyMarked() const { return m_MarkedEnd > m_MarkedBegin; }
 
 private:
   friend class VSphereHelper;
   struct VGl;
 
   void MeasureBox();
+  float Radius( const VScenePoint& i_rSphere, const VSphereSizing& i_rSizing ) const;
+  /// The radius in pixels that a sphere of the batch has at most.
+  float PixelRadius( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing ) const;
+  bool UploadSpheres( const VSphereSizing& i_rSizing );
+  bool UploadColours();
+  bool UploadFlags( const VMoxelScene& i_rScene, bool i_bIgnoring );
 
   std::vector< VScenePoint > m_Spheres;
   std::vector< std::uint32_t > m_Colours; ///< empty: one colour
   std::array< float, 4 > m_Colour{ 1, 1, 1, 1 };
   std::vector< std::uint8_t > m_Flags; ///< as many as spheres, or empty: none set
   std::uint32_t m_FirstId = 0;
-  bool m_bAnyMarked = false;
+  std::uint32_t m_MarkedBegin = 0, m_MarkedEnd = 0; ///< all selected and preselected ones lie in between
   std::array< float, 3 > m_BoxMin{}, m_BoxMax{};
   float m_LargestRadius = 0;
   std::uint64_t m_SpheresGeneration = 1;
@@ -94,8 +101,8 @@ public:
   /// Draws the batch as the context's render mode asks. The batch must live until the next `Clear`.
   void Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene, VSphereBatch& io_rBatch,
              const VSphereSizing& i_rSizing );
-  /// Appends the id of every sphere drawn since `Clear` whose centre lies in the rectangle, bounds included, unless
-  /// it lies behind the eye. The rectangle is in pixels of the context's frame, y up.
+  /// Appends the id of every sphere drawn in the selection mode since `Clear` whose centre lies in the rectangle,
+  /// bounds included, unless it lies behind the eye. The rectangle is in pixels of the context's frame, y up.
   void PickInRect( const CoreGraphics::VRenderContext& i_rContext, const QRect& i_rRect,
                    std::vector< std::uint32_t >& io_rIds ) const;
 
@@ -105,13 +112,11 @@ private:
   {
     const VSphereBatch* pBatch = nullptr;
     QMatrix4x4 ViewProjection;
+    VSphereSizing Sizing;
   };
 
-  void MakeObjects();
-  void Upload( VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing );
-  void UploadFlags( VSphereBatch& io_rBatch, const VMoxelScene& i_rScene, int i_RenderMode );
-  bool IsNear( const CoreGraphics::VRenderContext& i_rContext, const VSphereBatch& i_rBatch,
-               const VSphereSizing& i_rSizing ) const;
+  bool Feed( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene, VSphereBatch& io_rBatch,
+             const VSphereSizing& i_rSizing, CoreGraphics::VMesh* i_pMesh, std::uint32_t i_First );
 
   std::shared_ptr< CoreGraphics::VResources > m_pResources;
   std::unique_ptr< VGl > m_pGl;

@@ -1,0 +1,191 @@
+#include <MoxelGraphics/VSphereHelper.h>
+
+#include "VSphereBatchGl.h"
+
+#include <MoxelGraphics/VMoxelScene.h>
+
+#include <CoreGraphics/VMesh.h>
+#include <CoreGraphics/VProgramPair.h>
+#include <CoreGraphics/VRenderContext.h>
+#include <CoreGraphics/VResources.h>
+
+namespace MoxelGraphics
+{
+namespace
+{
+using namespace CoreGraphics;
+
+const VVertexLayout SphereLayout( sizeof( VScenePoint ), 1, { { EAttributeReconPosAndSize, 4, GL_FLOAT, false, 0 } } );
+const VVertexLayout ColourLayout( 4, 1, { { EAttributeModelColour, 4, GL_UNSIGNED_BYTE, true, 0 } } );
+const VVertexLayout FlagsLayout( 1, 1, { { EAttributeInstanceFlags, 1, GL_UNSIGNED_BYTE, false, 0 } } );
+
+// The same buffers, a vertex a sphere.
+const VVertexLayout PointLayout( sizeof( VScenePoint ), 0, { { EAttributePosition, 4, GL_FLOAT, false, 0 } } );
+const VVertexLayout PointColourLayout( 4, 0, { { EAttributeModelColour, 4, GL_UNSIGNED_BYTE, true, 0 } } );
+const VVertexLayout PointFlagsLayout( 1, 0, { { EAttributeInstanceFlags, 1, GL_UNSIGNED_BYTE, false, 0 } } );
+
+/// Spheres of at least this radius in pixels get the fine mesh.
+constexpr float FinePixels = 12.0f;
+/// Below this a sphere is a point: nobody sees the difference, and it costs a vertex in place of 42.
+constexpr float CoarsePixels = 1.0f;
+
+VRenderState SphereState()
+{
+  VRenderState State;
+  State.cullMode = ECullBack;
+  State.depthFunction = EDepthLessOrEqual;
+  return State;
+}
+} // namespace
+
+struct VSphereHelper::VGl
+{
+  VInstancedProgramPair Programs;
+  VInstancedProgramPair Points;
+  VMesh Fine = MakeSphereMesh( 2 );
+  VMesh Coarse = MakeSphereMesh( 1 );
+  VRenderState State = SphereState();
+};
+
+VSphereHelper::VSphereHelper( std::shared_ptr< CoreGraphics::VResources > i_pResources )
+  : m_pResources( std::move( i_pResources ) )
+  , m_pGl( std::make_unique< VGl >() )
+{
+  m_pGl->Programs.Load( *m_pResources, "Sphere", "SimpleLighting" );
+  m_pGl->Points.LoadPoints( *m_pResources, "SpherePoint", "SimpleLighting" );
+}
+
+VSphereHelper::~VSphereHelper() = default;
+
+void VSphereHelper::Clear()
+{
+  m_Drawn.clear();
+}
+
+void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene,
+                          VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing )
+{
+  const int Mode = io_rContext.RenderMode();
+  const bool bVisible = Mode == ERenderModeNormal;
+  const bool bNothing = io_rBatch.IsEmpty() || ( !bVisible && io_rBatch.FirstId() == 0 ) ||
+                        ( Mode == ERenderModeHighlight && !io_rBatch.AnyMarked() );
+  if ( bNothing )
+  {
+    return;
+  }
+  if ( Mode == ERenderModeSelection )
+  {
+    m_Drawn.push_back( { &io_rBatch, io_rContext.ViewProjection(), i_rSizing } );
+  }
+  // In the highlight mask only the stretch that holds all marked spheres is drawn.
+  const std::uint32_t First = Mode == ERenderModeHighlight ? io_rBatch.m_MarkedBegin : 0;
+  const std::uint32_t End =
+      Mode == ERenderModeHighlight ? io_rBatch.m_MarkedEnd : static_cast< std::uint32_t >( io_rBatch.Count() );
+  const float Pixels = io_rBatch.PixelRadius( io_rContext, i_rSizing );
+  VMesh* pMesh = Pixels < CoarsePixels ? nullptr : Pixels < FinePixels ? &m_pGl->Coarse : &m_pGl->Fine;
+  VInstancedProgramPair& rPrograms = pMesh ? m_pGl->Programs : m_pGl->Points;
+  if ( !rPrograms.Use( io_rContext, io_rBatch.FirstId() == 0 ? 0 : io_rBatch.FirstId() + First ) )
+  {
+    return;
+  }
+  if ( !io_rBatch.m_pGl )
+  {
+    io_rBatch.m_pGl = std::make_unique< VSphereBatch::VGl >();
+  }
+  // A second attempt writes everything again: the buffers may have died with the windows that shared them.
+  if ( !Feed( io_rContext, i_rScene, io_rBatch, i_rSizing, pMesh, First ) )
+  {
+    io_rBatch.m_pGl->Forget();
+    if ( !Feed( io_rContext, i_rScene, io_rBatch, i_rSizing, pMesh, First ) )
+    {
+      return;
+    }
+  }
+  io_rContext.SetRenderState( m_pGl->State );
+  if ( pMesh )
+  {
+    io_rContext.DrawElementsInstanced( GL_TRIANGLES, *pMesh, static_cast< int >( End - First ) );
+  }
+  else
+  {
+    io_rContext.DrawArrays( GL_POINTS, static_cast< int >( End - First ) );
+  }
+}
+
+bool VSphereHelper::Feed( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene,
+                          VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing, CoreGraphics::VMesh* i_pMesh,
+                          std::uint32_t i_First )
+{
+  VSphereBatch::VGl& rGl = *io_rBatch.m_pGl;
+  if ( !io_rBatch.UploadSpheres( i_rSizing ) )
+  {
+    return false;
+  }
+  std::array< VVertexStream, 3 > Streams;
+  std::size_t Count = 0;
+  if ( i_pMesh )
+  {
+    Streams[Count++] = i_pMesh->Stream();
+  }
+  Streams[Count++] = { &rGl.Spheres, i_pMesh ? &SphereLayout : &PointLayout, i_First * sizeof( VScenePoint ) };
+  const bool bVisible = io_rContext.RenderMode() == ERenderModeNormal;
+  if ( !bVisible )
+  {
+    const bool bIgnoring = io_rContext.RenderMode() == ERenderModeSelection && !i_rScene.IgnoredIds().empty();
+    if ( !io_rBatch.UploadFlags( i_rScene, bIgnoring ) )
+    {
+      return false;
+    }
+    Streams[Count++] = { &rGl.Flags, i_pMesh ? &FlagsLayout : &PointFlagsLayout, i_First };
+  }
+  else if ( !io_rBatch.m_Colours.empty() )
+  {
+    if ( !io_rBatch.UploadColours() )
+    {
+      return false;
+    }
+    Streams[Count++] = { &rGl.Colours, i_pMesh ? &ColourLayout : &PointColourLayout, 0 };
+  }
+  if ( !io_rContext.SetVertexStreams( std::span( Streams ).first( Count ) ) )
+  {
+    return false;
+  }
+  if ( bVisible && io_rBatch.m_Colours.empty() )
+  {
+    const auto& rColour = io_rBatch.m_Colour;
+    io_rContext.SetConstantAttribute( EAttributeModelColour, { rColour[0], rColour[1], rColour[2], rColour[3] } );
+  }
+  return true;
+}
+
+void VSphereHelper::PickInRect( const CoreGraphics::VRenderContext& i_rContext, const QRect& i_rRect,
+                                std::vector< std::uint32_t >& io_rIds ) const
+{
+  const float Width = static_cast< float >( i_rContext.FrameSize().width() );
+  const float Height = static_cast< float >( i_rContext.FrameSize().height() );
+  const float Left = 2.0f * static_cast< float >( i_rRect.left() ) / Width - 1.0f;
+  const float Right = 2.0f * static_cast< float >( i_rRect.left() + i_rRect.width() ) / Width - 1.0f;
+  const float Bottom = 2.0f * static_cast< float >( i_rRect.top() ) / Height - 1.0f;
+  const float Top = 2.0f * static_cast< float >( i_rRect.top() + i_rRect.height() ) / Height - 1.0f;
+  for ( const VDrawn& rDrawn : m_Drawn )
+  {
+    std::uint32_t Id = rDrawn.pBatch->FirstId();
+    for ( const VScenePoint& rSphere : rDrawn.pBatch->Spheres() )
+    {
+      const std::uint32_t Own = Id++;
+      if ( rDrawn.pBatch->Radius( rSphere, rDrawn.Sizing ) <= 0 )
+      {
+        continue;
+      }
+      const QVector4D Clip = rDrawn.ViewProjection * QVector4D( rSphere.X, rSphere.Y, rSphere.Z, 1.0f );
+      // Spheres behind the eye would come out mirrored into the rectangle.
+      if ( Clip.w() > 0 && Clip.x() >= Left * Clip.w() && Clip.x() <= Right * Clip.w() &&
+           Clip.y() >= Bottom * Clip.w() && Clip.y() <= Top * Clip.w() )
+      {
+        io_rIds.push_back( Own );
+      }
+    }
+  }
+}
+
+} // namespace MoxelGraphics
