@@ -29,7 +29,9 @@ std::filesystem::path Root( std::filesystem::path i_Given )
   }
   std::error_code Ignored;
   std::filesystem::path Absolute = std::filesystem::absolute( i_Given, Ignored );
-  return ( Absolute.empty() ? i_Given : Absolute ).lexically_normal();
+  const std::filesystem::path Normal = ( Absolute.empty() ? i_Given : Absolute ).lexically_normal();
+  // A separator at the end would make equal folders differ.
+  return Normal.has_filename() || Normal == Normal.root_path() ? Normal : Normal.parent_path();
 }
 } // namespace
 

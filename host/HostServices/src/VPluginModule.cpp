@@ -102,7 +102,8 @@ std::vector< std::filesystem::path > VPluginModule::SearchPaths( const std::stri
   const char* pOverride = std::getenv( "HARROW_PLUGIN" );
   if ( pOverride && *pOverride )
   {
-    return { std::filesystem::absolute( pOverride ) };
+    std::error_code Ignored;
+    return { std::filesystem::absolute( pOverride, Ignored ) };
   }
   const std::filesystem::path Program = ToPath( QCoreApplication::applicationDirPath() );
   return { ( Program / ".." / "lib" / "harrow" / i_rFile ).lexically_normal(),

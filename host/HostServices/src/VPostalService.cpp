@@ -148,32 +148,47 @@ public:
     return Instance;
   }
 
-  void Add( std::function< bool() > i_Close )
+  void Add( std::weak_ptr< void > i_pOwner, std::function< void() > i_Close )
   {
     const std::lock_guard Lock( m_Guard );
-    if ( m_Closers.empty() )
+    std::erase_if( m_Closers,
+                   []( const VCloser& i_rCloser )
+                   {
+                     return i_rCloser.pOwner.expired();
+                   } );
+    if ( !m_bListening )
     {
       qAddPostRoutine( &VEndOfApplication::CloseAll );
+      m_bListening = true;
     }
-    m_Closers.push_back( std::move( i_Close ) );
+    m_Closers.push_back( { std::move( i_pOwner ), std::move( i_Close ) } );
   }
 
 private:
+  struct VCloser
+  {
+    std::weak_ptr< void > pOwner;
+    std::function< void() > Close;
+  };
+
   static void CloseAll()
   {
-    std::vector< std::function< bool() > > Closers;
+    std::vector< VCloser > Closers;
     {
       const std::lock_guard Lock( Get().m_Guard );
       Closers.swap( Get().m_Closers );
+      // Routines are called once; another application object wants its own.
+      Get().m_bListening = false;
     }
-    for ( const auto& rClose : Closers )
+    for ( const VCloser& rCloser : Closers )
     {
-      rClose();
+      rCloser.Close();
     }
   }
 
   std::mutex m_Guard;
-  std::vector< std::function< bool() > > m_Closers;
+  std::vector< VCloser > m_Closers;
+  bool m_bListening = false;
 };
 } // namespace
 
@@ -181,16 +196,15 @@ VPostalService::VPostalService()
   : m_pState( std::make_shared< VState >() )
 {
   m_pState->pReceiver = std::make_unique< VState::VReceiver >( m_pState );
-  VEndOfApplication::Get().Add(
-      [pWeak = std::weak_ptr( m_pState )]
-      {
-        const auto pState = pWeak.lock();
-        if ( pState )
-        {
-          pState->Close();
-        }
-        return pState != nullptr;
-      } );
+  const std::weak_ptr< VState > pWeak = m_pState;
+  VEndOfApplication::Get().Add( pWeak,
+                                [pWeak]
+                                {
+                                  if ( const auto pState = pWeak.lock() )
+                                  {
+                                    pState->Close();
+                                  }
+                                } );
 }
 
 VPostalService::~VPostalService()

@@ -22,12 +22,12 @@ namespace HostServices
 
 struct VHostOptions
 {
-  std::filesystem::path ContentRoot; ///< empty: the application's data folder
-  std::filesystem::path UserRoot;    ///< empty: the application's data folder
-  std::filesystem::path Preferences; ///< empty: "preferences.json" in the application's configuration folder
-  QString FeatureFlags;              ///< a profile's name or a word; empty: "subjects". A bad text is logged at level 3
+  std::filesystem::path ContentRoot = {}; ///< empty: the application's data folder
+  std::filesystem::path UserRoot = {};    ///< empty: the application's data folder
+  std::filesystem::path Preferences = {}; ///< empty: "preferences.json" in the application's configuration folder
+  QString FeatureFlags = {}; ///< a profile's name or a word; empty: "subjects". A bad text is logged at level 3
   bool bDeveloperMode = false;
-  std::vector< std::filesystem::path > ShaderOverrideFolders;
+  std::vector< std::filesystem::path > ShaderOverrideFolders = {};
   std::size_t RingSize = 512;             ///< states that a cache keeps
   VPlaybackClock::VTimeFunction Now = {}; ///< of the playback clock; empty: the steady clock
 };

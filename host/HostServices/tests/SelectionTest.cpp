@@ -1,0 +1,208 @@
+#include <HostServices/VSelectionService.h>
+
+#include <gtest/gtest.h>
+
+#include <thread>
+
+using HostServices::VSelectionService;
+using ZEK::VSelection;
+using ZEK::VSelectionItem;
+constexpr auto Primary = ZEK::ISelectionService::EPrimary;
+constexpr auto Secondary = ZEK::ISelectionService::ESecondary;
+
+namespace
+{
+VSelectionItem Item( std::uint32_t i_Kind, const std::string& i_rDevice, std::uint32_t i_Sub = 0 )
+{
+  return { .Kind = i_Kind, .Device = i_rDevice, .Sub = i_Sub };
+}
+
+struct VCounter
+{
+  VCounter( VSelectionService& io_rService, const std::vector< std::uint32_t >& i_rKinds )
+    : Connection( io_rService.ForKinds( i_rKinds )
+                      ->Connect(
+                          [this]
+                          {
+                            ++Count;
+                          },
+                          nullptr ) )
+  {
+  }
+  /// The signals since the last question.
+  int Take() { return std::exchange( Count, 0 ); }
+
+  int Count = 0;
+  ZEK::VConnection Connection;
+};
+} // namespace
+
+TEST( SelectionService, SignalsOnceADistinctChangeOfItsKinds )
+{
+  VSelectionService Service;
+  VCounter Cameras( Service, { ZEK::ESelectCamera } );
+  VCounter Both( Service, { ZEK::ESelectMarker, ZEK::ESelectCamera, ZEK::ESelectMarker } );
+  VCounter Points( Service, { ZEK::ESelectReconstruction } );
+  VCounter All( Service, {} );
+  const auto Expect = [&]( int i_Cameras, int i_Both, int i_Points, int i_All, const char* i_pStep )
+  {
+    SCOPED_TRACE( i_pStep );
+    EXPECT_EQ( Cameras.Take(), i_Cameras );
+    EXPECT_EQ( Both.Take(), i_Both );
+    EXPECT_EQ( Points.Take(), i_Points );
+    EXPECT_EQ( All.Take(), i_All );
+  };
+  const VSelectionItem A = Item( ZEK::ESelectCamera, "A" );
+  const VSelectionItem B = Item( ZEK::ESelectCamera, "B" );
+  const VSelectionItem M = Item( ZEK::ESelectMarker, "S:M" );
+
+  Service.Set( Primary, { A, B } );
+  Expect( 1, 1, 0, 1, "two items at once are one change" );
+  Service.Set( Primary, { A, B } );
+  Expect( 0, 0, 0, 0, "an equal set" );
+  Service.Set( Primary, { A, B, M } );
+  Expect( 0, 1, 0, 1, "an item of another kind comes" );
+  Service.Set( Primary, { A, M } );
+  Expect( 1, 1, 0, 1, "one goes" );
+  Service.Set( Secondary, { A } );
+  Expect( 1, 1, 0, 1, "the other set" );
+  Service.Set( Primary, { M, A } );
+  Expect( 0, 1, 0, 1, "another order, hence another current item" );
+  Service.Set( Primary, {} );
+  Expect( 1, 1, 0, 1, "cleared" );
+  Service.Set( Primary, { Item( ZEK::ESelectReconstruction, "", 4 ) } );
+  Expect( 0, 0, 1, 1, "a point" );
+  Service.Set( Primary, { Item( ZEK::ESelectReconstruction, "", 5 ) } );
+  Expect( 0, 0, 1, 1, "another point of the same set" );
+}
+
+TEST( SelectionService, KeepsWhatIsSelectedWithoutDoublesAndTheLastAddedCurrent )
+{
+  VSelectionService Service;
+  const VSelectionItem A = Item( ZEK::ESelectCamera, "A" );
+  const VSelectionItem B = Item( ZEK::ESelectCentroid, "A", 7 );
+  const auto Before = Service.Generation();
+  Service.Set( Primary, { A, B, VSelectionItem{}, A } );
+  EXPECT_EQ( Service.Get( Primary ), ( VSelection{ B, A } ) );
+  EXPECT_EQ( Service.CurrentItem(), A );
+  EXPECT_GT( Service.Generation(), Before );
+  VSelection Found{ B };
+  EXPECT_TRUE( Service.Get( Primary, { ZEK::ESelectSubject, ZEK::ESelectCamera }, Found ) );
+  EXPECT_EQ( Found, ( VSelection{ A } ) );
+  EXPECT_FALSE( Service.Get( Primary, { ZEK::ESelectSubject }, Found ) );
+  EXPECT_TRUE( Found.empty() );
+  EXPECT_FALSE( Service.Get( Secondary, {}, Found ) );
+  Service.SetOnly( Primary, {} );
+  EXPECT_EQ( Service.CurrentItem().Kind, ZEK::ESelectNone );
+}
+
+TEST( SelectionService, AHandlerMayChangeTheSelectionItself )
+{
+  VSelectionService Service;
+  int Count = 0;
+  const auto Connection = Service.ForKinds( { ZEK::ESelectCamera } )
+                              ->Connect(
+                                  [&]
+                                  {
+                                    ++Count;
+                                    Service.Set( Secondary, Service.Get( Primary ) );
+                                  },
+                                  nullptr );
+  Service.SetOnly( Primary, Item( ZEK::ESelectCamera, "A" ) );
+  EXPECT_EQ( Count, 2 );
+  EXPECT_EQ( Service.Get( Secondary ), Service.Get( Primary ) );
+}
+
+TEST( SelectionService, TextsNameTheirItem )
+{
+  const VSelectionService Service;
+  EXPECT_EQ( Service.Text( Item( ZEK::ESelectCamera, "cam 12/top" ) ), "cam 12/top" );
+  EXPECT_EQ( Service.FromName( "cam 12/top" ), Item( ZEK::ESelectCamera, "cam 12/top" ) );
+  EXPECT_EQ( Service.Text( { ZEK::ESelectMarker, "Walker:LFHD", 1, 4 } ), "@marker/1/4/Walker:LFHD" );
+
+  using namespace std::string_literals;
+  const std::vector< std::string > Names{ "",        "plain",     "with space", "a/b/c", "@", "@camera/0/0/x", "50%",
+                                          "«ü»\n\t", "zero\0in"s, "/",          "#1",    ":", "@marker/1/2/y" };
+  constexpr std::uint32_t Kinds[] = { 1, 2, 3, 5, 6, 7, 8, 9, 10, 11, 12, 27, 30, 33, 77, 0xffffffffu };
+  for ( const std::uint32_t Kind : Kinds )
+  {
+    for ( const std::string& rName : Names )
+    {
+      for ( const auto& [Object, Sub] : { std::pair{ 0ull, 0u }, { ~0ull, 5u }, { 12ull, ~0u } } )
+      {
+        const VSelectionItem Original{ Kind, rName, Object, Sub };
+        EXPECT_EQ( Service.FromName( Service.Text( Original ) ), Original ) << Service.Text( Original );
+      }
+    }
+  }
+}
+
+TEST( SelectionService, BadTextsNameNothing )
+{
+  const VSelectionService Service;
+  EXPECT_TRUE( Service.Text( {} ).empty() );
+  for ( const char* pText : { "", "@", "@marker", "@marker/1/2", "@nothing/1/2/a", "@marker/x/2/a", "@marker/1/-2/a",
+                              "@marker/1/4294967296/a", "@marker/ 1/2/a", "@marker//2/a", "@0/1/2/a", "@/1/2/a",
+                              "@marker/99999999999999999999/2/a" } )
+  {
+    EXPECT_EQ( Service.FromName( pText ), VSelectionItem{} ) << pText;
+  }
+}
+
+TEST( SelectionService, OnlyTheFourKindsTakeASubIndex )
+{
+  using FSetter = bool ( * )( VSelectionItem&, std::uint32_t );
+  const std::pair< std::uint32_t, FSetter > Setters[] = { { 2, &HostServices::SetCentroidIndex },
+                                                          { 3, &HostServices::SetMaskCellIndex },
+                                                          { 5, &HostServices::SetReconstructionIndex },
+                                                          { 30, &HostServices::SetGreyscaleBlobIndex } };
+  for ( std::uint32_t Kind = 0; Kind < 40; ++Kind )
+  {
+    bool bAny = false;
+    for ( const auto& [Own, pSetter] : Setters )
+    {
+      VSelectionItem Each = Item( Kind, "d", 3 );
+      EXPECT_EQ( pSetter( Each, 9 ), Kind == Own );
+      EXPECT_EQ( Each.Sub, Kind == Own ? 9u : 3u );
+      bAny = bAny || Kind == Own;
+    }
+    VSelectionItem Any = Item( Kind, "d", 3 );
+    EXPECT_EQ( HostServices::SetSubIndex( Any, 9 ), bAny );
+  }
+}
+
+TEST( SelectionService, IsReadByOtherThreadsWhileItChanges )
+{
+  VSelectionService Service;
+  std::atomic< bool > bStop = false;
+  std::atomic< bool > bTorn = false;
+  std::vector< std::thread > Readers;
+  for ( int Reader = 0; Reader < 2; ++Reader )
+  {
+    Readers.emplace_back(
+        [&]
+        {
+          std::uint64_t Last = 0;
+          while ( !bStop )
+          {
+            const std::uint64_t Now = Service.Generation();
+            const VSelection Seen = Service.Get( Primary );
+            // The writer sets pairs of equal devices only.
+            bTorn =
+                bTorn || Now < Last || Seen.size() % 2 != 0 || ( !Seen.empty() && Seen[0].Device != Seen[1].Device );
+            Last = Now;
+          }
+        } );
+  }
+  for ( int Round = 0; Round < 2000; ++Round )
+  {
+    const std::string Name = std::to_string( Round );
+    Service.Set( Primary, { Item( ZEK::ESelectCamera, Name ), Item( ZEK::ESelectCentroid, Name ) } );
+  }
+  bStop = true;
+  for ( std::thread& rReader : Readers )
+  {
+    rReader.join();
+  }
+  EXPECT_FALSE( bTorn );
+}
