@@ -12,13 +12,13 @@ namespace HostSources
 struct VSimulatedCaptureOptions
 {
   std::uint32_t Seed = 1;
-  std::uint32_t Cameras = 12;     ///< 0 to 256
-  std::uint32_t Performers = 2;   ///< 0 to 16
-  double RateHz = 120;            ///< 25 to 1000
-  double NoiseMm = 0.3;           ///< standard deviation of a reconstruction on each axis, 0 to 50
-  double GapProbability = 0.0005; ///< that a marker begins a gap of up to a fifth of a second in a fifth of a second
-  std::uint32_t ExtraPoints = 3;  ///< unlabelled points that come and go, 0 to 1000
-  bool bObjects = true;           ///< a prop and a calibration wand
+  std::uint32_t Cameras = 12;    ///< 0 to 256
+  std::uint32_t Performers = 2;  ///< 0 to 16
+  double RateHz = 120;           ///< 25 to 1000
+  double NoiseMm = 0.3;          ///< standard deviation of a reconstruction on each axis, 0 to 50
+  double GapProbability = 0.002; ///< that a marker is lost for a part of a fifth of a second, for each of them
+  std::uint32_t ExtraPoints = 3; ///< unlabelled points that come and go, 0 to 1000
+  bool bObjects = true;          ///< a prop and a calibration wand
   bool bForcePlates = true;
 };
 
@@ -31,8 +31,9 @@ struct VSimulatedCaptureOptions
 /// 0x1013 of each performer (names "Ada", "Ben", ... under the object selector); 0x1023 and 0x1025 of the two plates
 /// "Plate 1" and "Plate 2"; 0x1029; 0x1031; 0x100d and 0x100f. A label's `SubjectId` is `VSubject::Id`, its `MarkerId`
 /// the index into `VSubject::Markers`, which is also `VMarker::Id`. Prop, wand and extra points have no label.
-/// 0x1025 holds the samples of the frame's own time, at a whole multiple of the rate near 1000 Hz. All but 0x100d,
-/// 0x100f and 0x1025 are the same objects in every state; 0x100f and 0x1025 are handed on while nothing changed.
+/// 0x1025 holds the samples of the frame's own time, at a whole multiple of the rate near 1000 Hz; the moment is about
+/// the middle of the plate. All but 0x100d and 0x1025 are the same objects in every state; 0x100f is while no label
+/// comes or goes.
 class VSimulatedCapture final : public IFrameSource
 {
 public:

@@ -33,7 +33,7 @@ public:
   /// Asks for a frame in follow mode; before `StartFollow` it waits for it. The cache is emptied first when the frame
   /// lies before the one shown last, or when `i_bSeek` is set.
   void Show( std::int64_t i_Index, bool i_bSeek = false );
-  /// Returns when the newest frame asked for is in the cache (or failed), or the pump does not run.
+  /// Returns when the newest frame asked for is in the cache (or failed), or the pump does not follow.
   void WaitShown();
 
   /// Runs a function on the source while no frame is being made, on the calling thread.

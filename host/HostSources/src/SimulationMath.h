@@ -1,0 +1,107 @@
+#pragma once
+
+#include <CoreMoxelTypes/Basic.h>
+
+#include <cmath>
+#include <cstdint>
+
+namespace HostSources::Simulation
+{
+
+using CoreMoxelTypes::D3;
+
+inline constexpr double Pi = 3.14159265358979323846;
+
+inline D3 operator+( const D3& i_rA, const D3& i_rB )
+{
+  return { i_rA.x + i_rB.x, i_rA.y + i_rB.y, i_rA.z + i_rB.z };
+}
+inline D3 operator-( const D3& i_rA, const D3& i_rB )
+{
+  return { i_rA.x - i_rB.x, i_rA.y - i_rB.y, i_rA.z - i_rB.z };
+}
+inline D3 operator*( const D3& i_rA, double i_Scale )
+{
+  return { i_rA.x * i_Scale, i_rA.y * i_Scale, i_rA.z * i_Scale };
+}
+inline double Dot( const D3& i_rA, const D3& i_rB )
+{
+  return i_rA.x * i_rB.x + i_rA.y * i_rB.y + i_rA.z * i_rB.z;
+}
+inline D3 Cross( const D3& i_rA, const D3& i_rB )
+{
+  return { i_rA.y * i_rB.z - i_rA.z * i_rB.y, i_rA.z * i_rB.x - i_rA.x * i_rB.z, i_rA.x * i_rB.y - i_rA.y * i_rB.x };
+}
+inline double Length( const D3& i_rA )
+{
+  return std::sqrt( Dot( i_rA, i_rA ) );
+}
+inline D3 Unit( const D3& i_rA )
+{
+  return i_rA * ( 1.0 / Length( i_rA ) );
+}
+
+/// A body's place: `X` forward, `Y` to the left, `Z` up.
+struct VFrame
+{
+  D3 Origin, X{ 1, 0, 0 }, Y{ 0, 1, 0 }, Z{ 0, 0, 1 };
+
+  D3 Point( double i_X, double i_Y, double i_Z ) const { return Origin + X * i_X + Y * i_Y + Z * i_Z; }
+};
+
+/// Turned by an angle to the left.
+inline VFrame Yawed( const VFrame& i_rFrame, double i_Angle )
+{
+  const double C = std::cos( i_Angle ), S = std::sin( i_Angle );
+  return { i_rFrame.Origin, i_rFrame.X * C + i_rFrame.Y * S, i_rFrame.Y * C - i_rFrame.X * S, i_rFrame.Z };
+}
+/// With the nose down.
+inline VFrame Pitched( const VFrame& i_rFrame, double i_Angle )
+{
+  const double C = std::cos( i_Angle ), S = std::sin( i_Angle );
+  return { i_rFrame.Origin, i_rFrame.X * C - i_rFrame.Z * S, i_rFrame.Y, i_rFrame.Z * C + i_rFrame.X * S };
+}
+
+/// Numbers that look random and depend on nothing but what they are asked for: a frame is the same in whatever order
+/// frames are made.
+class VHash
+{
+public:
+  explicit VHash( std::uint64_t i_Seed )
+    : m_Value( Mixed( i_Seed + 0x9e3779b97f4a7c15u ) )
+  {
+  }
+  VHash With( std::uint64_t i_Part ) const { return VHash( m_Value ^ Mixed( i_Part ) ); }
+
+  std::uint64_t Bits() const { return m_Value; }
+  /// From 0 to below 1.
+  double Uniform() const { return static_cast< double >( m_Value >> 11 ) * 0x1p-53; }
+  /// Three independent normal numbers.
+  D3 Normal() const
+  {
+    const auto Pair = []( const VHash& i_rHash, double& o_rA, double& o_rB )
+    {
+      const double Radius = std::sqrt( -2 * std::log( 1 - i_rHash.Uniform() ) );
+      const double Angle = 2 * Pi * i_rHash.With( 1 ).Uniform();
+      o_rA = Radius * std::cos( Angle );
+      o_rB = Radius * std::sin( Angle );
+    };
+    D3 Result;
+    double Spare = 0;
+    Pair( With( 2 ), Result.x, Result.y );
+    Pair( With( 3 ), Result.z, Spare );
+    return Result;
+  }
+
+private:
+  static std::uint64_t Mixed( std::uint64_t i_Value )
+  {
+    i_Value = ( i_Value ^ ( i_Value >> 30 ) ) * 0xbf58476d1ce4e5b9u;
+    i_Value = ( i_Value ^ ( i_Value >> 27 ) ) * 0x94d049bb133111ebu;
+    return i_Value ^ ( i_Value >> 31 );
+  }
+
+  std::uint64_t m_Value;
+};
+
+} // namespace HostSources::Simulation

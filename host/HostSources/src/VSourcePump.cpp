@@ -1,0 +1,289 @@
+#include <HostSources/VSourcePump.h>
+
+#include <ZEK/Log.h>
+
+#include <algorithm>
+#include <chrono>
+#include <condition_variable>
+#include <mutex>
+#include <thread>
+
+using namespace ZEK;
+
+namespace HostSources
+{
+namespace
+{
+
+using VClock = std::chrono::steady_clock;
+
+const VLogCategory& Category()
+{
+  static const VLogCategory& rCategory = GlobalLog().Category( "Source" );
+  return rCategory;
+}
+
+} // namespace
+
+/// Two locks: one on the source, held while a frame is made, and one on what is asked and shown, never held then.
+/// Where both are taken, the source's comes first.
+struct VSourcePump::VImpl
+{
+  void Start( bool i_bLive, std::int64_t i_First );
+  void Stop();
+  void RunLive();
+  void RunFollow();
+  bool MakeAndAdd( std::int64_t i_Index, bool i_bClear );
+
+  std::shared_ptr< IFrameSource > pSource;
+  std::shared_ptr< IFlowWritableStateCache > pCache;
+  VStateMaker Maker;
+  std::mutex SourceGuard;
+  std::mutex ControlGuard; // start and stop
+  std::thread Thread;
+
+  mutable std::mutex Guard;
+  std::condition_variable Wake; // the pump waits
+  std::condition_variable Idle; // others wait for the pump
+  bool bRunning = false;
+  bool bLive = false;
+  bool bStop = false;
+  bool bFailing = false;
+  std::int64_t First = 0;
+  bool bAsked = false;
+  bool bBusy = false;
+  bool bSeek = false;
+  std::int64_t Asked = 0;
+  std::int64_t Shown = -1;
+  std::uint64_t Added = 0;
+  std::uint64_t Skipped = 0;
+  IResult Last;
+};
+
+VSourcePump::VSourcePump( std::shared_ptr< IFrameSource > i_pSource,
+                          std::shared_ptr< IFlowWritableStateCache > i_pCache, const VStateMaker& i_rMaker )
+  : m_pImpl( std::make_unique< VImpl >() )
+{
+  m_pImpl->pSource = std::move( i_pSource );
+  m_pImpl->pCache = std::move( i_pCache );
+  m_pImpl->Maker = i_rMaker;
+}
+
+VSourcePump::~VSourcePump()
+{
+  Stop();
+}
+
+bool VSourcePump::VImpl::MakeAndAdd( std::int64_t i_Index, bool i_bClear )
+{
+  VFlowStateRef State;
+  IResult Result;
+  {
+    const std::lock_guard Lock( SourceGuard );
+    Result = pSource->MakeState( i_Index, Maker, State );
+  }
+  if ( Result.IsOk() )
+  {
+    if ( i_bClear )
+    {
+      pCache->Clear();
+    }
+    Result = pCache->Add( State );
+  }
+  bool bFirstFailure = false;
+  {
+    const std::lock_guard Lock( Guard );
+    bFirstFailure = Result.IsError() && !bFailing;
+    bFailing = Result.IsError();
+    Last = Result;
+    if ( Result.IsOk() )
+    {
+      Shown = i_Index;
+      ++Added;
+    }
+  }
+  if ( bFirstFailure )
+  {
+    Log( Category(), ELogWarning, "Frame %1% of \"%2%\" could not be shown: %3%", i_Index, pSource->Name(),
+         Result.Text() );
+  }
+  return Result.IsOk();
+}
+
+void VSourcePump::VImpl::RunLive()
+{
+  const double Rate = pSource->RateHz();
+  const std::int64_t Count = pSource->FrameCount();
+  const VClock::time_point Begin = VClock::now();
+  std::unique_lock Lock( Guard );
+  const std::int64_t Begun = First;
+  std::int64_t Next = Begun;
+  while ( !bStop && ( Count < 0 || Next < Count ) )
+  {
+    const auto Due = Begin + std::chrono::duration_cast< VClock::duration >(
+                                 std::chrono::duration< double >( static_cast< double >( Next - Begun ) / Rate ) );
+    if ( Wake.wait_until( Lock, Due,
+                          [this]
+                          {
+                            return bStop;
+                          } ) )
+    {
+      break;
+    }
+    // The newest frame whose time has come; whatever lies between is left out.
+    const double Elapsed = std::chrono::duration< double >( VClock::now() - Begin ).count();
+    std::int64_t Index = std::max( Next, Begun + static_cast< std::int64_t >( Elapsed * Rate ) );
+    Index = Count < 0 ? Index : std::min( Index, Count - 1 );
+    Skipped += static_cast< std::uint64_t >( Index - Next );
+    Lock.unlock();
+    MakeAndAdd( Index, false );
+    Lock.lock();
+    Next = Index + 1;
+  }
+  // A source that ended keeps its last frame until it is stopped.
+  Wake.wait( Lock,
+             [this]
+             {
+               return bStop;
+             } );
+}
+
+void VSourcePump::VImpl::RunFollow()
+{
+  std::unique_lock Lock( Guard );
+  while ( true )
+  {
+    Wake.wait( Lock,
+               [this]
+               {
+                 return bStop || bAsked;
+               } );
+    if ( bStop )
+    {
+      return;
+    }
+    const std::int64_t Index = Asked;
+    const bool bClear = bSeek || Index < Shown;
+    bAsked = false;
+    bSeek = false;
+    bBusy = true;
+    Lock.unlock();
+    const bool bAdded = MakeAndAdd( Index, bClear );
+    Lock.lock();
+    bBusy = false;
+    bSeek = bSeek || ( bClear && !bAdded ); // the frame that comes instead stands before the others as well
+    Idle.notify_all();
+  }
+}
+
+void VSourcePump::VImpl::Start( bool i_bLive, std::int64_t i_First )
+{
+  const std::lock_guard Control( ControlGuard );
+  Stop();
+  {
+    const std::lock_guard Lock( Guard );
+    First = std::max< std::int64_t >( i_First, 0 );
+    bStop = false;
+    bRunning = true;
+    bLive = i_bLive;
+    bFailing = false;
+    Shown = -1;
+  }
+  Thread = std::thread( i_bLive ? &VImpl::RunLive : &VImpl::RunFollow, this );
+}
+
+void VSourcePump::VImpl::Stop()
+{
+  if ( !Thread.joinable() )
+  {
+    return;
+  }
+  {
+    const std::lock_guard Lock( Guard );
+    bStop = true;
+  }
+  Wake.notify_all();
+  Thread.join();
+  {
+    const std::lock_guard Lock( Guard );
+    bRunning = false;
+    bAsked = false;
+    bSeek = false;
+  }
+  Idle.notify_all();
+}
+
+void VSourcePump::StartLive( std::int64_t i_First )
+{
+  m_pImpl->Start( true, i_First );
+}
+
+void VSourcePump::StartFollow()
+{
+  m_pImpl->Start( false, 0 );
+}
+
+void VSourcePump::Stop()
+{
+  const std::lock_guard Control( m_pImpl->ControlGuard );
+  m_pImpl->Stop();
+}
+
+bool VSourcePump::IsRunning() const
+{
+  const std::lock_guard Lock( m_pImpl->Guard );
+  return m_pImpl->bRunning;
+}
+
+void VSourcePump::Show( std::int64_t i_Index, bool i_bSeek )
+{
+  {
+    const std::lock_guard Lock( m_pImpl->Guard );
+    m_pImpl->Asked = i_Index;
+    m_pImpl->bAsked = true;
+    m_pImpl->bSeek = m_pImpl->bSeek || i_bSeek;
+  }
+  m_pImpl->Wake.notify_all();
+}
+
+void VSourcePump::WaitShown()
+{
+  std::unique_lock Lock( m_pImpl->Guard );
+  m_pImpl->Idle.wait( Lock,
+                      [this]
+                      {
+                        return !m_pImpl->bRunning || m_pImpl->bLive || ( !m_pImpl->bAsked && !m_pImpl->bBusy );
+                      } );
+}
+
+void VSourcePump::WithSource( const std::function< void( IFrameSource& ) >& i_rFunction )
+{
+  const std::lock_guard Lock( m_pImpl->SourceGuard );
+  i_rFunction( *m_pImpl->pSource );
+}
+
+std::int64_t VSourcePump::ShownIndex() const
+{
+  const std::lock_guard Lock( m_pImpl->Guard );
+  return m_pImpl->Shown;
+}
+
+std::uint64_t VSourcePump::AddedCount() const
+{
+  const std::lock_guard Lock( m_pImpl->Guard );
+  return m_pImpl->Added;
+}
+
+std::uint64_t VSourcePump::SkippedCount() const
+{
+  const std::lock_guard Lock( m_pImpl->Guard );
+  return m_pImpl->Skipped;
+}
+
+IResult VSourcePump::LastResult() const
+{
+  const std::lock_guard Lock( m_pImpl->Guard );
+  return m_pImpl->Last;
+}
+
+} // namespace HostSources
