@@ -36,7 +36,7 @@ public:
   VRenderContext( const VRenderContext& ) = delete;
   VRenderContext& operator=( const VRenderContext& ) = delete;
 
-  bool IsInitialised() const { return m_pFunctions != nullptr; }
+  bool IsInitialised() const { return m_pFunctions && m_pContext; }
   /// Takes the current context. With none current it stays uninitialised.
   void Initialise();
   /// Puts OpenGL into the state that render types start from; called at the start and end of a frame, and whenever
@@ -187,17 +187,18 @@ private:
   void Touch();
   void ReadLimits();
   void StartDebugLogger();
+  void WriteDebugMessages();
+  void WriteErrors( const std::source_location& i_rWhere );
   void BindVertexArray();
-  void ForgetState();
+  void ResetFixedFunction();
   void Toggle( GLenum i_Capability, bool i_bOn, bool& io_rbState );
   void SetDepthWrite( bool i_bOn );
   void SetColourWrite( bool i_bOn );
   void ApplyBlend( const VRenderState& i_rState );
   void SendFixedUniforms( VShaderProgram& io_rProgram );
   bool SetStream( const VVertexStream& i_rStream, std::uint32_t& io_rEnabled, int& io_rCount );
-  void SetPointer( int i_Location, const VVertexStream& i_rStream, const VVertexElement& i_rElement, bool& io_rbBound );
+  void SetPointer( int i_Location, const VVertexStream& i_rStream, const VVertexElement& i_rElement );
   void SetEnabledArrays( std::uint32_t i_Mask );
-  bool BindIndices( VMesh& i_rMesh );
   void ActiveUnit( int i_Unit );
 
   QPointer< QOpenGLContext > m_pContext;
@@ -232,14 +233,13 @@ private:
   bool m_bLastStateKnown = false;
   std::array< VPointer, LocationCount > m_Pointers{};
   std::uint32_t m_EnabledArrays = 0;
-  std::uint64_t m_IndexSerial = 0;
   int m_ActiveUnit = 0;
-  GLuint m_BoundProgram = 0;
-  bool m_bVertexArrayBound = false;
+  std::uint64_t m_BoundLink = 0; // the link in use; 0 for none
 
   bool m_bES = false;
   bool m_bCompatibility = false;
   bool m_bSoftware = false;
+  bool m_bReadErrors = false;
   float m_MaximumPointSize = 1.0f;
   float m_Anisotropy = 1.0f;
   std::uint64_t m_DrawCalls = 0;

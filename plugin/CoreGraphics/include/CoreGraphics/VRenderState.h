@@ -60,6 +60,8 @@ struct VRenderState
   bool depthTest = true;
   bool depthWrite = true;
   bool colourWrite = true;
+
+  bool operator==( const VRenderState& ) const = default;
 };
 
 enum EMinFilter : int

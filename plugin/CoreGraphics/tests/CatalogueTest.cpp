@@ -1,0 +1,150 @@
+#include "TestContext.h"
+
+#include <CoreGraphics/ShaderResources.h>
+
+#include <QtCore/QDirIterator>
+#include <QtCore/QFile>
+#include <QtCore/QFileInfo>
+#include <QtCore/QRegularExpression>
+
+#include <map>
+#include <set>
+
+using namespace CoreGraphics;
+using namespace CoreGraphicsTests;
+
+namespace
+{
+struct VSource
+{
+  EShaderType Type;
+  QString Path;
+  QString Name;
+  QString Text;
+};
+
+std::vector< VSource > Catalogue()
+{
+  InitBasicShaderResources();
+  InitSceneShaderResources();
+  std::vector< VSource > Sources;
+  for ( const EShaderType Type : { EVertexShader, EFragmentShader } )
+  {
+    QDirIterator It( Type == EVertexShader ? ":/VertexShaders" : ":/FragmentShaders" );
+    while ( It.hasNext() )
+    {
+      QFile File( It.next() );
+      EXPECT_TRUE( File.open( QIODevice::ReadOnly ) );
+      const QFileInfo Info( File.fileName() );
+      EXPECT_EQ( Info.suffix(), "glsl" );
+      Sources.push_back( { Type, File.fileName(), Info.completeBaseName(), File.readAll() } );
+    }
+  }
+  return Sources;
+}
+
+std::string Name( const VSource& i_rSource )
+{
+  return i_rSource.Path.toStdString();
+}
+} // namespace
+
+class CatalogueTest : public testing::TestWithParam< EContextKind >
+{
+};
+INSTANTIATE_TEST_SUITE_P( Contexts, CatalogueTest, testing::Values( EKindCore, EKindCompatibility, EKindES ),
+                          KindName );
+
+TEST_P( CatalogueTest, EverySourceCompilesInEveryFormAndDialect )
+{
+  VTestContext Context( GetParam() );
+  for ( const VSource& rSource : Catalogue() )
+  {
+    for ( const EShaderForm Form : { EFormSingle, EFormInstanced, EFormInstancedSelection, EFormPointsSelection } )
+    {
+      EXPECT_TRUE( VShader( rSource.Path, rSource.Type, Form, EDialectES300 ).IsCompiled() ) << Name( rSource );
+      if ( GetParam() != EKindES )
+      {
+        EXPECT_TRUE( VShader( rSource.Path, rSource.Type, Form, EDialectDesktop330 ).IsCompiled() ) << Name( rSource );
+      }
+    }
+  }
+}
+
+TEST_P( CatalogueTest, EveryPairLinks )
+{
+  VTestContext Context( GetParam() );
+  VResources Resources;
+  ASSERT_TRUE( Resources.Prepare() );
+  const std::vector< std::array< const char*, 2 > > Pairs = {
+      { "FloorGrid", "FloorGrid" },    { "FloorGrid", "UniformColour" },      { "ScreenSpaceAxis", "Colour" },
+      { "Sphere", "SimpleLighting" },  { "SpherePoint", "SimpleLighting" },   { "SphereShadow", "Colour" },
+      { "Simple3D", "UniformColour" }, { "Simple3DUniformColour", "Colour" }, { "Simple3DVertexColour", "Colour" },
+      { "FullScreen", "Copy" } };
+  for ( const auto& [pVertex, pFragment] : Pairs )
+  {
+    EXPECT_TRUE( Resources.GetProgram( pVertex, pFragment )->IsUsable() ) << pVertex << ' ' << pFragment;
+    EXPECT_TRUE( Resources.GetProgram( pVertex, pFragment, EFormInstanced )->IsUsable() ) << pVertex;
+  }
+  // Whatever can be drawn can be picked.
+  for ( const VSource& rSource : Catalogue() )
+  {
+    if ( rSource.Type == EVertexShader )
+    {
+      const std::string Vertex = rSource.Name.toStdString();
+      EXPECT_TRUE( Resources.GetProgram( Vertex, "Selection" )->IsUsable() ) << Vertex;
+      EXPECT_TRUE( Resources.GetProgram( Vertex, "Selection", EFormInstancedSelection )->IsUsable() ) << Vertex;
+      EXPECT_TRUE( Resources.GetProgram( Vertex, "Selection", EFormPointsSelection )->IsUsable() ) << Vertex;
+    }
+  }
+}
+
+TEST( CatalogueText, PrecisionIsNeverLowered )
+{
+  const QRegularExpression Low( "\\b(lowp|mediump)\\b" );
+  const QRegularExpression Sampler( "uniform\\s+(?!sampler2D\\b)([iu]?sampler\\w+)" );
+  for ( const VSource& rSource : Catalogue() )
+  {
+    EXPECT_FALSE( rSource.Text.contains( Low ) ) << Name( rSource );
+    EXPECT_FALSE( rSource.Text.contains( Sampler ) ) << Name( rSource ) << ": a sampler without highp";
+    EXPECT_FALSE( rSource.Text.contains( "#version" ) ) << Name( rSource );
+  }
+}
+
+// A uniform with a misspelt name or another type compiles and links, and stays 0.
+TEST( CatalogueText, EveryUniformIsOneThatSomebodySets )
+{
+  std::map< QString, QString > Known = {
+      { "u_ViewProjection", "mat4" }, { "u_View", "mat4" },           { "u_Projection", "mat4" },
+      { "u_View2D", "vec4" },         { "u_ViewportSize", "vec2" },   { "u_ViewportOffset", "vec2" },
+      { "u_FrameSize", "vec2" },      { "u_LightVector", "vec3" },    { "u_Up", "vec3" },
+      { "u_GlobalTime", "float" },    { "u_CameraPosition", "vec3" }, { "u_Extents", "vec4" },
+      { "u_GridSpacings", "vec2" },   { "t_Texture", "sampler2D" },   { "t_DiffuseTexture", "sampler2D" },
+      { "u_Colour", "vec4" },         { "u_SelectionId", "vec3" } };
+  std::set< QString > PerObject;
+  for ( int Attribute = EAttributeModelTransform; Attribute < EAttributeInstanceFlags; ++Attribute )
+  {
+    const QString Uniform = AttributeName( EVertexAttribute( Attribute ) );
+    Known[Uniform] = Attribute == EAttributeModelTransform ? "mat4" : "vec4";
+    PerObject.insert( Uniform );
+  }
+  const QRegularExpression Declaration( "^(uniform|PER_OBJECT)\\s+(\\w+)\\s+(\\w+)\\s*[;\\[]",
+                                        QRegularExpression::MultilineOption );
+  int Found = 0;
+  for ( const VSource& rSource : Catalogue() )
+  {
+    for ( auto It = Declaration.globalMatch( rSource.Text ); It.hasNext(); ++Found )
+    {
+      const QRegularExpressionMatch Match = It.next();
+      const QString Uniform = Match.captured( 3 );
+      ASSERT_TRUE( Known.count( Uniform ) ) << Name( rSource ) << ' ' << Uniform.toStdString();
+      EXPECT_EQ( Match.captured( 2 ), Known[Uniform] ) << Name( rSource ) << ' ' << Uniform.toStdString();
+      if ( rSource.Type == EVertexShader )
+      {
+        EXPECT_EQ( Match.captured( 1 ) == "PER_OBJECT", PerObject.count( Uniform ) == 1 )
+            << Name( rSource ) << ' ' << Uniform.toStdString();
+      }
+    }
+  }
+  EXPECT_GT( Found, 20 );
+}

@@ -1,0 +1,12 @@
+uniform mat4 u_ViewProjection;
+
+attribute vec3 a_position;
+attribute vec4 a_colour;
+
+varying vec4 v_colour;
+
+void main()
+{
+  v_colour = a_colour;
+  gl_Position = u_ViewProjection * vec4( a_position, 1.0 );
+}
