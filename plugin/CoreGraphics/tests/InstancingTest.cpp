@@ -26,6 +26,21 @@ constexpr VVertexLayout PointLayout( 20, 0,
 constexpr VVertexLayout PointFlagLayout( 1, 0, { { EAttributeInstanceFlags, 1, GL_UNSIGNED_BYTE, false, 0 } } );
 constexpr std::uint32_t FirstId = 0x0FFFF0; // instances run over a byte's end
 constexpr std::size_t Instances = 40;
+
+// Over all channels of all pixels.
+int LargestDifference( const std::vector< std::uint32_t >& i_rA, const std::vector< std::uint32_t >& i_rB )
+{
+  int Largest = 0;
+  for ( std::size_t Pixel = 0; Pixel < i_rA.size(); ++Pixel )
+  {
+    for ( int Shift = 0; Shift < 32; Shift += 8 )
+    {
+      Largest = std::max( Largest,
+                          std::abs( int( ( i_rA[Pixel] >> Shift ) & 255 ) - int( ( i_rB[Pixel] >> Shift ) & 255 ) ) );
+    }
+  }
+  return Largest;
+}
 } // namespace
 
 class InstancingTest : public testing::TestWithParam< EContextKind >
@@ -129,7 +144,9 @@ TEST_P( InstancingTest, TheInstancedFormDrawsThePictureOfTheSingleForm )
   {
     const std::vector< std::uint32_t > Expected = OneByOne( Mode );
     EXPECT_GT( Context.Covered(), 300 ) << Mode;
-    EXPECT_EQ( AllAtOnce( Mode ), Expected ) << Mode;
+    const std::vector< std::uint32_t > Drawn = AllAtOnce( Mode );
+    // Lit colours may fall on either side of a rounding; ids may not.
+    EXPECT_LE( LargestDifference( Drawn, Expected ), Mode == ERenderModeNormal ? 1 : 0 ) << Mode;
   }
   // A draw of one object after a draw of many takes nothing over from it.
   const std::vector< std::uint32_t > First = OneByOne( ERenderModeNormal );

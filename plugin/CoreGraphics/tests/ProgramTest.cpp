@@ -162,7 +162,8 @@ TEST_P( ProgramTest, AnUnusableProgramIsRefused )
   const auto pUnlinked = Resources.GetProgram( "Fixed", "Colour" );
   EXPECT_FALSE( pUnlinked->IsUsable() );
   EXPECT_FALSE( Context.pRender->UseProgram( pUnlinked ) );
-  TestSupport::ExpectFailureLine( "Shader Failed To Compile<:/VertexShaders/NoSuchFile.glsl> Log=<Unknown error>" );
+  TestSupport::ExpectFailureLine(
+      "Shader Failed To Compile<:/VertexShaders/NoSuchFile.glsl> Log=<No such file or directory>" );
   const auto pMissing = Resources.GetProgram( "NoSuchFile", "Colour" );
   EXPECT_FALSE( Context.pRender->UseProgram( pMissing ) );
   EXPECT_EQ( pMissing->UniformLocation( "u_View" ), -1 );
