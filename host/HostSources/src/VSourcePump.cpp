@@ -130,9 +130,10 @@ void VSourcePump::VImpl::RunLive()
     {
       break;
     }
-    // The newest frame whose time has come; whatever lies between is left out.
+    // The newest frame whose time has come; whatever lies between is left out, but never the first.
     const double Elapsed = std::chrono::duration< double >( VClock::now() - Begin ).count();
-    std::int64_t Index = std::max( Next, Begun + static_cast< std::int64_t >( Elapsed * Rate ) );
+    const std::int64_t Late = Next > Begun ? static_cast< std::int64_t >( Elapsed * Rate ) : 0;
+    std::int64_t Index = std::max( Next, Begun + Late );
     Index = Count < 0 ? Index : std::min( Index, Count - 1 );
     Skipped += static_cast< std::uint64_t >( Index - Next );
     Lock.unlock();

@@ -157,11 +157,11 @@ void PutTrunk( VWriter& o_rWriter, const VFrame& i_rPelvis, const VFrame& i_rChe
 void PutArm( VWriter& o_rWriter, const VFrame& i_rChest, int i_Side, double i_Swing, double i_Scale )
 {
   const double Out = i_Side;
-  VFrame Upper = Pitched( i_rChest, -i_Swing * 0.42 - 0.05 );
+  VFrame Upper = Pitched( i_rChest, -i_Swing * 0.38 - 0.04 );
   Upper.Origin = i_rChest.Point( 0, Out * 185 * i_Scale, 205 * i_Scale );
   Upper.Z = Unit( Upper.Z - Upper.Y * ( Out * 0.13 ) ); // the arms hang a little away from the body
   const D3 Elbow = Upper.Point( 0, 0, -UpperArm * i_Scale );
-  VFrame Lower = Pitched( Upper, -0.45 - 0.25 * i_Swing );
+  VFrame Lower = Pitched( Upper, -0.32 - 0.16 * i_Swing );
   Lower.Origin = Elbow;
   const D3 Wrist = Lower.Point( 0, 0, -Forearm * i_Scale );
   VFrame Hand = Lower;
