@@ -39,20 +39,22 @@ struct VAnalogChannel
 
 /// A force plate, and what it felt.
 ///
-/// Plate axes: x and y along the surface, z down into the floor. `Wrench` holds, for each analog sample, the force on
-/// the body (N), its moment about the middle of the surface (N mm) and the centre of pressure (mm), all in world axes;
-/// the centre is NaN where the plate carries too little to have one. Empty for a plate whose channels are not there.
+/// Plate axes: x and y along the surface, z down into the floor when the corners stand in their proper order. `Wrench`
+/// holds, for each analog sample, the force on the body (N), its moment about the middle of the surface (N mm) and the
+/// centre of pressure (mm), all in world axes; the centre is NaN where the plate carries too little to have one. Empty
+/// for a plate whose channels are not there.
 struct VForcePlate
 {
   std::string Name;
   std::uint32_t Type = 0;
-  CoreMoxelTypes::D3 Corners[4];         ///< mm, world
-  CoreMoxelTypes::D3 Origin;             ///< mm, plate frame, with the sign that the file gives it
-  CoreMoxelTypes::Rigid Pose;            ///< from plate axes at the middle of the surface to the world
+  CoreMoxelTypes::D3 Corners[4]; ///< mm, world
+  CoreMoxelTypes::D3 Origin;     ///< mm, plate frame, with the sign that the file gives it
+  CoreMoxelTypes::D3 Sensor;     ///< mm, plate frame, from the middle of the surface: what the sensors turn about
+  CoreMoxelTypes::Rigid Pose;    ///< from plate axes at the middle of the surface to the world
   std::vector< std::uint32_t > Channels; ///< indices into the analog channels, from 0
   std::vector< std::array< float, 9 > > Wrench;
 
-  /// The force along the plate's own z axis; negative under load, as it is the force on the body and z points down.
+  /// The force on the body along the plate's z axis; negative under load, as z points down.
   double VerticalForce( std::size_t i_Sample ) const
   {
     const auto& rW = Wrench[i_Sample];

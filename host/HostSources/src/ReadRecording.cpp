@@ -1,0 +1,85 @@
+#include <HostSources/ReadRecording.h>
+
+#include <HostSources/VC3dReader.h>
+#include <HostSources/VTrcReader.h>
+
+#include <algorithm>
+#include <cctype>
+#include <new>
+
+namespace HostSources
+{
+namespace
+{
+bool HasSuffix( const std::filesystem::path& i_rPath, const char* i_pSuffix )
+{
+  std::string Suffix = i_rPath.extension().string();
+  std::transform( Suffix.begin(), Suffix.end(), Suffix.begin(),
+                  []( unsigned char i_Character )
+                  {
+                    return static_cast< char >( std::tolower( i_Character ) );
+                  } );
+  return Suffix == i_pSuffix;
+}
+} // namespace
+
+ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
+                            const VProgress& i_rProgress )
+{
+  o_rRecording = {};
+  o_rMessage.clear();
+  VFileSource Source;
+  const ZEK::IResult Opened = Source.Open( i_rPath, o_rMessage );
+  if ( Opened.IsError() )
+  {
+    return Opened;
+  }
+  const std::string Name = i_rPath.string();
+  if ( Source.Size() == 0 )
+  {
+    o_rMessage = Name + ": byte offset 0: expected a C3D or TRC recording, found an empty file";
+    return ZEK::IResult::EndOfData;
+  }
+  const auto Head = Source.Read( 0, 64 );
+  if ( Head.empty() )
+  {
+    o_rMessage = Name + ": byte offset 0: expected a C3D or TRC recording, and the file could not be read";
+    return ZEK::IResult::FileIOFailure;
+  }
+  const bool bC3d = LooksLikeC3d( Head ), bTrc = LooksLikeTrc( Head );
+  // With damaged first bytes the reader of the file's suffix can still say best what is wrong.
+  if ( bTrc || ( !bC3d && HasSuffix( i_rPath, ".trc" ) ) )
+  {
+    if ( i_rProgress && !i_rProgress( 0 ) )
+    {
+      o_rMessage = Name + ": the reading was stopped";
+      return ZEK::IResult::Canceled;
+    }
+    try
+    {
+      const auto Size = static_cast< std::size_t >( Source.Size() );
+      const auto Bytes = Source.Read( 0, Size );
+      if ( Bytes.size() == Size )
+      {
+        return ReadTrc( Bytes, Name, o_rRecording, o_rMessage, i_rProgress );
+      }
+      o_rMessage = Name + ": byte offset " + std::to_string( Bytes.size() ) + ": expected " + std::to_string( Size ) +
+                   " bytes, and they could not be read";
+      return ZEK::IResult::FileIOFailure;
+    }
+    catch ( const std::bad_alloc& )
+    {
+      o_rMessage = Name + ": expected memory for what the file holds, and there is not enough";
+      return ZEK::IResult::AllocationFailure;
+    }
+  }
+  if ( bC3d || HasSuffix( i_rPath, ".c3d" ) )
+  {
+    return ReadC3d( Source, Name, o_rRecording, o_rMessage, i_rProgress );
+  }
+  o_rMessage = Name + ": byte offset 0: expected a C3D file (0x50 at byte offset 1) or a TRC file (\"PathFileType\" " +
+               "in line 1), found neither";
+  return ZEK::IResult::InvalidFormat;
+}
+
+} // namespace HostSources

@@ -1,0 +1,160 @@
+#include "ReadHelpers.h"
+
+#include <rapidjson/document.h>
+
+#include <cmath>
+#include <fstream>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace HostSources
+{
+namespace
+{
+class ReadFile : public testing::Test
+{
+protected:
+  std::filesystem::path Save( const std::string& i_rName, std::span< const std::byte > i_Bytes )
+  {
+    const auto Path = m_Folder.Path() / i_rName;
+    std::ofstream( Path, std::ios::binary )
+        .write( reinterpret_cast< const char* >( i_Bytes.data() ), static_cast< std::streamsize >( i_Bytes.size() ) );
+    return Path;
+  }
+  void ExpectFailure( const std::filesystem::path& i_rPath, ZEK::IResult i_Expected, const std::string& i_rText )
+  {
+    VRecording Recording;
+    Recording.FrameCount = 5;
+    std::string Message;
+    EXPECT_EQ( ReadRecording( i_rPath, Recording, Message ), i_Expected );
+    EXPECT_THAT( Message, testing::StartsWith( i_rPath.string() + ": " ) );
+    EXPECT_THAT( Message, testing::HasSubstr( i_rText ) );
+    EXPECT_EQ( Recording.FrameCount, 0 ) << "what was there before must not seem to come from this file";
+  }
+
+  static C3dWriter::VFile LongFile()
+  {
+    C3dWriter::VFile File;
+    File.Points = 10;
+    for ( int Index = 0; Index < 10; ++Index )
+    {
+      File.Labels.push_back( "Body:M" + std::to_string( Index ) );
+    }
+    File.Frames.assign( 20000, std::vector< double >( 40, 1 ) );
+    return File;
+  }
+
+  TestSupport::VTemporaryDir m_Folder;
+};
+} // namespace
+
+TEST_F( ReadFile, WhatCannotBeReadIsNamed )
+{
+  ExpectFailure( m_Folder.Path() / "none.c3d", ZEK::IResult::FileNotFound, "found no such file" );
+  ExpectFailure( m_Folder.Path(), ZEK::IResult::FileIOFailure, "found a folder" );
+  ExpectFailure( Save( "empty.trc", {} ), ZEK::IResult::EndOfData, "byte offset 0: expected" );
+  ExpectFailure( Save( "other.txt", Bytes( "hello, world" ) ), ZEK::IResult::InvalidFormat, "found neither" );
+  ExpectFailure( Save( "other.trc", Bytes( "hello, world" ) ), ZEK::IResult::InvalidFormat, "line 1: expected" );
+  ExpectFailure( Save( "other.C3D", Bytes( "hello, world" ) ), ZEK::IResult::InvalidFormat, "byte offset 0: expected" );
+  const auto Pipe = m_Folder.Path() / "pipe.c3d";
+  ASSERT_EQ( mkfifo( Pipe.c_str(), 0600 ), 0 );
+  ExpectFailure( Pipe, ZEK::IResult::FileIOFailure, "no plain file" );
+  const auto Locked = Save( "locked.c3d", Bytes( "x" ) );
+  std::filesystem::permissions( Locked, std::filesystem::perms::none );
+  if ( access( Locked.c_str(), R_OK ) != 0 )
+  {
+    ExpectFailure( Locked, ZEK::IResult::FileIOFailure, "Permission denied" );
+  }
+}
+
+TEST_F( ReadFile, ContentCountsNotTheSuffix )
+{
+  const auto Path = Save( "really_c3d.trc", C3dWriter::Write( LongFile() ) );
+  const VRecording R = MustRead( Path );
+  EXPECT_EQ( R.Format, ERecordingFormat::C3d );
+  EXPECT_EQ( R.Name, "really_c3d.trc" );
+  EXPECT_EQ( R.FrameCount, 20000 );
+}
+
+TEST_F( ReadFile, ProgressRunsToTheEndOrStops )
+{
+  const auto Path = Save( "long.c3d", C3dWriter::Write( LongFile() ) );
+  VRecording Recording;
+  std::string Message;
+  std::vector< double > Steps;
+  EXPECT_TRUE( ReadRecording( Path, Recording, Message,
+                              [&]( double i_Fraction )
+                              {
+                                Steps.push_back( i_Fraction );
+                                return true;
+                              } )
+                   .IsOk() );
+  EXPECT_GT( Steps.size(), 3u );
+  EXPECT_TRUE( std::is_sorted( Steps.begin(), Steps.end() ) );
+  EXPECT_GE( Steps.front(), 0 );
+  EXPECT_LE( Steps.back(), 1 );
+  int Calls = 0;
+  EXPECT_EQ( ReadRecording( Path, Recording, Message,
+                            [&]( double )
+                            {
+                              return ++Calls < 2;
+                            } ),
+             ZEK::IResult( ZEK::IResult::Canceled ) );
+  EXPECT_EQ( Calls, 2 );
+  EXPECT_EQ( Recording.FrameCount, 0 );
+  const auto Text = Save( "some.trc", Bytes( "PathFileType\nDataRate\n5\nFrame#\tTime\tA\nX1\n1\t0\t1\t2\t3\n" ) );
+  EXPECT_EQ( ReadRecording( Text, Recording, Message,
+                            []( double i_Fraction )
+                            {
+                              return i_Fraction < 0.5;
+                            } ),
+             ZEK::IResult( ZEK::IResult::Canceled ) );
+}
+
+TEST_F( ReadFile, AMillionFrames )
+{
+  C3dWriter::VFile File;
+  File.bFloat = false;
+  File.Points = 1;
+  File.HeaderLast = 65535;
+  File.SetParameter( { "POINT", "LONG_FRAMES", 4, {}, { 1000000 }, {} } );
+  File.Frames.assign( 1000000, { 1, 2, 3, 0 } );
+  const VRecording R = MustRead( Save( "million.c3d", C3dWriter::Write( File ) ) );
+  EXPECT_EQ( R.FrameCount, 1000000 );
+  EXPECT_FLOAT_EQ( R.Frame( 999999 )[0].z, 0.3f );
+  EXPECT_EQ( R.Labels.front(), "" ) << "a point without a label stays without one";
+}
+
+TEST( RecordingInfo, JsonSaysWhatTheRecordingHolds )
+{
+  C3dWriter::VFile File;
+  File.Points = 2;
+  File.Channels = File.PerFrame = 1;
+  File.Labels = { "A \"quoted\"", "B" };
+  File.FirstFrame = 5;
+  File.Frames = { { 1, 2, 3, 0, 4, 5, 6, -1, 0 }, { 1, 2, 4, 0, 4, 5, 6, 0, 0 } };
+  File.SetParameter( { "ANALOG", "LABELS", -1, { 3, 1 }, {}, { "EMG" } } );
+  File.SetParameter( { "ANALOG", "UNITS", -1, { 2, 1 }, {}, { "mV" } } );
+  File.SetParameter( { "EVENT", "TIMES", 4, { 2, 1 }, { 0, 0.05 }, {} } );
+  const VRecordingInfo Info = DescribeRecording( MustReadC3d( File ) );
+  rapidjson::Document Json;
+  ASSERT_FALSE( Json.Parse( Info.Json().c_str() ).HasParseError() );
+  EXPECT_STREQ( Json["format"].GetString(), "C3D" );
+  EXPECT_STREQ( Json["form"].GetString(), "float, Intel" );
+  EXPECT_EQ( Json["frames"].GetInt(), 2 );
+  EXPECT_EQ( Json["firstFrame"].GetInt(), 5 );
+  EXPECT_EQ( Json["lastFrame"].GetInt(), 6 );
+  EXPECT_STREQ( Json["labels"][0].GetString(), "A \"quoted\"" );
+  EXPECT_EQ( Json["missingSamples"].GetInt(), 1 );
+  ASSERT_EQ( Json["gaps"].Size(), 1u );
+  EXPECT_STREQ( Json["gaps"][0]["label"].GetString(), "B" );
+  EXPECT_EQ( Json["bounds"]["max"][2].GetDouble(), 6 );
+  EXPECT_STREQ( Json["analogChannels"][0]["unit"].GetString(), "mV" );
+  EXPECT_NEAR( Json["events"][0]["seconds"].GetDouble(), 0.01, 1e-6 );
+  EXPECT_STREQ( Json["upAxis"].GetString(), "z" );
+  const std::string Text = Info.Text();
+  EXPECT_THAT( Text, testing::HasSubstr( "2 columns, 1 of 4 samples missing" ) );
+  EXPECT_THAT( Text, testing::HasSubstr( Info.UpAxisReason ) );
+}
+
+} // namespace HostSources

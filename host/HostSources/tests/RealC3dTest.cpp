@@ -1,0 +1,233 @@
+// The figures of real files, read from them by another program.
+
+#include "ReadHelpers.h"
+
+#include <set>
+
+namespace HostSources
+{
+namespace
+{
+VRecordingInfo::VPlate Plate( const VRecording& i_rRecording, std::size_t i_Index )
+{
+  const VRecordingInfo Info = DescribeRecording( i_rRecording );
+  return i_Index < Info.ForcePlates.size() ? Info.ForcePlates[i_Index] : VRecordingInfo::VPlate();
+}
+
+void ExpectPeak( const VRecordingInfo::VPlate& i_rPlate, double i_Force, std::uint64_t i_Sample, std::int64_t i_Frame,
+                 double i_X, double i_Y )
+{
+  SCOPED_TRACE( i_rPlate.Name );
+  EXPECT_NEAR( i_rPlate.PeakForce, i_Force, 0.006 );
+  EXPECT_EQ( i_rPlate.PeakSample, i_Sample );
+  EXPECT_EQ( i_rPlate.PeakFrame, i_Frame );
+  EXPECT_NEAR( i_rPlate.PeakCentre.x, i_X, 0.6 );
+  EXPECT_NEAR( i_rPlate.PeakCentre.y, i_Y, 0.6 );
+}
+
+void ExpectCorners( const VForcePlate& i_rPlate, std::array< double, 12 > i_Corners )
+{
+  for ( std::size_t Corner = 0; Corner < 4; ++Corner )
+  {
+    EXPECT_NEAR( i_rPlate.Corners[Corner].x, i_Corners[3 * Corner], 1e-3 );
+    EXPECT_NEAR( i_rPlate.Corners[Corner].y, i_Corners[3 * Corner + 1], 1e-3 );
+    EXPECT_NEAR( i_rPlate.Corners[Corner].z, i_Corners[3 * Corner + 2], 1e-3 );
+  }
+}
+} // namespace
+
+TEST( RealC3d, GaitHoldsItsPointsAndNames )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Gait = MustRead( TestSupport::RecordingsDir() / "c3d-trc/Gait.c3d" );
+  EXPECT_EQ( Gait.Form, "integer, DEC" );
+  EXPECT_EQ( Gait.PointCount(), 33u );
+  EXPECT_EQ( Gait.FirstFrame, 1 );
+  EXPECT_EQ( Gait.FrameCount, 487 );
+  EXPECT_EQ( Gait.RateHz, 100 );
+  EXPECT_EQ( Gait.Unit, "mm" );
+  EXPECT_EQ( Gait.GapCount, 9682u );
+  EXPECT_EQ( Gait.Points.size(), 16071u );
+  ExpectPoint( Gait, 243, "RSHO", 640.4994, 155.2884, 1381.1512 );
+  ExpectPoint( Gait, 243, "ROFF", 775.4001, 117.7126, 1296.1035 );
+
+  EXPECT_EQ( std::set( Gait.FileLabels.begin(), Gait.FileLabels.end() ).size(), 27u );
+  EXPECT_EQ( std::set( Gait.Labels.begin(), Gait.Labels.end() ).size(), 33u );
+  EXPECT_THAT( Gait.Labels, testing::IsSupersetOf( { "R.Ankle", "R.Ankle.Medial", "L.Foot.Lateral", "C7" } ) );
+  EXPECT_THAT( Gait.Labels, testing::Not( testing::Contains( "RANK" ) ) );
+  EXPECT_TRUE( Gait.Events.empty() );
+  EXPECT_EQ( Gait.UpAxis, EUpAxis::Z );
+  EXPECT_THAT( Gait.UpAxisReason, testing::HasSubstr( "POINT:Y_SCREEN is \"+Z\"" ) );
+}
+
+TEST( RealC3d, GaitHoldsItsAnalogChannelsAndForcePlatesOfType4 )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Gait = MustRead( TestSupport::RecordingsDir() / "c3d-trc/Gait.c3d" );
+  ASSERT_EQ( Gait.AnalogChannels.size(), 28u );
+  EXPECT_EQ( Gait.AnalogPerFrame, 10u );
+  EXPECT_EQ( Gait.AnalogRateHz(), 1000 );
+  EXPECT_EQ( Gait.AnalogChannels[0].Name, "F1X" );
+  EXPECT_EQ( Gait.AnalogChannels[3].Unit, "Nmm" );
+  const std::array< double, 4 > Raw{ 30, 8, 0, -11 };
+  for ( std::size_t Channel = 0; Channel < Raw.size(); ++Channel )
+  {
+    EXPECT_NEAR( static_cast< double >( Gait.Analog[Channel] ), Raw[Channel] * -0.1221001, 1e-5 );
+  }
+  ASSERT_EQ( Gait.ForcePlates.size(), 2u );
+  EXPECT_EQ( Gait.ForcePlates[0].Type, 4u );
+  ExpectCorners( Gait.ForcePlates[0], { -306.4, -620.7, 0, -306.4, -11.1, 0, 608, -11.1, 0, 608, -620.7, 0 } );
+  ExpectCorners( Gait.ForcePlates[1], { -9.3, -10.1, 0, -9.3, 599.5, 0, 905.1, 599.5, 0, 905.1, -10.1, 0 } );
+  EXPECT_NEAR( Gait.ForcePlates[0].Origin.x, -0.94, 1e-5 );
+  EXPECT_NEAR( Gait.ForcePlates[0].Origin.z, -59.428, 1e-5 );
+  EXPECT_NEAR( Gait.ForcePlates[1].Origin.y, -1.885, 1e-5 );
+  EXPECT_NEAR( Gait.ForcePlates[1].Origin.z, -52.979, 1e-5 );
+  ExpectPeak( Plate( Gait, 0 ), 798.41, 3007, 300, -50, -90 );
+  ExpectPeak( Plate( Gait, 1 ), 871.17, 2529, 252, 675, 74 );
+  // The force on the body points up, out of the floor.
+  EXPECT_GT( Gait.ForcePlates[0].Wrench[3007][2], 700.0f );
+  EXPECT_GT( Gait.ForcePlates[1].Wrench[2529][2], 700.0f );
+}
+
+TEST( RealC3d, Mocap36HoldsItsPointsAndGaps )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Mocap = MustRead( TestSupport::RecordingsDir() / "c3d-trc/mocap36.c3d" );
+  EXPECT_EQ( Mocap.Form, "float, Intel" );
+  EXPECT_EQ( Mocap.PointCount(), 36u );
+  EXPECT_EQ( Mocap.FirstFrame, 1 );
+  EXPECT_EQ( Mocap.FrameCount, 1380 );
+  EXPECT_EQ( Mocap.RateHz, 100 );
+  EXPECT_TRUE( Mocap.AnalogChannels.empty() );
+  EXPECT_TRUE( Mocap.ForcePlates.empty() );
+  ExpectPoint( Mocap, 0, "Skeleton_Hip1", 198.9177, 24.8411, 981.4937 );
+  ExpectPoint( Mocap, 0, "Skeleton_Hip2", -138.3683, 24.7229, 973.5464 );
+  ExpectPoint( Mocap, 690, "Skeleton_Hip2", -149.4506, 1544.8630, 954.0317 );
+  EXPECT_EQ( Mocap.Points.size(), 49680u );
+  EXPECT_EQ( Mocap.GapCount, 8244u );
+  for ( std::int64_t Frame = 0; Frame < Mocap.FrameCount; ++Frame )
+  {
+    const auto Points = Mocap.Frame( Frame );
+    const auto Valid = std::count_if( Points.begin(), Points.end(),
+                                      []( const VRecordingPoint& i_rPoint )
+                                      {
+                                        return i_rPoint.IsValid();
+                                      } );
+    ASSERT_EQ( Valid, Frame < 1380 - 229 ? 36 : 0 ) << Frame;
+  }
+  ExpectBounds( Mocap.Bounds, { -723, 766, -2222, 1815, 42, 1820 }, 0.6 );
+}
+
+TEST( RealC3d, EmgOnlyHoldsChannelsAndNoPoints )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Emg = MustRead( TestSupport::RecordingsDir() / "c3d-trc/emg-only.c3d" );
+  EXPECT_EQ( Emg.PointCount(), 0u );
+  EXPECT_EQ( Emg.FrameCount, 4564 );
+  EXPECT_EQ( Emg.RateHz, 1000 );
+  ASSERT_EQ( Emg.AnalogChannels.size(), 8u );
+  EXPECT_EQ( Emg.AnalogChannels[0].Name, "Right Rectus Femoris" );
+  EXPECT_EQ( Emg.AnalogChannels[7].Unit, "mV" );
+  EXPECT_EQ( Emg.Analog.size(), 8u * 4564u );
+  EXPECT_TRUE( std::all_of( Emg.Analog.begin(), Emg.Analog.end(),
+                            []( float i_Value )
+                            {
+                              return std::abs( i_Value ) < 100;
+                            } ) );
+  EXPECT_TRUE( Emg.Bounds.IsEmpty() );
+}
+
+TEST( RealC3d, QualisysHoldsPointsEventsAndForcePlatesOfType2 )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Walk = MustRead( TestSupport::RecordingsDir() / "c3d-gpl/Qualisys.c3d" );
+  EXPECT_EQ( Walk.Form, "float, Intel" );
+  EXPECT_EQ( Walk.PointCount(), 55u );
+  EXPECT_EQ( Walk.FirstFrame, 705 );
+  EXPECT_EQ( Walk.FrameCount, 340 );
+  EXPECT_EQ( Walk.RateHz, 200 );
+  EXPECT_EQ( Walk.GapCount, 0u );
+  ExpectPoint( Walk, 0, "L_IAS", -220.1226, 306.4248, 846.3361 );
+  ExpectPoint( Walk, 0, "L_IPS", -398.1731, 237.0688, 872.8574 );
+  ExpectPoint( Walk, 339, "L_IAS", 2266.2837, 315.5139, 856.4126 );
+  ExpectBounds( Walk.Bounds, { -606, 2439, -125, 527, 8, 1496 }, 0.6 );
+  EXPECT_EQ( Walk.AnalogChannels.size(), 69u );
+  EXPECT_EQ( Walk.AnalogRateHz(), 2000 );
+
+  ASSERT_EQ( Walk.ForcePlates.size(), 2u );
+  EXPECT_EQ( Walk.ForcePlates[0].Type, 2u );
+  EXPECT_THAT( Walk.ForcePlates[0].Channels, testing::ElementsAre( 57, 58, 59, 60, 61, 62 ) );
+  EXPECT_THAT( Walk.ForcePlates[1].Channels, testing::ElementsAre( 63, 64, 65, 66, 67, 68 ) );
+  ExpectCorners( Walk.ForcePlates[0], { 508, 464, 0, 508, 0, 0, 0, 0, 0, 0, 464, 0 } );
+  ExpectCorners( Walk.ForcePlates[1], { 1017, 464, 0, 1017, 0, 0, 509, 0, 0, 509, 464, 0 } );
+  EXPECT_NEAR( Walk.ForcePlates[0].Origin.z, 34.036, 1e-4 );
+  EXPECT_NEAR( Walk.ForcePlates[1].Origin.z, 36.322, 1e-4 );
+  ExpectPeak( Plate( Walk, 0 ), 808.43, 380, 38, 194, 292 );
+  ExpectPeak( Plate( Walk, 1 ), 839.72, 1294, 129, 814, 159 );
+  // This file holds the force on the plate; the force on the body is its opposite.
+  EXPECT_GT( Walk.ForcePlates[0].Wrench[380][2], 700.0f );
+
+  const std::array< std::pair< const char*, double >, 7 > Events{ { { "LHS", 3.590 },
+                                                                    { "RTO", 3.685 },
+                                                                    { "RHS", 4.050 },
+                                                                    { "LTO", 4.160 },
+                                                                    { "LHS", 4.535 },
+                                                                    { "RTO", 4.650 },
+                                                                    { "RHS", 5.030 } } };
+  ASSERT_EQ( Walk.Events.size(), Events.size() );
+  for ( std::size_t Index = 0; Index < Events.size(); ++Index )
+  {
+    EXPECT_EQ( Walk.Events[Index].Label, Events[Index].first );
+    EXPECT_EQ( Walk.Events[Index].Context, "" );
+    EXPECT_NEAR( Walk.Events[Index].FileSeconds, Events[Index].second, 1e-6 );
+    EXPECT_NEAR( Walk.Events[Index].Seconds, Events[Index].second - 3.52, 1e-6 );
+  }
+}
+
+TEST( RealC3d, ForcePlateOfType3 )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Stand = MustRead( TestSupport::RecordingsDir() / "c3d-gpl/FP_Type3.c3d" );
+  EXPECT_EQ( Stand.PointCount(), 34u );
+  EXPECT_EQ( Stand.FirstFrame, 1166 );
+  EXPECT_EQ( Stand.FrameCount, 2 );
+  EXPECT_EQ( Stand.RateHz, 250 );
+  ExpectPoint( Stand, 0, "LPSIS", 397.6465, 177.6959, 1175.8829 );
+  ExpectPoint( Stand, 0, "RPSIS", 493.9481, 183.7718, 1179.5167 );
+  EXPECT_EQ( Stand.AnalogChannels.size(), 16u );
+  EXPECT_EQ( Stand.AnalogRateHz(), 1000 );
+  ASSERT_EQ( Stand.ForcePlates.size(), 2u );
+  const VForcePlate& rPlate = Stand.ForcePlates[0];
+  EXPECT_EQ( rPlate.Type, 3u );
+  EXPECT_EQ( rPlate.Origin.x, 210 );
+  EXPECT_EQ( rPlate.Origin.y, 350 );
+  EXPECT_EQ( rPlate.Origin.z, -53 );
+  ExpectCorners(
+      rPlate, { 881.199, 581.160, -4.928, 880.102, -2.366, -5.843, -0.813, -6.946, -6.118, -4.827, 578.421, -6.172 } );
+  const VRecordingInfo::VPlate Info = Plate( Stand, 0 );
+  EXPECT_NEAR( Info.PeakForce, 886.7, 0.05 );
+  EXPECT_NEAR( Info.PeakCentre.x, 446.5, 0.5 );
+  EXPECT_NEAR( Info.PeakCentre.y, 291, 0.5 );
+  EXPECT_GT( rPlate.Wrench[0][2], 880.0f );
+  // Nobody stands on the second plate, so it has no centre of pressure.
+  EXPECT_TRUE( std::isnan( Stand.ForcePlates[1].Wrench[0][6] ) );
+}
+
+TEST( RealC3d, CutOffFileGivesItsWholeFrames )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const auto Path = TestSupport::RecordingsDir() / "c3d-gpl/Optotrak.c3d";
+  VRecording Cut;
+  std::string Message;
+  EXPECT_EQ( ReadRecording( Path, Cut, Message ), ZEK::IResult( ZEK::IResult::OkButPartial ) );
+  EXPECT_THAT( Message, testing::HasSubstr( Path.string() + ": byte offset 28640: expected 1149 frames" ) );
+  EXPECT_EQ( Cut.PointCount(), 54u );
+  EXPECT_EQ( Cut.FrameCount, 29 );
+  EXPECT_EQ( Cut.RateHz, 30 );
+  EXPECT_EQ( Cut.Points.size(), 1566u );
+  EXPECT_EQ( Cut.GapCount, 59u );
+  ExpectPoint( Cut, 0, "Marker_1", 326.3138, 328.6311, -366.1706 );
+  EXPECT_THAT( Cut.Notes, testing::Contains( testing::HasSubstr( "29 whole frames" ) ) );
+}
+
+} // namespace HostSources

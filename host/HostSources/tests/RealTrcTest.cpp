@@ -1,0 +1,150 @@
+// The figures of real files, read from them by another program.
+
+#include "ReadHelpers.h"
+
+#include <cmath>
+
+namespace HostSources
+{
+namespace
+{
+bool IsLabelled( const VRecording& i_rRecording, std::int64_t i_Frame )
+{
+  const auto Points = i_rRecording.Frame( i_Frame );
+  return std::any_of( Points.begin(), Points.end(),
+                      []( const VRecordingPoint& i_rPoint )
+                      {
+                        return i_rPoint.IsValid();
+                      } );
+}
+} // namespace
+
+TEST( RealTrc, GaitHoldsNamedAndUnnamedPoints )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Gait = MustRead( TestSupport::RecordingsDir() / "c3d-trc/Gait.trc" );
+  EXPECT_EQ( Gait.FrameCount, 487 );
+  EXPECT_EQ( Gait.RateHz, 100 );
+  EXPECT_EQ( Gait.Unit, "mm" );
+  EXPECT_EQ( Gait.PointCount(), 33u );
+  EXPECT_THAT( Gait.Notes, testing::Contains( "The header promises 66 markers; 33 have names." ) );
+  EXPECT_EQ( Gait.UnlabelledFrame( 0 ).size(), 2u );
+  EXPECT_EQ( Gait.UnlabelledFrame( 93 ).size(), 21u );
+  EXPECT_EQ( Gait.UnlabelledFrame( 486 ).size(), 8u );
+  std::int64_t First = -1, Labelled = 0;
+  std::size_t MostUnlabelled = 0;
+  for ( std::int64_t Frame = 0; Frame < Gait.FrameCount; ++Frame )
+  {
+    if ( IsLabelled( Gait, Frame ) )
+    {
+      First = First < 0 ? Frame : First;
+      ++Labelled;
+    }
+    else
+    {
+      MostUnlabelled = std::max( MostUnlabelled, Gait.UnlabelledFrame( Frame ).size() );
+    }
+  }
+  EXPECT_EQ( First, 159 );
+  EXPECT_EQ( Labelled, 280 );
+  EXPECT_EQ( MostUnlabelled, 33u );
+  ExpectPoint( Gait, 243, "R.Shoulder", 640.56439, 155.33781, 1381.36707 );
+  EXPECT_EQ( Gait.UpAxis, EUpAxis::Z );
+}
+
+TEST( RealTrc, GaitLiesNearTheSameTrialInTheOtherFormat )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Trc = MustRead( TestSupport::RecordingsDir() / "c3d-trc/Gait.trc" );
+  const VRecording C3d = MustRead( TestSupport::RecordingsDir() / "c3d-trc/Gait.c3d" );
+  ASSERT_EQ( Trc.Points.size(), C3d.Points.size() );
+  std::size_t Common = 0;
+  double Greatest = 0;
+  for ( std::size_t Index = 0; Index < Trc.Points.size(); ++Index )
+  {
+    const VRecordingPoint &rA = Trc.Points[Index], &rB = C3d.Points[Index];
+    if ( rA.IsValid() && rB.IsValid() )
+    {
+      ++Common;
+      Greatest =
+          std::max( Greatest, std::hypot( static_cast< double >( rA.x - rB.x ), static_cast< double >( rA.y - rB.y ),
+                                          static_cast< double >( rA.z - rB.z ) ) );
+    }
+  }
+  EXPECT_EQ( Common, 5515u );
+  EXPECT_NEAR( Greatest, 8.4, 0.05 );
+}
+
+TEST( RealTrc, UnnamedHoldsUnlabelledPointsOnly )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Unnamed = MustRead( TestSupport::RecordingsDir() / "c3d-trc/unnamed.trc" );
+  EXPECT_EQ( Unnamed.PointCount(), 0u );
+  EXPECT_EQ( Unnamed.FrameCount, 1313 );
+  EXPECT_EQ( Unnamed.RateHz, 400 );
+  EXPECT_EQ( Unnamed.Unlabelled.size(), 14911u );
+  std::size_t Least = 1000, Most = 0;
+  for ( std::int64_t Frame = 0; Frame < Unnamed.FrameCount; ++Frame )
+  {
+    Least = std::min( Least, Unnamed.UnlabelledFrame( Frame ).size() );
+    Most = std::max( Most, Unnamed.UnlabelledFrame( Frame ).size() );
+  }
+  EXPECT_EQ( Least, 3u );
+  EXPECT_EQ( Most, 27u );
+  ASSERT_EQ( Unnamed.UnlabelledFrame( 0 ).size(), 13u );
+  ExpectPoint( Unnamed.UnlabelledFrame( 0 )[0], -352.4512, 985.40039, 288.96054, 1e-4 );
+  EXPECT_EQ( Unnamed.UnlabelledFrame( 1312 ).size(), 24u );
+}
+
+TEST( RealTrc, FilesInMetresWithYUp )
+{
+  HARROW_NEEDS_RECORDINGS();
+  struct VCase
+  {
+    const char* pFile;
+    std::size_t Points;
+    std::int64_t Frames;
+  };
+  for ( const VCase& rCase :
+        { VCase{ "multicam-person/balancing/markers21.trc", 21, 100 },
+          VCase{ "multicam-person/balancing/markers64.trc", 64, 100 },
+          VCase{ "multicam-person/static/markers21.trc", 21, 12 }, VCase{ "fk-fullbody/markers21.trc", 21, 100 } } )
+  {
+    SCOPED_TRACE( rCase.pFile );
+    const VRecording Trial = MustRead( TestSupport::RecordingsDir() / rCase.pFile );
+    EXPECT_EQ( Trial.PointCount(), rCase.Points );
+    EXPECT_EQ( Trial.FrameCount, rCase.Frames );
+    EXPECT_EQ( Trial.RateHz, 60 );
+    EXPECT_EQ( Trial.Unit, "m" );
+    EXPECT_EQ( Trial.GapCount, 0u );
+    EXPECT_TRUE( Trial.Unlabelled.empty() );
+    EXPECT_EQ( Trial.UpAxis, EUpAxis::Y );
+    EXPECT_EQ( Trial.Labels.front(), "RHip" );
+  }
+}
+
+TEST( RealTrc, PositionsInMetresBecomeMillimetres )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const auto Folder = TestSupport::RecordingsDir() / "multicam-person";
+  const VRecording Body = MustRead( Folder / "balancing/markers21.trc" );
+  ExpectPoint( Body, 0, "RHip", -64.972, 901.505, -1400.589, 2e-3 );
+  ExpectPoint( Body, 0, "LWrist", 354.631, 937.762, -1458.089, 2e-3 );
+  ExpectPoint( Body, 99, "RHip", -59.509, 908.462, -659.343, 2e-3 );
+  EXPECT_EQ( Body.Labels.back(), "LWrist" );
+  const VRecording Surface = MustRead( Folder / "balancing/markers64.trc" );
+  ExpectPoint( Surface, 0, "RHip", -64.9978, 869.0172, -1400.5736, 2e-3 );
+  ExpectPoint( Surface, 0, "L_mwrist_study", 362.0462, 870.0455, -1483.688, 2e-3 );
+  const VRecording Still = MustRead( Folder / "static/markers21.trc" );
+  ExpectPoint( Still, 0, "RHip", -80.589, 869.695, 76.164, 2e-3 );
+  ExpectPoint( Still, 0, "LWrist", -68.235, 983.020, -508.783, 2e-3 );
+  for ( std::int64_t Frame = 1; Frame < Still.FrameCount; ++Frame )
+  {
+    for ( std::size_t Point = 0; Point < Still.PointCount(); ++Point )
+    {
+      ASSERT_EQ( Still.Frame( Frame )[Point].y, Still.Frame( 0 )[Point].y );
+    }
+  }
+}
+
+} // namespace HostSources
