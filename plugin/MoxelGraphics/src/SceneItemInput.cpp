@@ -29,7 +29,12 @@ void VSceneFramebufferObject::TakeModifiers( Qt::KeyboardModifiers i_Modifiers )
 {
   const bool bShift = i_Modifiers.testFlag( Qt::ShiftModifier );
   const bool bControl = i_Modifiers.testFlag( Qt::ControlModifier );
-  m_PreselectColour = bShift && bControl ? 2 : bShift ? 1 : bControl ? 3 : 0;
+  const int Colour = bShift && bControl ? 2 : bShift ? 1 : bControl ? 3 : 0;
+  if ( Colour != m_PreselectColour )
+  {
+    m_PreselectColour = Colour;
+    update();
+  }
   constexpr ZEK::ESelectionEdit Edits[] = { ZEK::ESelectionEdit::Replace, ZEK::ESelectionEdit::Add,
                                             ZEK::ESelectionEdit::Remove, ZEK::ESelectionEdit::Toggle };
   // A click that waits for its pick keeps the modifiers that it was made with.
@@ -156,6 +161,11 @@ void VSceneFramebufferObject::hoverEnterEvent( QHoverEvent* i_pEvent )
 void VSceneFramebufferObject::hoverMoveEvent( QHoverEvent* i_pEvent )
 {
   TakeModifiers( i_pEvent->modifiers() );
+  // Qt repeats the event after each frame; answering that with a frame would never end.
+  if ( m_PickMode == EPickHover && m_Pointer == i_pEvent->position() )
+  {
+    return;
+  }
   m_Pointer = i_pEvent->position();
   if ( !IsPickPending() )
   {

@@ -159,7 +159,7 @@ TEST_F( VFrameTest, InACornerTheWindowIsSmallerAndItsMiddleCounts )
 
 TEST_F( VFrameTest, ABandTakesWhatLiesInItAndBehind )
 {
-  std::vector< VScenePoint > Points = { { 0, 0, 0, 0 }, { 1500, 0, 0, 0 }, { -1500, 0, 0, 0 } };
+  std::vector< VScenePoint > Points = { { 0, 0, 0, 0 }, { 1500, 0, 300, 0 }, { -1500, 0, 300, 0 } };
   // Twenty more on the line from the first point to the eye, each hiding those behind it.
   const double Tilt = 30 * std::acos( -1.0 ) / 180.0;
   for ( int Step = 1; Step <= 20; ++Step )
@@ -217,6 +217,7 @@ TEST_F( VFrameTest, TheAnalyticBandCountsItsBoundsAndNothingBehindTheEye )
   Draw();
   // The first point projects onto the very middle of the frame.
   CoreGraphics::VRenderContext& rContext = *pFrame->Context();
+  rContext.ResetState();
   pScene->SphereHelper()->Clear();
   rContext.SetRenderMode( ERenderModeSelection );
   pScene->RenderPass( rContext, {}, ERenderPassOpaque );
