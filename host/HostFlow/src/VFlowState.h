@@ -54,6 +54,7 @@ private:
     const ZEK::VFlowEntry* pLast;
   };
 
+  ~VFlowState() = default; // only the pool ends one
   bool Open();
   void Put( const ZEK::VFlowTimeKey& i_rKey, ZEK::IFlowItem& i_rItem );
   void Settle() const;

@@ -1,6 +1,7 @@
 #include "VStateBuilder.h"
 
 #include <algorithm>
+#include <compare>
 #include <mutex>
 
 namespace HostFlow
@@ -266,7 +267,7 @@ void VStateBuilder::SortByKey( ZEK::VFlowEntry* i_pFirst, ZEK::VFlowEntry* i_pLa
              []( const VOrdered& i_rA, const VOrdered& i_rB )
              {
                const auto Order = i_rA.Entry.Key <=> i_rB.Entry.Key;
-               return Order != 0 ? Order < 0 : i_rA.Order < i_rB.Order;
+               return std::is_lt( Order ) || ( std::is_eq( Order ) && i_rA.Order < i_rB.Order );
              } );
   std::transform( m_Scratch.begin(), m_Scratch.end(), i_pFirst,
                   []( const VOrdered& i_rOrdered )

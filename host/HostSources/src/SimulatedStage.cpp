@@ -113,10 +113,10 @@ void FillCamera( std::uint32_t i_Camera, std::uint32_t i_Count, double i_RateHz,
 
   // Tiers of up to 24 stand above each other, each turned against the one below.
   const std::uint32_t Tiers = ( i_Count + 23 ) / 24;
-  const std::uint32_t Tier = i_Camera % Tiers;
+  const std::uint32_t Tier = i_Camera % Tiers, Place = i_Camera / Tiers;
   const std::uint32_t InTier = ( i_Count + Tiers - 1 - Tier ) / Tiers;
-  const double Angle = 2 * Pi * ( i_Camera / Tiers + 0.5 * Tier / Tiers ) / InTier;
-  const double Height = 2300 + 350.0 * Tier + ( i_Camera / Tiers % 2 ? 600 : 0 );
+  const double Angle = 2 * Pi * ( Place + 0.5 * Tier / Tiers ) / InTier;
+  const double Height = 2300 + 350.0 * Tier + ( Place % 2 ? 600 : 0 );
   const D3 Position{ 4800 * std::cos( Angle ), 4800 * std::sin( Angle ), Height };
   const D3 Forward = Unit( D3{ 0, 0, 900 } - Position );
   const D3 Right = Unit( Cross( Forward, D3{ 0, 0, 1 } ) );
