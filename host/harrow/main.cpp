@@ -68,8 +68,11 @@ int Run( int i_Count, char** i_ppArguments )
     }
   }
 
+  HostWindow::RouteQtMessages();
   HostWindow::SetUpGraphics( Line.Common.bCoreProfile, Line.Render.Ratio );
-  QApplication Application( i_Count, i_ppArguments );
+  // The arguments are the program's own: Qt would take some of them for its own.
+  int NoArguments = 1;
+  QApplication Application( NoArguments, i_ppArguments );
   QApplication::setApplicationName( "harrow" );
   QApplication::setApplicationDisplayName( "Harrow" );
   QApplication::setApplicationVersion( "1.0.0" );

@@ -1,5 +1,7 @@
 #include <HostWindow/Display.h>
 
+#include <ZEK/Log.h>
+
 #include <QtCore/QByteArray>
 #include <QtCore/QCoreApplication>
 #include <QtCore/QFileInfo>
@@ -11,6 +13,7 @@
 #include <array>
 #include <cerrno>
 #include <csignal>
+#include <cstdio>
 #include <cstring>
 #include <fcntl.h>
 #include <poll.h>
@@ -139,6 +142,32 @@ bool HasDisplay()
     return true;
   }
   return !qEnvironmentVariableIsEmpty( "DISPLAY" ) && XServerAnswers();
+}
+
+void RouteQtMessages()
+{
+  qInstallMessageHandler(
+      []( QtMsgType i_Type, const QMessageLogContext&, const QString& i_rText )
+      {
+        static const ZEK::VLogCategory& rCategory = ZEK::GlobalLog().Category( "Qt" );
+        // Said on every machine without a login session, and of no consequence.
+        if ( i_rText.startsWith( "QStandardPaths: XDG_RUNTIME_DIR not set" ) )
+        {
+          return;
+        }
+        const int Level = i_Type == QtCriticalMsg || i_Type == QtFatalMsg ? ZEK::ELogFailure
+                          : i_Type == QtWarningMsg                        ? ZEK::ELogWarning
+                                                                          : ZEK::ELogDetail;
+        if ( i_Type == QtFatalMsg )
+        {
+          // The process ends after this; a sink may not be there yet.
+          std::fprintf( stderr, "harrow: %s\n", qPrintable( i_rText ) );
+        }
+        if ( rCategory.IsOn( Level ) )
+        {
+          ZEK::GlobalLog().Write( rCategory, Level, i_rText.toStdString() );
+        }
+      } );
 }
 
 void SetUpGraphics( bool i_bCoreProfile, double i_Ratio )

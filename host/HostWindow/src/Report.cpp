@@ -45,6 +45,40 @@ const char* KindName( std::uint32_t i_Kind )
   }
 }
 
+/// JSON of what a view reports. Whole numbers stay numbers, whatever their type.
+QJsonValue ToJson( const QVariant& i_rValue )
+{
+  switch ( i_rValue.typeId() )
+  {
+  case QMetaType::QVariantMap:
+  {
+    QJsonObject Object;
+    const QVariantMap Map = i_rValue.toMap();
+    for ( auto it = Map.begin(); it != Map.end(); ++it )
+    {
+      Object[it.key()] = ToJson( it.value() );
+    }
+    return Object;
+  }
+  case QMetaType::QVariantList:
+  {
+    QJsonArray Array;
+    for ( const QVariant& rValue : i_rValue.toList() )
+    {
+      Array.append( ToJson( rValue ) );
+    }
+    return Array;
+  }
+  case QMetaType::Long:
+  case QMetaType::ULong:
+  case QMetaType::LongLong:
+  case QMetaType::ULongLong:
+    return i_rValue.toLongLong();
+  default:
+    return QJsonValue::fromVariant( i_rValue );
+  }
+}
+
 QJsonArray LogOf( const ZEK::VLogRing& i_rRing )
 {
   QJsonArray Lines;
@@ -82,7 +116,7 @@ QJsonObject OptionsOf( const std::vector< VViewAction >& i_rActions, const VScen
   {
     if ( const auto* pSet = std::get_if< VSetAction >( &rAction.What ) )
     {
-      Options[pSet->Key] = QJsonValue::fromVariant( i_rView.Option( pSet->Key ) );
+      Options[pSet->Key] = ToJson( i_rView.Option( pSet->Key ) );
     }
   }
   return Options;
@@ -125,7 +159,7 @@ QJsonObject DescribeAction( const VViewAction& i_rAction, VSession& i_rSession, 
            { "selection", DescribeSelection( rSelection, ZEK::ISelectionService::EPrimary ) },
            { "preselection", DescribeSelection( rSelection, ZEK::ISelectionService::ESecondary ) },
            { "toolTip", i_rView.ToolTip() },
-           { "labels", QJsonValue::fromVariant( i_rView.FrameReport().value( "labels" ) ) } };
+           { "labels", ToJson( i_rView.FrameReport().value( "labels" ) ) } };
 }
 
 QJsonObject DescribeView( VSession& i_rSession, const VRenderOptions& i_rRender, const std::string& i_rWindow,
@@ -151,7 +185,7 @@ QJsonObject DescribeView( VSession& i_rSession, const VRenderOptions& i_rRender,
   const QVariantMap Frame = i_rView.FrameReport();
   for ( const char* pMember : { "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "notice" } )
   {
-    Report[pMember] = QJsonValue::fromVariant( Frame.value( pMember ) );
+    Report[pMember] = ToJson( Frame.value( pMember ) );
   }
   Report["log"] = LogOf( *i_rSession.LogRing() );
   return Report;

@@ -26,6 +26,9 @@ private:
 /// Whether a display that can show windows with OpenGL answers.
 bool HasDisplay();
 
+/// What Qt says goes to the log's category "Qt", warnings at level 3 and graver ones at level 2.
+void RouteQtMessages();
+
 /// Sharing, surface format, style and scene-graph back end. Before the application object.
 void SetUpGraphics( bool i_bCoreProfile, double i_Ratio );
 

@@ -1,0 +1,186 @@
+#include "Program.h"
+
+#include <TestSupport/Paths.h>
+
+#include <CoreMoxelTypes/FlowTypes.h>
+#include <HostFlow/VFlowFramework.h>
+#include <HostSources/VSimulatedCapture.h>
+
+#include <QtCore/QJsonArray>
+
+#include <gmock/gmock.h>
+
+using namespace ProgramTest;
+
+namespace
+{
+struct VMarkerAt
+{
+  std::string Label;
+  double x = 0, y = 0, z = 0;
+};
+
+QString LabelOf( const QJsonValue& i_rAction )
+{
+  const QJsonArray Selection = i_rAction.toObject()["selection"].toArray();
+  return Selection.size() == 1 ? Selection[0].toObject()["label"].toString() : QString();
+}
+
+/// Clicks on the place of a marker, as another run of the program reports its camera, and tells what was picked.
+QString Pick( QStringList i_Arguments, const VMarkerAt& i_rMarker )
+{
+  i_Arguments << "--size"
+              << "1280x720";
+  const QJsonObject Plain = Render( i_Arguments );
+  const QPointF Place = Project( Plain, i_rMarker.x, i_rMarker.y, i_rMarker.z );
+  EXPECT_TRUE( QRectF( 0, 0, 1280, 720 ).contains( Place ) ) << Text( Place ).toStdString();
+  const QJsonObject Clicked = Render( i_Arguments + QStringList{ "--click", Text( Place ) } );
+  const QJsonArray Actions = Clicked["actions"].toArray();
+  EXPECT_EQ( Actions.size(), 1 );
+  return LabelOf( Actions[0] );
+}
+
+/// The first labelled point of a frame of the simulated capture.
+VMarkerAt SimulatedMarker( double i_Seconds )
+{
+  HostSources::VSimulatedCapture Capture;
+  ZEK::VFlowStateRef State;
+  const auto Index = static_cast< std::int64_t >( i_Seconds * Capture.RateHz() + 0.5 );
+  const ZEK::IResult Made =
+      Capture.MakeState( Index, { HostFlow::MakeStateFactory(), HostFlow::MakeItemStore(), 1 }, State );
+  EXPECT_TRUE( Made.IsOk() );
+  const auto Find = [&]( std::uint32_t i_Tag )
+  {
+    ZEK::VFlowItemRef Item;
+    State->FindItem( Item, i_Tag, ZEK::EFlowTimeMatch::Overlap );
+    return Item;
+  };
+  const ZEK::VFlowItemRef Points = Find( 0x100d );
+  const ZEK::VFlowItemRef Labels = Find( 0x100f );
+  const ZEK::VFlowItemRef Subject = Find( 0x1012 );
+  const auto* pPoints = ZEK::FlowPayload< CoreMoxelTypes::VReconstructionSet >( Points.Get() );
+  const auto* pLabels = ZEK::FlowPayload< CoreMoxelTypes::VReconstructionLabelSet >( Labels.Get() );
+  const auto* pSubject = ZEK::FlowPayload< CoreMoxelTypes::VSubject >( Subject.Get() );
+  EXPECT_TRUE( pPoints && pLabels && pSubject );
+  // The highest marker of the subject is hidden by nothing when seen from above.
+  VMarkerAt Best{ {}, 0, 0, -1e9 };
+  for ( const auto& rLabel : pLabels->Labels )
+  {
+    const auto& rPosition = pPoints->Items[rLabel.Reconstruction].Position;
+    if ( rLabel.SubjectId == pSubject->Id && rPosition.z > Best.z )
+    {
+      std::string_view Name;
+      EXPECT_TRUE( Subject->Value().GetName( ZEK::EFlowNameObject, Name ) );
+      Best = { std::string( Name ) + ":" + pSubject->Markers[rLabel.MarkerId].Name, rPosition.x, rPosition.y,
+               rPosition.z };
+    }
+  }
+  return Best;
+}
+} // namespace
+
+TEST( Pick, ClickOnAMarkerOfAC3dFileReportsItsLabel )
+{
+  HARROW_NEEDS_MODULE();
+  HARROW_NEEDS_RECORDINGS();
+  const QStringList Source{ "--source", Recording( "c3d-trc/Gait.c3d" ), "--time", "2.43" };
+  EXPECT_EQ( Pick( Source, { "RSHO", 640.4994, 155.2884, 1381.1512 } ), "Gait:RSHO" );
+  EXPECT_EQ( Pick( Source, { "ROFF", 775.4001, 117.7126, 1296.1035 } ), "Gait:ROFF" );
+}
+
+TEST( Pick, ClickOnAMarkerOfATrcFileReportsItsLabel )
+{
+  HARROW_NEEDS_MODULE();
+  HARROW_NEEDS_RECORDINGS();
+  EXPECT_EQ( Pick( { "--source", Recording( "c3d-trc/Gait.trc" ), "--time", "2.43" },
+                   { "R.Shoulder", 640.56439, 155.33781, 1381.36707 } ),
+             "Gait:R.Shoulder" );
+}
+
+TEST( Pick, FilesWithYUpStandOnTheFloorOfTheView )
+{
+  HARROW_NEEDS_MODULE();
+  HARROW_NEEDS_RECORDINGS();
+  const QStringList Source{ "--source", Recording( "multicam-person/static/markers21.trc" ), "--up", "y" };
+  // The file is in metres.
+  EXPECT_EQ( Pick( Source, { "RHip", -80.589, 869.695, 76.164 } ), "markers21:RHip" );
+}
+
+TEST( Pick, ClickOnASimulatedMarkerReportsItsLabel )
+{
+  HARROW_NEEDS_MODULE();
+  const VMarkerAt Marker = SimulatedMarker( 1.0 );
+  EXPECT_EQ( Pick( { "--time", "1.0" }, Marker ).toStdString(), Marker.Label );
+}
+
+TEST( Pick, RatiosMoveNoPick )
+{
+  HARROW_NEEDS_MODULE();
+  const VMarkerAt Marker = SimulatedMarker( 1.0 );
+  for ( const char* pRatio : { "1.5", "2" } )
+  {
+    EXPECT_EQ( Pick( { "--time", "1.0", "--ratio", pRatio }, Marker ).toStdString(), Marker.Label ) << pRatio;
+  }
+}
+
+TEST( Pick, ActionsWorkInTheirOrderAndModifiersEditTheSelection )
+{
+  HARROW_NEEDS_MODULE();
+  const VMarkerAt Marker = SimulatedMarker( 1.0 );
+  const QStringList View{ "--time", "1.0", "--size", "640x360" };
+  const QString Place = Text( Project( Render( View ), Marker.x, Marker.y, Marker.z ) );
+  const QJsonObject Report = Render( View + QStringList{ "--hover", Place, "--click", Place, "--band", "0,0,639,359",
+                                                         "--modifiers", "shift,ctrl", "--click", Place, "--modifiers",
+                                                         "none", "--hover", "2,2", "--click", "2,2" } );
+  const QJsonArray Actions = Report["actions"].toArray();
+  ASSERT_EQ( Actions.size(), 6 );
+  const auto Selected = [&]( int i_Index )
+  {
+    return Actions[i_Index].toObject()["selection"].toArray().size();
+  };
+  const QJsonObject Hover = Actions[0].toObject();
+  EXPECT_EQ( Hover["toolTip"].toString().toStdString(), Marker.Label );
+  ASSERT_EQ( Hover["preselection"].toArray().size(), 1 );
+  EXPECT_EQ( Hover["preselection"].toArray()[0].toObject()["label"].toString().toStdString(), Marker.Label );
+  EXPECT_EQ( Selected( 0 ), 0 );
+  EXPECT_EQ( LabelOf( Actions[1] ).toStdString(), Marker.Label );
+  const auto Band = Selected( 2 );
+  EXPECT_GT( Band, 30 ) << "two performers wear more markers than that";
+  EXPECT_EQ( Selected( 3 ), Band - 1 ) << "Shift with Control removes";
+  EXPECT_EQ( Selected( 5 ), 0 ) << "a click on nothing clears";
+  EXPECT_EQ( Report["selection"].toArray().size(), 0 );
+}
+
+TEST( Report, SaysWhichFrameItShowsAndWhatItDrewWith )
+{
+  HARROW_NEEDS_MODULE();
+  HARROW_NEEDS_RECORDINGS();
+  const QJsonObject Report = Render( { "--source", Recording( "c3d-gpl/Qualisys.c3d" ), "--time", "0.0124", "--size",
+                                       "640x360", "--set", "YUp=true", "--view", "Top", "--key", "Home" } );
+  // The file begins with frame 705 at 200 Hz; the nearest frame to 12.4 ms is the third.
+  const QJsonObject Frame = Report["frame"].toObject();
+  EXPECT_EQ( Frame["index"].toInt( -1 ), 2 );
+  EXPECT_EQ( Frame["number"].toInt( -1 ), 707 );
+  EXPECT_DOUBLE_EQ( Frame["time"].toDouble(), 0.01 );
+  EXPECT_EQ( Report["camera"].toObject()["viewType"].toString(), "Top" );
+  EXPECT_EQ( Report["options"].toObject()["YUp"].toBool(), true );
+  EXPECT_FALSE( Report["upAxis"].toObject()["reason"].toString().isEmpty() );
+  EXPECT_GT( Report["draw_calls"].toInt(), 0 );
+  EXPECT_GT( Report["frames"].toInt(), 3 );
+  for ( const char* pTiming : { "update_ms", "select_ms", "highlight_ms", "draw_ms" } )
+  {
+    EXPECT_TRUE( Report["timings"].toObject()[pTiming].isDouble() ) << pTiming;
+  }
+  EXPECT_FALSE( Report["gl"].toObject().isEmpty() );
+  EXPECT_EQ( Report["notice"].toString(), "" );
+  EXPECT_EQ( Report["log"].toArray(), QJsonArray() );
+}
+
+TEST( Report, AFrameOffTheEndIsTheLastOne )
+{
+  HARROW_NEEDS_MODULE();
+  HARROW_NEEDS_RECORDINGS();
+  const QJsonObject Report =
+      Render( { "--source", Recording( "c3d-trc/Gait.c3d" ), "--time", "1000", "--size", "320x200" } );
+  EXPECT_EQ( Report["frame"].toObject()["number"].toInt(), 487 );
+}
