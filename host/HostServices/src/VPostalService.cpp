@@ -5,6 +5,7 @@
 #include <QtCore/QCoreApplication>
 #include <QtCore/QEvent>
 #include <QtCore/QObject>
+#include <QtCore/QThread>
 
 #include <deque>
 #include <exception>
@@ -126,6 +127,11 @@ struct VPostalService::VState
     bOpen = false;
     Dropped.swap( Queue );
     pGone = std::move( pReceiver );
+    if ( pGone && pGone->thread() != QThread::currentThread() )
+    {
+      // Its own thread may be handing it an event at this moment.
+      pGone.release()->deleteLater();
+    }
     // Declared before the lock, the queue and the receiver are destroyed after it: a function that goes may post.
   }
 
