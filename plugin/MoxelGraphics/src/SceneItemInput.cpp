@@ -61,6 +61,7 @@ void VSceneFramebufferObject::mousePressEvent( QMouseEvent* i_pEvent )
     m_bClickPending = i_pEvent->button() == Qt::LeftButton;
     if ( !m_Options.CameraView )
     {
+      const std::lock_guard Lock( *m_pCameraGuard );
       m_pController->OnMousePress( *i_pEvent, Ratio() );
     }
   }
@@ -82,6 +83,7 @@ void VSceneFramebufferObject::mouseMoveEvent( QMouseEvent* i_pEvent )
     m_PickMode = EPickNone;
     if ( !m_Options.CameraView )
     {
+      const std::lock_guard Lock( *m_pCameraGuard );
       m_pController->OnMouseMove( *i_pEvent, Ratio() );
     }
   }
@@ -102,6 +104,7 @@ void VSceneFramebufferObject::mouseReleaseEvent( QMouseEvent* i_pEvent )
   m_bClickPending = false;
   if ( !m_Options.CameraView )
   {
+    const std::lock_guard Lock( *m_pCameraGuard );
     m_pController->OnMouseRelease( *i_pEvent, Ratio() );
   }
   i_pEvent->accept();
@@ -132,6 +135,7 @@ void VSceneFramebufferObject::wheelEvent( QWheelEvent* i_pEvent )
 {
   if ( !m_Options.CameraView )
   {
+    const std::lock_guard Lock( *m_pCameraGuard );
     m_pController->OnWheel( *i_pEvent );
   }
   i_pEvent->accept();
@@ -140,7 +144,12 @@ void VSceneFramebufferObject::wheelEvent( QWheelEvent* i_pEvent )
 
 void VSceneFramebufferObject::keyPressEvent( QKeyEvent* i_pEvent )
 {
-  const bool bTaken = !m_Options.CameraView && m_pController->OnKeyPress( i_pEvent->key() );
+  bool bTaken = false;
+  if ( !m_Options.CameraView )
+  {
+    const std::lock_guard Lock( *m_pCameraGuard );
+    bTaken = m_pController->OnKeyPress( i_pEvent->key() );
+  }
   TakeModifiers( i_pEvent->modifiers() );
   i_pEvent->setAccepted( bTaken );
   Refresh();

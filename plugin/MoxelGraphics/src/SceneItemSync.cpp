@@ -76,8 +76,15 @@ void VSceneFramebufferObject::TakeResult( const VSceneFrame& i_rFrame )
   const VPickResult& rResult = i_rFrame.Result();
   if ( rResult.Mode < 0 || rResult.Serial == m_pSynced->Serial )
   {
+    // A view that cannot draw answers no pick; asking on would keep it busy for ever.
+    constexpr int Patience = 3;
+    if ( IsPickPending() && ++m_pSynced->Unanswered > Patience )
+    {
+      m_PickMode = EPickNone;
+    }
     return;
   }
+  m_pSynced->Unanswered = 0;
   m_pSynced->Serial = rResult.Serial;
   const bool bCommit = rResult.Mode == EPickClick || rResult.Mode == EPickBandDone;
   const bool bSame = !bCommit && m_pSynced->bPreselected && rResult.Selection == m_pSynced->Selection &&

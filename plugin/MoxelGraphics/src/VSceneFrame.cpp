@@ -59,9 +59,11 @@ std::unique_ptr< QOpenGLFramebufferObject > VSceneFrame::MakeTarget( QSize i_Siz
 }
 
 VSceneFrame::VSceneFrame( std::shared_ptr< VMoxelScene > i_pScene,
-                          std::shared_ptr< CoreGraphics::VCameraController > i_pController )
+                          std::shared_ptr< CoreGraphics::VCameraController > i_pController,
+                          std::shared_ptr< std::mutex > i_pCameraGuard )
   : m_pScene( std::move( i_pScene ) )
   , m_pController( std::move( i_pController ) )
+  , m_pCameraGuard( std::move( i_pCameraGuard ) )
   , m_pContext( std::make_unique< CoreGraphics::VRenderContext >() )
 {
 }
@@ -81,7 +83,10 @@ VSceneFrame::~VSceneFrame()
 
 void VSceneFrame::Resize( QSize i_Size )
 {
-  m_pController->SetSize( i_Size );
+  {
+    const auto Lock = LockCamera();
+    m_pController->SetSize( i_Size );
+  }
   m_Size = i_Size;
   m_pSelectionTarget.reset();
   m_pOutlineTarget.reset();
@@ -177,42 +182,44 @@ void VSceneFrame::Begin()
   m_pContext->SetPixelRatio( m_Input.PixelRatio );
 }
 
+std::unique_lock< std::mutex > VSceneFrame::LockCamera() const
+{
+  return m_pCameraGuard ? std::unique_lock( *m_pCameraGuard ) : std::unique_lock< std::mutex >();
+}
+
+void VSceneFrame::CollectPoints( const ZEK::VSelection& i_rSelection )
+{
+  m_Points.clear();
+  for ( const VScenePoint& rPoint : m_pScene->GetSelectionPositions( i_rSelection ) )
+  {
+    if ( std::isfinite( rPoint.X ) && std::isfinite( rPoint.Y ) && std::isfinite( rPoint.Z ) )
+    {
+      m_Points.emplace_back( rPoint.X, rPoint.Y, rPoint.Z, std::isfinite( rPoint.Radius ) ? rPoint.Radius : 0.0f );
+    }
+  }
+}
+
 void VSceneFrame::UpdateCamera()
 {
-  const auto Focus = [&]( const ZEK::VSelection& i_rSelection, bool i_bFit )
+  const bool bFit = std::exchange( m_Input.bFit, false );
+  VScenePose Pose;
+  const bool bPose = m_Input.Tracking == ELockCurrent && m_pScene->GetSelectionPose( m_Input.TrackedSelection, Pose );
+  m_Points.clear();
+  if ( bFit || m_Input.Tracking == ETrackCurrent )
   {
-    std::vector< QVector4D > Points;
-    for ( const VScenePoint& rPoint : m_pScene->GetSelectionPositions( i_rSelection ) )
-    {
-      if ( std::isfinite( rPoint.X ) && std::isfinite( rPoint.Y ) && std::isfinite( rPoint.Z ) )
-      {
-        Points.emplace_back( rPoint.X, rPoint.Y, rPoint.Z, std::isfinite( rPoint.Radius ) ? rPoint.Radius : 0.0f );
-      }
-    }
-    m_pController->SetFocusPoints( Points, i_bFit );
-  };
-  m_pController->SetYUp( m_pScene->YUp() );
-  if ( m_Input.bFit )
-  {
-    m_Input.bFit = false;
-    Focus( m_Input.TrackedSelection, true );
-  }
-  if ( m_Input.Tracking == ETrackCurrent )
-  {
-    Focus( m_Input.TrackedSelection, false );
+    CollectPoints( m_Input.TrackedSelection );
   }
   else if ( m_Input.Tracking == ETrackSelection )
   {
-    Focus( m_pScene->GetSelection(), false );
+    CollectPoints( m_pScene->GetSelection() );
   }
-  else if ( m_Input.Tracking == ELockCurrent )
+  const auto Lock = LockCamera();
+  m_pController->SetYUp( m_pScene->YUp() );
+  m_pController->SetFocusPoints( m_Points, bFit );
+  if ( bPose )
   {
-    VScenePose Pose;
-    if ( m_pScene->GetSelectionPose( m_Input.TrackedSelection, Pose ) )
-    {
-      // The record is column-major, the constructor reads rows.
-      m_pController->SetLockPose( QMatrix4x4( Pose.Matrix.data() ).transposed() );
-    }
+    // The record is column-major, the constructor reads rows.
+    m_pController->SetLockPose( QMatrix4x4( Pose.Matrix.data() ).transposed() );
   }
   m_pController->Step();
   m_pController->Apply( *m_pContext );

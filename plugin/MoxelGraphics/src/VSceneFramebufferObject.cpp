@@ -68,6 +68,7 @@ QStringList Texts( const std::vector< std::string >& i_rTexts )
 VSceneFramebufferObject::VSceneFramebufferObject( QQuickItem* i_pParent )
   : QQuickFramebufferObject( i_pParent )
   , m_pController( std::make_shared< CoreGraphics::VCameraController >() )
+  , m_pCameraGuard( std::make_shared< std::mutex >() )
   , m_pOptionsMap( new QQmlPropertyMap( this ) )
   , m_pSynced( std::make_unique< VSynced >() )
 {
@@ -140,12 +141,16 @@ void VSceneFramebufferObject::SetPreviewCamera( const QString& i_rURN )
 
 int VSceneFramebufferObject::CameraType() const
 {
+  const std::lock_guard Lock( *m_pCameraGuard );
   return m_pController->GetViewType();
 }
 
 void VSceneFramebufferObject::SetCameraType( int i_Type )
 {
-  m_pController->SetViewType( i_Type );
+  {
+    const std::lock_guard Lock( *m_pCameraGuard );
+    m_pController->SetViewType( i_Type );
+  }
   update();
 }
 

@@ -37,8 +37,12 @@ void VSceneFramebufferRenderer::synchronize( QQuickFramebufferObject* i_pItem )
   const bool bOtherScene = rItem.m_pScene && ( !m_pFrame || m_pFrame->Scene() != rItem.m_pScene );
   if ( bOtherScene )
   {
-    m_pFrame = std::make_unique< VSceneFrame >( rItem.m_pScene, rItem.m_pController );
+    m_pFrame = std::make_unique< VSceneFrame >( rItem.m_pScene, rItem.m_pController, rItem.m_pCameraGuard );
     invalidateFramebufferObject();
+  }
+  else if ( !rItem.m_pScene )
+  {
+    m_pFrame.reset();
   }
   if ( !m_pFrame )
   {

@@ -19,6 +19,7 @@ struct VSceneFramebufferObject::VSynced
   ZEK::VSelection Selection;
   std::vector< std::string > Labels;
   bool bPreselected = false; ///< the selection and labels above are those of a preselection that was posted
+  int Unanswered = 0;        ///< meetings since a commit was asked for
   ETracking Tracking = ETrackNone;
 };
 

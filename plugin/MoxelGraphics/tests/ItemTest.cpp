@@ -397,6 +397,37 @@ TEST_F( VItemTest, AWindowThatClosesWhileAPickIsUnderWay )
   EXPECT_EQ( pScene.use_count(), 1 );
 }
 
+// Run with QT_QUICK_BACKEND=software.
+TEST( SoftwareView, SaysThatItCannotDraw )
+{
+  if ( qgetenv( "QT_QUICK_BACKEND" ) != "software" )
+  {
+    GTEST_SKIP() << "Qt Quick draws with OpenGL here";
+  }
+  const auto pScene = std::make_shared< VTestScene >();
+  QQuickWindow Window;
+  VSceneFramebufferObject Item( Window.contentItem() );
+  Item.setSize( Size );
+  Item.SetScene( pScene.get() );
+  Window.resize( Size );
+  Window.show();
+  const QDeadlineTimer Patience( 20000 );
+  while ( Item.Notice().isEmpty() && !Patience.hasExpired() )
+  {
+    Item.update();
+    QCoreApplication::processEvents( QEventLoop::AllEvents, 20 );
+  }
+  EXPECT_FALSE( Item.Notice().isEmpty() );
+  for ( int Turn = 0; Turn < 5; ++Turn )
+  {
+    Item.update();
+    QCoreApplication::processEvents( QEventLoop::AllEvents, 20 );
+  }
+  const auto Lines = TestSupport::LogTexts( "MoxelGraphics", ZEK::ELogFailure );
+  ASSERT_EQ( Lines.size(), 1u );
+  TestSupport::ExpectFailureLine( Lines.front() );
+}
+
 TEST( SceneItem, WhatIsNoSceneIsRefused )
 {
   VSceneFramebufferObject Item;

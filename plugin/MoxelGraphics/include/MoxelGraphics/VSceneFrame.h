@@ -11,9 +11,11 @@
 #include <QtCore/QSize>
 #include <QtCore/QString>
 #include <QtCore/QVariantMap>
+#include <QtGui/QVector4D>
 
 #include <cstdint>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <vector>
 
@@ -76,8 +78,10 @@ struct VFrameFigures
 class VSceneFrame
 {
 public:
+  /// `i_pCameraGuard` is held while the camera is stepped; null where its events come on the same thread.
   VSceneFrame( std::shared_ptr< VMoxelScene > i_pScene,
-               std::shared_ptr< CoreGraphics::VCameraController > i_pController );
+               std::shared_ptr< CoreGraphics::VCameraController > i_pController,
+               std::shared_ptr< std::mutex > i_pCameraGuard = nullptr );
   ~VSceneFrame();
 
   /// A target for `Render` as the views have it: with depth, multisampled in a free view on desktop OpenGL where
@@ -111,6 +115,8 @@ private:
   double Lap();
   void ReadGl( const QOpenGLFramebufferObject& i_rTarget );
   void UpdateCamera();
+  void CollectPoints( const ZEK::VSelection& i_rSelection );
+  std::unique_lock< std::mutex > LockCamera() const;
   void SelectAndHighlight();
   bool IsBand() const;
   void PickPoint();
@@ -123,6 +129,7 @@ private:
 
   std::shared_ptr< VMoxelScene > m_pScene;
   std::shared_ptr< CoreGraphics::VCameraController > m_pController;
+  std::shared_ptr< std::mutex > m_pCameraGuard;
   std::unique_ptr< CoreGraphics::VRenderContext > m_pContext;
   std::unique_ptr< QOpenGLFramebufferObject > m_pSelectionTarget;
   std::unique_ptr< QOpenGLFramebufferObject > m_pOutlineTarget;
@@ -138,6 +145,7 @@ private:
   std::vector< std::uint32_t > m_Pixels;
   std::vector< std::uint32_t > m_Found; ///< in the order in which they were found
   std::vector< std::uint32_t > m_Layer;
+  std::vector< QVector4D > m_Points;
 };
 
 } // namespace MoxelGraphics

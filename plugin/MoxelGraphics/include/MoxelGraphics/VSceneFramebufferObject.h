@@ -14,6 +14,7 @@
 
 #include <functional>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <vector>
 
@@ -82,6 +83,7 @@ public:
   void SetTracking( ETracking i_Tracking );
   QString Notice() const { return m_Notice; }
 
+  /// Where the view has a render thread of its own, read its fields from `frameReport` instead.
   const std::shared_ptr< CoreGraphics::VCameraController >& Controller() const { return m_pController; }
   /// What lies under the pointer or in the band, as of the last pick that was delivered.
   const ZEK::VSelection& Preselection() const { return m_Preselection; }
@@ -160,6 +162,9 @@ private:
   std::shared_ptr< VMoxelScene > m_pScene;
   QPointer< QObject > m_pCameraGrid;
   std::shared_ptr< CoreGraphics::VCameraController > m_pController;
+  /// Gestures come on the GUI thread and frames on the render thread. Held for a step of either; where the two
+  /// threads are one it is never contended.
+  std::shared_ptr< std::mutex > m_pCameraGuard;
   QQmlPropertyMap* m_pOptionsMap = nullptr;
   VSceneOptions m_Options;
   QString m_PreviewCamera;
