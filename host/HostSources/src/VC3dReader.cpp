@@ -57,9 +57,8 @@ unsigned ConvertPoints( const float* i_pWords, std::size_t i_Count, float i_Fact
     const float* pWord = i_pWords + 4 * Index;
     const float x = pWord[0] * i_Factor, y = pWord[1] * i_Factor, z = pWord[2] * i_Factor;
     // NaN fails every comparison, so this one line sees gaps, NaN and infinity.
-    const bool bValid =
-        ( pWord[3] >= 0 ) & ( std::abs( x ) <= Max ) & ( std::abs( y ) <= Max ) & ( std::abs( z ) <= Max );
-    const int Word = ( pWord[3] >= 0 ) & ( pWord[3] < 32768 ) ? static_cast< int >( pWord[3] ) : 0;
+    const bool bValid = pWord[3] >= 0 && std::abs( x ) <= Max && std::abs( y ) <= Max && std::abs( z ) <= Max;
+    const int Word = pWord[3] >= 0 && pWord[3] < 32768 ? static_cast< int >( pWord[3] ) : 0;
     o_pPoints[Index] = { bValid ? x : Nan, bValid ? y : Nan, bValid ? z : Nan,
                          bValid ? static_cast< float >( Word & 0xFF ) * i_ResidualFactor : Nan };
     const unsigned Mask = bValid ? static_cast< unsigned >( Word ) >> 8 : 0;
