@@ -22,6 +22,7 @@ namespace
 constexpr GLenum ProgramPointSize = 0x8642;
 constexpr GLenum PointSprite = 0x8861;
 constexpr GLenum PointSmooth = 0x0B10;
+constexpr GLenum PointSizeRange = 0x0B12;
 constexpr GLenum DebugOutput = 0x92E0;
 constexpr GLenum FramebufferSRGB = 0x8DB9;
 constexpr GLenum MaximumTextureAnisotropy = 0x84FF;
@@ -111,7 +112,7 @@ void VRenderContext::ReadLimits()
   const auto* pRenderer = reinterpret_cast< const char* >( m_pFunctions->glGetString( GL_RENDERER ) );
   m_bSoftware = pRenderer && IsSoftware( pRenderer );
   std::array< GLfloat, 2 > PointSizes{ 1.0f, 1.0f };
-  m_pFunctions->glGetFloatv( GL_ALIASED_POINT_SIZE_RANGE, PointSizes.data() );
+  m_pFunctions->glGetFloatv( m_bES ? GL_ALIASED_POINT_SIZE_RANGE : PointSizeRange, PointSizes.data() );
   m_MaximumPointSize = PointSizes[1];
   m_Anisotropy = 1.0f;
   if ( m_bSoftware )

@@ -156,6 +156,10 @@ std::shared_ptr< VShader > VResources::FindShader( EShaderType i_Type, const std
 std::shared_ptr< VShaderProgram > VResources::GetProgram( const std::string& i_rVertexName,
                                                           const std::string& i_rFragmentName, EShaderForm i_Form )
 {
+  if ( !m_bPrepared )
+  {
+    Prepare();
+  }
   std::shared_ptr< VShaderProgram >& rpProgram = m_Programs[{ i_rVertexName, i_rFragmentName, i_Form }];
   if ( !rpProgram )
   {

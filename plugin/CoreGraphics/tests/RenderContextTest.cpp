@@ -67,6 +67,7 @@ TEST_P( RenderContextTest, ADrawAfterResetStateGivesPixels )
   rRender.ResetCounters();
   ASSERT_TRUE( FillWith( { 0, 1, 0, 1 } ) );
   EXPECT_EQ( rRender.BytesUploaded(), 0u );
+  EXPECT_GE( rRender.MaximumPointSize(), 1.0f );
   rRender.ReleaseVertexArray();
   EXPECT_EQ( Integer( GL_VERTEX_ARRAY_BINDING ), 0 );
 }

@@ -203,6 +203,17 @@ TEST( Resources, ANewGroupAfterTheFirstDiedGetsEverythingAgain )
   EXPECT_EQ( Draw( Context ), Covered );
 }
 
+TEST( Resources, AProgramAskedForTooEarlyIsCompletedLater )
+{
+  VResources Resources;
+  const auto pProgram = Resources.GetProgram( "Simple3D", "UniformColour" );
+  EXPECT_FALSE( pProgram->IsUsable() );
+  VTestContext Context( EKindCore );
+  EXPECT_FALSE( Context.pRender->UseProgram( pProgram ) );
+  ASSERT_TRUE( Resources.Prepare() );
+  EXPECT_TRUE( Context.pRender->UseProgram( pProgram ) );
+}
+
 TEST( Resources, WordsOnAContextBelowTheMinimum )
 {
   EXPECT_EQ( VResources::VersionText( false, 3, 3 ), "OpenGL context version 3.3 is unsupported" );

@@ -42,8 +42,8 @@ public:
   /// again in place.
   void Reload();
 
-  /// The program of that pair, made on first use. It is never null; `IsUsable` may be false. Before `Prepare` it is
-  /// an unusable one that `Prepare` completes.
+  /// The program of that pair, made on first use. It is never null; `IsUsable` may be false. With no context
+  /// current it is an unusable one that `Prepare` completes.
   std::shared_ptr< VShaderProgram > GetProgram( const std::string& i_rVertexName, const std::string& i_rFragmentName,
                                                 EShaderForm i_Form = EFormSingle );
 
