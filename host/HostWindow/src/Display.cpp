@@ -7,6 +7,7 @@
 #include <QtCore/QFileInfo>
 #include <QtCore/QLibrary>
 #include <QtCore/QStandardPaths>
+#include <QtCore/QThread>
 #include <QtGui/QSurfaceFormat>
 #include <QtQuick/QQuickWindow>
 
@@ -69,9 +70,10 @@ QByteArray ReadDisplayNumber( int i_Pipe )
   return Text.trimmed();
 }
 
+/// The platform plug-in of Qt ends the process when it cannot connect, so the question is asked first. The connection
+/// stays open for the life of the process: a server without a client may begin anew, and then turns down who comes.
 bool XServerAnswers()
 {
-  // The platform plug-in of Qt ends the process when it cannot connect, so the question is asked first.
   using FConnect = void* (*)( const char*, int* );
   using FHasError = int ( * )( void* );
   using FDisconnect = void ( * )( void* );
@@ -83,10 +85,17 @@ bool XServerAnswers()
   {
     return true;
   }
-  void* pConnection = pConnect( nullptr, nullptr );
-  const bool bAnswers = pHasError( pConnection ) == 0;
-  pDisconnect( pConnection );
-  return bAnswers;
+  for ( int Try = 0; Try < 10; ++Try )
+  {
+    void* pConnection = pConnect( nullptr, nullptr );
+    if ( pHasError( pConnection ) == 0 )
+    {
+      return true;
+    }
+    pDisconnect( pConnection );
+    QThread::msleep( 50 );
+  }
+  return false;
 }
 } // namespace
 
