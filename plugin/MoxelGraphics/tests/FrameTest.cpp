@@ -528,6 +528,43 @@ TEST_F( VFrameTest, TwoViewsDrawOneScene )
   EXPECT_GT( qRed( Image.pixel( 320, 180 ) ), qGreen( Image.pixel( 320, 180 ) ) + 40 );
 }
 
+TEST( Frame, DrawsAndPicksInEveryKindOfContext )
+{
+  InitShaders();
+  QSurfaceFormat Core = QSurfaceFormat::defaultFormat(), Compatibility, Embedded;
+  Compatibility.setDepthBufferSize( 24 );
+  Embedded.setRenderableType( QSurfaceFormat::OpenGLES );
+  Embedded.setVersion( 3, 0 );
+  for ( const QSurfaceFormat& rFormat : { Core, Compatibility, Embedded } )
+  {
+    VOffscreen Context( false, rFormat );
+    SCOPED_TRACE( Context.IsES()                                              ? "ES"
+                  : Context.Format().profile() == QSurfaceFormat::CoreProfile ? "core"
+                                                                              : "other" );
+    EXPECT_EQ( Context.IsES(), rFormat.renderableType() == QSurfaceFormat::OpenGLES );
+    const auto pScene = std::make_shared< VTestScene >();
+    pScene->Change( { { 0, 0, 0, 7 }, { 1500, 300, 900, 7 } } );
+    VSceneFrame Frame( pScene, std::make_shared< CoreGraphics::VCameraController >() );
+    // A mesh each, and then a point each.
+    for ( const double Scale : { 20.0, 1.0 } )
+    {
+      Frame.Input().Options.ReconstructionScale = static_cast< float >( Scale );
+      Frame.Input().PickMode = EPickHover;
+      const QPointF Place = ScreenPoint( { 1500, 300, 900, 7 }, Size );
+      Frame.Input().Pointer = QPoint( static_cast< int >( Place.x() ), static_cast< int >( Place.y() ) );
+      const QImage Image = Context.Draw( Frame, Size );
+      EXPECT_TRUE( Context.bDrawn );
+      EXPECT_EQ( Frame.Result().Ids, std::vector< std::uint32_t >{ 2 } );
+      const QRgb Seen = Image.pixel( Frame.Input().Pointer );
+      EXPECT_GT( qRed( Seen ), qGreen( Seen ) + 40 );
+      EXPECT_GT( Distance( Image.pixel( ScreenPoint( { 120, 120, 0, 0 }, Size ).toPoint() ), Background ), 4 );
+    }
+    const auto pTarget = VSceneFrame::MakeTarget( Size, true );
+    ASSERT_TRUE( pTarget );
+    EXPECT_EQ( pTarget->format().samples() > 0, !Context.IsES() );
+  }
+}
+
 TEST_F( VFrameTest, CallbacksRunUntilTheyAreDone )
 {
   int Runs = 0;

@@ -7,6 +7,7 @@
 #include <TestSupport/LogGuard.h>
 
 #include <QtCore/QDeadlineTimer>
+#include <QtCore/QVersionNumber>
 #include <QtGui/QMouseEvent>
 #include <QtQml/QQmlComponent>
 #include <QtQml/QQmlEngine>
@@ -379,7 +380,10 @@ TEST_F( VItemTest, TheReportTellsOfTheFrame )
   EXPECT_FALSE( Gl["renderer"].toString().isEmpty() );
   EXPECT_GT( Report["timings"].toMap()["draw_ms"].toDouble(), 0.0 );
   EXPECT_GT( Report["draw_calls"].toInt(), 3 );
-  EXPECT_EQ( Report["notice"], "" );
+  // Run with MESA_GL_VERSION_OVERRIDE=3.3 as well: the view then says that it draws below its minimum.
+  const bool bGoodEnough = QVersionNumber::fromString( Gl["version"].toString() ) >= QVersionNumber( 4, 3 );
+  EXPECT_EQ( Report["notice"].toString().isEmpty(), bGoodEnough ) << Gl["version"].toString().toStdString();
+  EXPECT_EQ( pItem->Notice(), Report["notice"].toString() );
 }
 
 TEST_F( VItemTest, AWindowThatClosesWhileAPickIsUnderWay )

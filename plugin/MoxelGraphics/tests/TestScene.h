@@ -266,8 +266,10 @@ private:
 class VOffscreen
 {
 public:
-  explicit VOffscreen( bool i_bShared = true )
+  explicit VOffscreen( bool i_bShared = true, const QSurfaceFormat& i_rFormat = QSurfaceFormat::defaultFormat() )
   {
+    m_Surface.setFormat( i_rFormat );
+    m_Context.setFormat( i_rFormat );
     m_Surface.create();
     if ( i_bShared )
     {
@@ -276,6 +278,8 @@ public:
     m_Context.create();
     MakeCurrent();
   }
+  bool IsES() const { return m_Context.isOpenGLES(); }
+  QSurfaceFormat Format() const { return m_Context.format(); }
   void MakeCurrent() { ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) ); }
 
   /// Draws one frame without multisampling and gives what is to be seen.
