@@ -33,6 +33,8 @@ TEST( VertexBuffer, ADynamicBufferHoldsEachWriteWhole )
   EXPECT_FALSE( Buffer.Bind() );
   std::mt19937 Random( 7 );
   std::uint64_t LastSerial = 0;
+  std::size_t LastEnd = 0;
+  int Exchanges = 0;
   for ( int Write = 0; Write < 200; ++Write )
   {
     std::vector< std::byte > Wanted( 1 + Random() % ( Write % 20 == 0 ? 50000 : 3000 ) );
@@ -44,17 +46,22 @@ TEST( VertexBuffer, ADynamicBufferHoldsEachWriteWhole )
     ASSERT_TRUE( Buffer.Write( std::span( Wanted ) ) );
     EXPECT_EQ( VVertexBuffer::TotalBytesUploaded() - Before, Wanted.size() );
     EXPECT_EQ( Buffer.Offset() % 4, 0u );
+    // A draw may still read the former write: the next lies behind it, or in new storage once in a few writes.
+    EXPECT_TRUE( Buffer.Offset() >= LastEnd || Buffer.Offset() == 0 );
+    LastEnd = Buffer.Offset() + Wanted.size();
+    Exchanges += Buffer.Offset() == 0;
     EXPECT_NE( Buffer.Serial(), LastSerial );
     LastSerial = Buffer.Serial();
     ASSERT_EQ( Contents( Context, Buffer ), Wanted );
   }
+  EXPECT_LT( Exchanges, 200 / 3 );
   EXPECT_FALSE( Buffer.Write( std::span< const std::byte >() ) );
   EXPECT_FALSE( Buffer.Bind() ) << "an empty write leaves nothing to draw";
   EXPECT_EQ( Buffer.Map( std::size_t( 1 ) << 40 ), nullptr );
 }
 
-// Many writes in a frame, each drawn before the next: none may reach what an earlier draw reads.
-TEST( VertexBuffer, ARewriteNeverChangesAPendingDraw )
+// Many writes in a frame, each drawn before the next.
+TEST( VertexBuffer, EachDrawReadsTheWriteBeforeIt )
 {
   VTestContext Context( EKindCore );
   VResources Resources;
