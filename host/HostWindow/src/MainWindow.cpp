@@ -95,6 +95,7 @@ void VMainWindow::MakeBars()
 {
   m_pMessages = new VMessageBar( this );
   addToolBar( Qt::TopToolBarArea, m_pMessages );
+  addToolBarBreak( Qt::TopToolBarArea );
 
   m_pTransport = new VTransportBar( m_rSession );
   auto* pBottom = new QToolBar( tr( "Transport" ), this );

@@ -218,7 +218,6 @@ void VTransportBar::ShowState()
       MakeIcon( rClock.IsPlaying() ? EIcon::Pause : EIcon::Play, palette().color( QPalette::WindowText ) ) );
   m_pLoop->setChecked( rClock.IsLooping() );
   m_pLive->setChecked( m_rSession.IsLive() );
-  m_pLive->setEnabled( m_rSession.HasRecording() || !m_rSession.IsLive() );
   const QSignalBlocker Quiet( m_pSlider );
   const std::int64_t Last = std::max< std::int64_t >( 0, rClock.FrameCount() - 1 );
   m_pSlider->setRange( 0, static_cast< int >( std::min< std::int64_t >( Last, std::numeric_limits< int >::max() ) ) );
