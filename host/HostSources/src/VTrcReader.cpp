@@ -1,6 +1,5 @@
 #include <HostSources/VTrcReader.h>
 
-#include "C3dParameters.h"
 #include "Labels.h"
 #include "TrcText.h"
 #include "Units.h"
