@@ -57,14 +57,14 @@ TEST( VFlowScene, TheFloorFollowsAChangedValueOnlyAndKeepsItWhenItGoes )
   const ZEK::VFlowStateRef First = Maker.State( 0 );
   First->AddItem( Maker.Item< FlowVolumeProperties >( { -4000, -2000, 5000, 3000, 0, 0 } ) );
   Scene.Show( First );
-  EXPECT_EQ( Scene.Floor().Extents(), ( std::array{ -4000, -2000, 5000, 3000 } ) );
+  EXPECT_EQ( Scene.Floor().GetExtents(), ( std::array{ -4000, -2000, 5000, 3000 } ) );
   Scene.Floor().SetExtents( { 1, 2, 3, 4 } );
   Scene.Show( First );
-  EXPECT_EQ( Scene.Floor().Extents(), ( std::array{ 1, 2, 3, 4 } ) ) << "the same value was taken again";
+  EXPECT_EQ( Scene.Floor().GetExtents(), ( std::array{ 1, 2, 3, 4 } ) ) << "the same value was taken again";
   const ZEK::VFlowStateRef Without = Maker.State( 1 );
   Without->AddItem( Maker.Points( 1 ) );
   Scene.Show( Without );
-  EXPECT_EQ( Scene.Floor().Extents(), ( std::array{ 1, 2, 3, 4 } ) );
+  EXPECT_EQ( Scene.Floor().GetExtents(), ( std::array{ 1, 2, 3, 4 } ) );
 }
 
 TEST( VFlowScene, TheCameraNameNeedsExactlyOneSelectedCamera )

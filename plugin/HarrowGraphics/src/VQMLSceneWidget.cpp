@@ -67,7 +67,7 @@ VQMLSceneWidget::VQMLSceneWidget( VSceneWidgetArguments i_Arguments )
   }
 }
 
-VQMLSceneWidget::~VQMLSceneWidget() = default;
+VQMLSceneWidget::~VQMLSceneWidget() { CloseDocument(); }
 
 void VQMLSceneWidget::PublishContext()
 {

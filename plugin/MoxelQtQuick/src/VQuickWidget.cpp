@@ -28,11 +28,9 @@ VQuickWidget::VQuickWidget( std::shared_ptr< HarrowPluginInterface::IHarrowQuick
   SetContextProperty( "contextPersistentProperties", &m_PersistentProperties );
 }
 
-VQuickWidget::~VQuickWidget()
-{
-  // The document goes while the context properties that it reads are still there.
-  delete rootObject();
-}
+VQuickWidget::~VQuickWidget() { CloseDocument(); }
+
+void VQuickWidget::CloseDocument() { delete rootObject(); }
 
 void VQuickWidget::SetContextProperty( const QString& i_rName, const QVariant& i_rValue )
 {

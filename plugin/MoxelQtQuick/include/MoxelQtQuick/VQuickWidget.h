@@ -53,6 +53,8 @@ public:
   void LoadDocument( const QUrl& i_rUrl );
 
 protected:
+  /// Ends the document. A derived class whose members the document reads calls it first thing in its destructor.
+  void CloseDocument();
   const std::shared_ptr< HarrowPluginInterface::IHarrowQuickHost >& QuickHost() const { return m_pQuickHost; }
 
 private:
