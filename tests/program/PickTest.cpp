@@ -177,6 +177,32 @@ TEST( Report, SaysWhichFrameItShowsAndWhatItDrewWith )
   EXPECT_EQ( QJsonDocument( Report["log"].toArray() ).toJson( QJsonDocument::Compact ).toStdString(), "[]" );
 }
 
+TEST( Report, ACutOffRecordingIsShownAndNoted )
+{
+  HARROW_NEEDS_MODULE();
+  HARROW_NEEDS_RECORDINGS();
+  const QJsonObject Report = Render( { "--source", Recording( "c3d-gpl/Optotrak.c3d" ), "--size", "320x200" } );
+  EXPECT_EQ( Report["frame"].toObject()["count"].toInt(), 29 );
+  EXPECT_TRUE( Report["notes"].toArray().at( 0 ).toString().contains( "Optotrak.c3d" ) );
+}
+
+TEST( Report, DragsAndTheWheelMoveTheCamera )
+{
+  HARROW_NEEDS_MODULE();
+  const QStringList View{ "--size", "320x200" };
+  const auto Camera = [&]( const QStringList& i_rDone )
+  {
+    return Render( View + i_rDone )["camera"].toObject();
+  };
+  // A fifth of a degree a pixel; one turn of the wheel comes nearer by a tenth; a zoom goes 15 mm a pixel.
+  EXPECT_NEAR( Camera( { "--drag", "100,100,150,100" } )["azimuth"].toDouble(), 55, 1e-3 );
+  EXPECT_NEAR( Camera( { "--wheel", "100,100,120" } )["distance"].toDouble(), 6300, 1e-2 );
+  EXPECT_NEAR( Camera( { "--drag", "100,100,100,150,right" } )["distance"].toDouble(), 7750, 1e-2 );
+  const QJsonObject Home = Camera( { "--drag", "100,100,150,120", "--wheel", "9,9,-120", "--key", "Home" } );
+  EXPECT_NEAR( Home["azimuth"].toDouble(), 45, 1e-6 );
+  EXPECT_NEAR( Home["distance"].toDouble(), 7000, 1e-6 );
+}
+
 TEST( Report, AFrameOffTheEndIsTheLastOne )
 {
   HARROW_NEEDS_MODULE();

@@ -52,6 +52,7 @@ VRunResult OpenSource( VSession& io_rSession, const std::string& i_rSource, doub
     if ( !Message.empty() )
     {
       std::cerr << "harrow: " << Message << std::endl;
+      pRecording->Notes.insert( pRecording->Notes.begin(), Message );
     }
     io_rSession.OpenRecording( pRecording );
   }

@@ -13,6 +13,13 @@ namespace HostWindow
 void VMainWindow::MakeMenus()
 {
   MakeFileMenu();
+  QMenu* pEdit = menuBar()->addMenu( tr( "&Edit" ) );
+  QUndoStack& rUndo = m_rSession.Host().Undo().Stack();
+  QAction* pUndo = rUndo.createUndoAction( pEdit, tr( "&Undo" ) );
+  pUndo->setShortcut( QKeySequence::Undo );
+  QAction* pRedo = rUndo.createRedoAction( pEdit, tr( "&Redo" ) );
+  pRedo->setShortcut( QKeySequence::Redo );
+  pEdit->addActions( { pUndo, pRedo } );
   MakeViewMenu();
   MakePlaybackMenu();
   m_pWindowMenu = menuBar()->addMenu( tr( "&Window" ) );

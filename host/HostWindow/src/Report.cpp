@@ -109,6 +109,20 @@ QJsonObject UpAxisOf( const HostSources::IFrameSource& i_rSource )
            { "reason", QString::fromStdString( i_rSource.UpAxisReason() ) } };
 }
 
+/// What was odd about the recording; empty for the simulated capture.
+QJsonArray NotesOf( const HostSources::IFrameSource& i_rSource )
+{
+  QJsonArray Notes;
+  if ( const auto* pRecording = dynamic_cast< const HostSources::VRecordingSource* >( &i_rSource ) )
+  {
+    for ( const std::string& rNote : pRecording->Recording().Notes )
+    {
+      Notes.append( QString::fromStdString( rNote ) );
+    }
+  }
+  return Notes;
+}
+
 QJsonObject OptionsOf( const std::vector< VViewAction >& i_rActions, const VSceneView& i_rView )
 {
   QJsonObject Options;
@@ -172,6 +186,7 @@ QJsonObject DescribeView( VSession& i_rSession, const VRenderOptions& i_rRender,
     Report["sourceName"] = QString::fromStdString( pSource->Name() );
     Report["frame"] = FrameOf( *pSource, i_rSession.ShownFrame() );
     Report["upAxis"] = UpAxisOf( *pSource );
+    Report["notes"] = NotesOf( *pSource );
   }
   Report["window"] = QString::fromStdString( i_rWindow );
   const QSizeF Size = i_rView.Item() ? i_rView.Item()->size() : QSizeF();
