@@ -50,8 +50,7 @@ VRenderFloorGrid::VRenderFloorGrid( std::shared_ptr< CoreGraphics::VResources > 
   // One texture is one cell, repeated over the floor.
   m_pGl->Sampling.clampS = false;
   m_pGl->Sampling.clampT = false;
-  // The border and the cross lie in the plane of the grid.
-  m_pGl->BorderState.depthFunction = EDepthLessOrEqual;
+  m_pGl->BorderState.depthWrite = false;
 }
 
 VRenderFloorGrid::~VRenderFloorGrid() = default;
@@ -72,7 +71,7 @@ void VRenderFloorGrid::Render( CoreGraphics::VRenderContext& io_rContext, const 
     return;
   }
   RenderGrid( io_rContext, bTranslucent );
-  RenderBorder( io_rContext );
+  RenderBorder( io_rContext, bTranslucent );
 }
 
 void VRenderFloorGrid::RenderGrid( CoreGraphics::VRenderContext& io_rContext, bool i_bTranslucent )
@@ -83,6 +82,7 @@ void VRenderFloorGrid::RenderGrid( CoreGraphics::VRenderContext& io_rContext, bo
     return;
   }
   rGl.GridState.colourBlend = i_bTranslucent ? EColourBlendAlpha : EColourBlendNone;
+  rGl.GridState.depthWrite = !i_bTranslucent;
   io_rContext.SetRenderState( rGl.GridState );
   io_rContext.BindTexture( 0, rGl.Texture.Id( io_rContext ) );
   io_rContext.SetTextureSampling( rGl.Sampling );
@@ -92,13 +92,16 @@ void VRenderFloorGrid::RenderGrid( CoreGraphics::VRenderContext& io_rContext, bo
   io_rContext.DrawArrays( GL_TRIANGLE_FAN, 4 );
 }
 
-void VRenderFloorGrid::RenderBorder( CoreGraphics::VRenderContext& io_rContext )
+void VRenderFloorGrid::RenderBorder( CoreGraphics::VRenderContext& io_rContext, bool i_bTranslucent )
 {
   VGl& rGl = *m_pGl;
   if ( !io_rContext.UseProgram( rGl.pPlain ) || !io_rContext.SetVertexBuffer( { &rGl.Quad, &PositionLayout(), 0 } ) )
   {
     return;
   }
+  // Border and cross lie in the plane of the grid and would flicker against its depth. A translucent grid leaves
+  // none; an opaque one is drawn before all else, so that they need no test.
+  rGl.BorderState.depthTest = i_bTranslucent;
   io_rContext.SetRenderState( rGl.BorderState );
   rGl.Colour.Set( *rGl.pPlain, BorderColour );
   const auto Draw = [&]( GLenum i_Mode, const std::array< int, 4 >& i_rExtents )

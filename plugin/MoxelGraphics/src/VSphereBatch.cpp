@@ -109,27 +109,43 @@ float VSphereBatch::Radius( const VScenePoint& i_rSphere, const VSphereSizing& i
   return std::isfinite( Own ) && Own > 0 && IsPlace( i_rSphere ) ? Own * i_rSizing.Scale : 0.0f;
 }
 
-float VSphereBatch::PixelRadius( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing ) const
+VSphereBatch::VExtent VSphereBatch::Extent( CoreGraphics::VRenderContext& io_rContext,
+                                            const VSphereSizing& i_rSizing ) const
 {
   const float Largest = ( i_rSizing.FixedRadius < 0 ? m_LargestRadius : i_rSizing.FixedRadius ) * i_rSizing.Scale;
   const QMatrix4x4& rProjection = io_rContext.Projection();
   // Half the frame's height, over what the projection maps to it at distance 1.
   const float PixelsAtOne = rProjection( 1, 1 ) * 0.5f * static_cast< float >( io_rContext.Viewport().height() );
-  const bool bOrthographic = rProjection( 3, 3 ) != 0.0f;
-  float Distance = 1.0f;
-  if ( !bOrthographic )
+  if ( rProjection( 3, 3 ) != 0.0f )
   {
-    const QVector3D Eye = io_rContext.CameraPosition();
-    float Square = 0;
-    for ( int Axis = 0; Axis < 3; ++Axis )
-    {
-      const auto Index = static_cast< std::size_t >( Axis );
-      const float Gap = std::max( { m_BoxMin[Index] - Eye[Axis], Eye[Axis] - m_BoxMax[Index], 0.0f } );
-      Square += Gap * Gap;
-    }
-    Distance = std::sqrt( Square );
+    const float Pixels = Largest * PixelsAtOne;
+    return { Pixels, Pixels >= FinePixels ? m_Spheres.size() : 0 };
   }
-  return Largest * PixelsAtOne / std::max( Distance, 1e-3f );
+  const QVector3D Eye = io_rContext.CameraPosition();
+  float Square = 0;
+  for ( int Axis = 0; Axis < 3; ++Axis )
+  {
+    const auto Index = static_cast< std::size_t >( Axis );
+    const float Gap = std::max( { m_BoxMin[Index] - Eye[Axis], Eye[Axis] - m_BoxMax[Index], 0.0f } );
+    Square += Gap * Gap;
+  }
+  const float AtMost = Largest * PixelsAtOne / std::max( std::sqrt( Square ), 1e-3f );
+  if ( AtMost < CoarsePixels )
+  {
+    return { AtMost, 0 };
+  }
+  // The box may reach to the eye where no sphere does: look at each.
+  const QVector4D Depth = io_rContext.ViewProjection().row( 3 );
+  VExtent Result;
+  for ( const VScenePoint& rSphere : m_Spheres )
+  {
+    const float Away = Depth.x() * rSphere.X + Depth.y() * rSphere.Y + Depth.z() * rSphere.Z + Depth.w();
+    const float Size = Radius( rSphere, i_rSizing );
+    const float Pixels = Away + Size > 0 ? Size * PixelsAtOne / std::max( Away, 1.0f ) : 0.0f;
+    Result.Largest = std::max( Result.Largest, Pixels );
+    Result.FineCount += Pixels >= FinePixels ? 1 : 0;
+  }
+  return Result;
 }
 
 bool VSphereBatch::UploadSpheres( const VSphereSizing& i_rSizing )

@@ -7,6 +7,13 @@
 namespace MoxelGraphics
 {
 
+/// Spheres of at least this radius in pixels get the fine mesh.
+constexpr float FinePixels = 12.0f;
+/// Below this the twenty faces of an icosahedron look as round as anything.
+constexpr float RoughPixels = 2.5f;
+/// Below this a sphere is a point: nobody sees the difference, and it costs a vertex in place of 42.
+constexpr float CoarsePixels = 1.0f;
+
 /// The buffers of a batch, and what they hold: generations of the batch's own contents, 0 for nothing.
 struct VSphereBatch::VGl
 {

@@ -24,10 +24,9 @@ const VVertexLayout PointLayout( sizeof( VScenePoint ), 0, { { EAttributePositio
 const VVertexLayout PointColourLayout( 4, 0, { { EAttributeModelColour, 4, GL_UNSIGNED_BYTE, true, 0 } } );
 const VVertexLayout PointFlagsLayout( 1, 0, { { EAttributeInstanceFlags, 1, GL_UNSIGNED_BYTE, false, 0 } } );
 
-/// Spheres of at least this radius in pixels get the fine mesh.
-constexpr float FinePixels = 12.0f;
-/// Below this a sphere is a point: nobody sees the difference, and it costs a vertex in place of 42.
-constexpr float CoarsePixels = 1.0f;
+/// A batch of up to so many spheres gets the fine mesh when one sphere deserves it, a larger one when an eighth does:
+/// all spheres of a batch share one mesh, so that they stay one draw.
+constexpr std::size_t SmallBatch = 2000;
 
 VRenderState SphereState()
 {
@@ -44,6 +43,14 @@ struct VSphereHelper::VGl
   VInstancedProgramPair Points;
   VMesh Fine = MakeSphereMesh( 2 );
   VMesh Coarse = MakeSphereMesh( 1 );
+  VMesh Rough = MakeSphereMesh( 0 );
+
+  /// Null for points.
+  VMesh* MeshFor( float i_Largest, bool i_bFine )
+  {
+    VMesh* pSmall = i_Largest < CoarsePixels ? nullptr : i_Largest < RoughPixels ? &Rough : &Coarse;
+    return i_bFine ? &Fine : pSmall;
+  }
   VRenderState State = SphereState();
 };
 
@@ -81,8 +88,10 @@ void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxe
   const std::uint32_t First = Mode == ERenderModeHighlight ? io_rBatch.m_MarkedBegin : 0;
   const std::uint32_t End =
       Mode == ERenderModeHighlight ? io_rBatch.m_MarkedEnd : static_cast< std::uint32_t >( io_rBatch.Count() );
-  const float Pixels = io_rBatch.PixelRadius( io_rContext, i_rSizing );
-  VMesh* pMesh = Pixels < CoarsePixels ? nullptr : Pixels < FinePixels ? &m_pGl->Coarse : &m_pGl->Fine;
+  const auto Extent = io_rBatch.Extent( io_rContext, i_rSizing );
+  const bool bFine =
+      Extent.FineCount > 0 && ( io_rBatch.Count() <= SmallBatch || Extent.FineCount >= io_rBatch.Count() / 8 );
+  VMesh* pMesh = m_pGl->MeshFor( Extent.Largest, bFine );
   VInstancedProgramPair& rPrograms = pMesh ? m_pGl->Programs : m_pGl->Points;
   if ( !rPrograms.Use( io_rContext, io_rBatch.FirstId() == 0 ? 0 : io_rBatch.FirstId() + First ) )
   {

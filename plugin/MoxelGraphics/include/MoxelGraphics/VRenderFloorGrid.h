@@ -13,7 +13,7 @@ class VResources;
 namespace MoxelGraphics
 {
 
-/// The floor: a grid of lines, its border, and a cross through the origin.
+/// The floor: a grid of lines, its border, and a cross through the origin. Stands first in a scene's render list.
 class VRenderFloorGrid : public IRenderType
 {
 public:
@@ -32,7 +32,7 @@ public:
 private:
   struct VGl;
   void RenderGrid( CoreGraphics::VRenderContext& io_rContext, bool i_bTranslucent );
-  void RenderBorder( CoreGraphics::VRenderContext& io_rContext );
+  void RenderBorder( CoreGraphics::VRenderContext& io_rContext, bool i_bTranslucent );
 
   std::unique_ptr< VGl > m_pGl;
   std::array< int, 4 > m_Extents{ -3000, -3000, 3000, 3000 };

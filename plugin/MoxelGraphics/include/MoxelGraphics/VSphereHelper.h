@@ -68,8 +68,13 @@ private:
 
   void MeasureBox();
   float Radius( const VScenePoint& i_rSphere, const VSphereSizing& i_rSizing ) const;
-  /// The radius in pixels that a sphere of the batch has at most.
-  float PixelRadius( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing ) const;
+  /// How large the spheres of the batch are in pixels.
+  struct VExtent
+  {
+    float Largest = 0;
+    std::size_t FineCount = 0; ///< how many are large enough for the fine mesh
+  };
+  VExtent Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing ) const;
   bool UploadSpheres( const VSphereSizing& i_rSizing );
   bool UploadColours();
   bool UploadFlags( const VMoxelScene& i_rScene, bool i_bIgnoring );
