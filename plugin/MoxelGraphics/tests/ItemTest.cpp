@@ -69,6 +69,18 @@ protected:
           } ) );
     }
   }
+  /// Lets everything run out that is still under way.
+  void Settle()
+  {
+    quint64 Last = Drawn();
+    for ( int Quiet = 0; Quiet < 10; ++Quiet )
+    {
+      QCoreApplication::processEvents( QEventLoop::AllEvents, 20 );
+      QThread::msleep( 5 );
+      Quiet = Drawn() == Last ? Quiet : 0;
+      Last = Drawn();
+    }
+  }
   void Mouse( QEvent::Type i_Type, QPointF i_Place, Qt::MouseButton i_Button, Qt::MouseButtons i_Buttons,
               Qt::KeyboardModifiers i_Modifiers = Qt::NoModifier )
   {
@@ -114,7 +126,7 @@ TEST_F( VItemTest, ThePictureStandsUpright )
 TEST_F( VItemTest, OnlyTheItemsOwnUpdateDrawsAFrame )
 {
   Frames( 1 );
-  QCoreApplication::processEvents();
+  Settle();
   // Figures are taken when the next frame begins, so a frame shows in the report one update later.
   const quint64 Before = Drawn();
   for ( int Turn = 0; Turn < 10; ++Turn )
@@ -238,10 +250,7 @@ TEST_F( VItemTest, AHoveringPointerDoesNotKeepTheViewBusy )
       {
         return !Preselected().empty();
       } ) );
-  for ( int Turn = 0; Turn < 20; ++Turn )
-  {
-    QCoreApplication::processEvents( QEventLoop::AllEvents, 10 );
-  }
+  Settle();
   const quint64 Before = Drawn();
   for ( int Turn = 0; Turn < 20; ++Turn )
   {
