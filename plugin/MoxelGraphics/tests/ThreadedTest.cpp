@@ -4,6 +4,7 @@
 
 #include <QtCore/QDeadlineTimer>
 #include <QtGui/QMouseEvent>
+#include <QtGui/QWheelEvent>
 #include <QtQuick/QQuickView>
 
 #include <thread>
@@ -64,7 +65,7 @@ TEST( ThreadedView, DrawsAndPicksWhileDataArrive )
     {
       return pItem->frameReport()["frames"].toInt() >= 30 && bPicked;
     };
-    for ( int Turn = 0; ( Turn < 60 || !Enough() ) && !Patience.hasExpired(); ++Turn )
+    for ( int Turn = 0; ( Turn < 100 || !Enough() ) && !Patience.hasExpired(); ++Turn )
     {
       const auto Type = Turn % 4 == 0   ? QEvent::MouseButtonPress
                         : Turn % 4 == 1 ? QEvent::MouseButtonRelease
@@ -72,6 +73,12 @@ TEST( ThreadedView, DrawsAndPicksWhileDataArrive )
       QMouseEvent Event( Type, Place, View.mapToGlobal( Place ), Turn % 4 < 2 ? Qt::LeftButton : Qt::NoButton,
                          Turn % 4 == 0 ? Qt::LeftButton : Qt::NoButton, Qt::NoModifier );
       QCoreApplication::sendEvent( &View, &Event );
+      if ( Turn > 40 )
+      {
+        QWheelEvent Wheel( Place, View.mapToGlobal( Place ), {}, { 0, Turn % 2 == 0 ? 120 : -120 }, Qt::NoButton,
+                           Qt::NoModifier, Qt::NoScrollPhase, false );
+        QCoreApplication::sendEvent( &View, &Wheel );
+      }
       pItem->setOption( "GlobalAxis", Turn % 2 == 0 );
       pItem->setProperty( "focusSelection", Turn == 30 );
       pItem->update();
