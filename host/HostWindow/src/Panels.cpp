@@ -28,6 +28,8 @@ VMessageBar::VMessageBar( QWidget* i_pParent )
   m_pText->setTextInteractionFlags( Qt::TextSelectableByMouse );
   m_pText->setContentsMargins( 8, 3, 8, 3 );
   m_pText->setSizePolicy( QSizePolicy::Expanding, QSizePolicy::Preferred );
+  // A wrapped text alone would ask for a narrow and high strip.
+  m_pText->setMinimumWidth( 480 );
   addWidget( m_pText );
   QAction* pClose = addAction( style()->standardIcon( QStyle::SP_TitleBarCloseButton ), tr( "Close this message" ) );
   connect( pClose, &QAction::triggered, this, &QWidget::hide );
