@@ -308,7 +308,7 @@ TEST_F( MainWindow, RecordingsCanBeDroppedAndOtherFilesCannot )
     }
     return Enter.isAccepted();
   };
-  EXPECT_FALSE( Drop( "/tmp/mesh.fbx" ) );
+  EXPECT_FALSE( Drop( "/mesh.fbx" ) );
   EXPECT_TRUE( Drop( WriteTrc( m_Folder, "dropped.TRC" ) ) );
   EXPECT_TRUE( SpinUntil(
       [&]
