@@ -5,6 +5,7 @@
 #include <QtQml/QQmlPropertyMap>
 
 #include <cmath>
+#include <optional>
 #include <unordered_map>
 
 namespace MoxelGraphics

@@ -4,7 +4,6 @@
 #include <QtCore/QVariant>
 
 #include <limits>
-#include <optional>
 #include <variant>
 #include <vector>
 
