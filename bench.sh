@@ -24,16 +24,16 @@ trap 'rm -rf "$parts"' EXIT
 # Submission is timed with the driver that draws nothing; its programs read HARROW_BENCH_EMPTY_DRIVER themselves.
 for program in build/bench/bin/bench_*; do
   name=$(basename "$program")
-  list=$(xvfb-run -a -s "-screen 0 1920x1080x24" "$program" --benchmark_list_tests --benchmark_filter="$filter" 2>/dev/null || true)
+  list=$(xvfb-run -a -s "-screen 0 1920x1080x24 -noreset" "$program" --benchmark_list_tests --benchmark_filter="$filter" 2>/dev/null || true)
   empty=$(printf '%s\n' "$list" | grep -E '/(submit|still|floor_submit|floor_still)(/|$)' || true)
   drawn=$(printf '%s\n' "$list" | grep -v -E '/(submit|still|floor_submit|floor_still)(/|$)' | grep '/' || true)
   as_filter() { printf '%s\n' "$1" | sed 's/^/^/;s/$/$/' | paste -sd'|'; }
   if [ -n "$drawn" ]; then
-    xvfb-run -a -s "-screen 0 1920x1080x24" "$program" --benchmark_filter="$(as_filter "$drawn")" \
+    xvfb-run -a -s "-screen 0 1920x1080x24 -noreset" "$program" --benchmark_filter="$(as_filter "$drawn")" \
       --benchmark_out="$parts/$name.json" --benchmark_out_format=json
   fi
   if [ -n "$empty" ]; then
-    GALLIUM_NOOP=1 xvfb-run -a -s "-screen 0 1920x1080x24" "$program" --benchmark_filter="$(as_filter "$empty")" \
+    GALLIUM_NOOP=1 xvfb-run -a -s "-screen 0 1920x1080x24 -noreset" "$program" --benchmark_filter="$(as_filter "$empty")" \
       --benchmark_out="$parts/$name-empty.json" --benchmark_out_format=json
   fi
 done

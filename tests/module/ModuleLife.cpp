@@ -5,6 +5,7 @@
 #include <HostServices/VPluginModule.h>
 #include <HostSources/VSimulatedCapture.h>
 
+#include <QtCore/QCoreApplication>
 #include <QtCore/QElapsedTimer>
 #include <QtCore/QLibrary>
 #include <QtCore/QPointer>

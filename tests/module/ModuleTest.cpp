@@ -24,7 +24,7 @@ struct VRun
   std::string Output;
 };
 
-VRun Run( const std::string& i_rCommand )
+VRun Execute( const std::string& i_rCommand )
 {
   VRun Result;
   FILE* const pPipe = popen( ( i_rCommand + " 2>&1" ).c_str(), "r" );
@@ -44,13 +44,13 @@ VRun Run( const std::string& i_rCommand )
 
 VRun Life( const std::string& i_rStory )
 {
-  return Run( ( TestSupport::BinaryDir() / "bin" / "ModuleLife" ).string() + " " + Module() + " " + i_rStory );
+  return Execute( ( TestSupport::BinaryDir() / "bin" / "ModuleLife" ).string() + " " + Module() + " " + i_rStory );
 }
 } // namespace
 
 TEST( Module, ExportsThreeFunctionsAndNothingElse )
 {
-  const VRun Names = Run( "nm -D --defined-only " + Module() );
+  const VRun Names = Execute( "nm -D --defined-only " + Module() );
   ASSERT_EQ( Names.ExitCode, 0 ) << Names.Output;
   std::set< std::string > Exports;
   std::istringstream Stream( Names.Output );

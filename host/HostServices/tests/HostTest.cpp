@@ -4,6 +4,7 @@
 #include <TestSupport/LogGuard.h>
 #include <TestSupport/Paths.h>
 
+#include <QtCore/QCoreApplication>
 #include <QtQml/QQmlComponent>
 #include <QtQml/QQmlEngine>
 

@@ -48,7 +48,7 @@ VFile WholeFile()
   File.PerFrame = 4;
   for ( int Index = 0; Index < 20; ++Index )
   {
-    File.Labels.push_back( "M" + std::to_string( Index ) );
+    File.Labels.push_back( std::string( 1, 'M' ).append( std::to_string( Index ) ) );
   }
   File.Frames.assign( 10, std::vector< double >( 4 * 20 + 24, 1.5 ) );
   File.SetParameter( { "FORCE_PLATFORM", "USED", 2, {}, { 1 }, {} } );

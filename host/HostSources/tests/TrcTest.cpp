@@ -35,7 +35,7 @@ std::string WithCarriageReturns( std::string i_Text )
 {
   for ( std::size_t At = 0; ( At = i_Text.find( '\n', At ) ) != std::string::npos; At += 2 )
   {
-    i_Text.insert( At, "\r" );
+    i_Text.insert( At, 1, '\r' );
   }
   return i_Text;
 }

@@ -8,6 +8,7 @@
 #include <QtCore/QLibrary>
 #include <QtCore/QStandardPaths>
 #include <QtCore/QThread>
+#include <QtGui/QGuiApplication>
 #include <QtGui/QSurfaceFormat>
 #include <QtQuick/QQuickWindow>
 

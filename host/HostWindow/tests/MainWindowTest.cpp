@@ -3,8 +3,10 @@
 #include <TestSupport/LogGuard.h>
 #include <TestSupport/Paths.h>
 
+#include <QtCore/QCoreApplication>
 #include <QtCore/QElapsedTimer>
 #include <QtCore/QMimeData>
+#include <QtCore/QThread>
 #include <QtGui/QDropEvent>
 #include <QtQml/QQmlComponent>
 

@@ -67,7 +67,10 @@ VQMLSceneWidget::VQMLSceneWidget( VSceneWidgetArguments i_Arguments )
   }
 }
 
-VQMLSceneWidget::~VQMLSceneWidget() { CloseDocument(); }
+VQMLSceneWidget::~VQMLSceneWidget()
+{
+  CloseDocument();
+}
 
 void VQMLSceneWidget::PublishContext()
 {
@@ -76,8 +79,8 @@ void VQMLSceneWidget::PublishContext()
   {
     return ( Flags & i_Bits ) != 0;
   };
-  SetContextProperty( "contextFlowScene", m_Arguments.pScene.get() );
-  SetContextProperty( "contextCameraGrid", static_cast< QObject* >( nullptr ) );
+  SetContextObject( "contextFlowScene", m_Arguments.pScene.get() );
+  SetContextObject( "contextCameraGrid", nullptr );
   SetContextProperty( "contextCameraType", 0 );
   SetContextProperty( "contextFocusSelection", false );
   SetContextProperty( "contextMissingMarkersEnabled", Has( EFeatureSubjects | EFeatureLiveSubjects ) );

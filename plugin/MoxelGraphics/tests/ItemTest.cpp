@@ -6,7 +6,9 @@
 
 #include <TestSupport/LogGuard.h>
 
+#include <QtCore/QCoreApplication>
 #include <QtCore/QDeadlineTimer>
+#include <QtCore/QThread>
 #include <QtCore/QVersionNumber>
 #include <QtGui/QMouseEvent>
 #include <QtQml/QQmlComponent>

@@ -2,7 +2,9 @@
 
 #include <MoxelGraphics/VSceneFramebufferObject.h>
 
+#include <QtCore/QCoreApplication>
 #include <QtCore/QDeadlineTimer>
+#include <QtCore/QThread>
 #include <QtGui/QMouseEvent>
 #include <QtGui/QWheelEvent>
 #include <QtQuick/QQuickView>

@@ -24,20 +24,26 @@ VQuickWidget::VQuickWidget( std::shared_ptr< HarrowPluginInterface::IHarrowQuick
   , m_pQuickHost( std::move( i_pQuickHost ) )
   , m_pContext( new QQmlContext( m_pQuickHost->Engine()->rootContext(), this ) )
 {
-  SetContextProperty( "contextQuickWidget", this );
-  SetContextProperty( "contextPersistentProperties", &m_PersistentProperties );
+  SetContextObject( "contextQuickWidget", this );
+  SetContextObject( "contextPersistentProperties", &m_PersistentProperties );
 }
 
-VQuickWidget::~VQuickWidget() { CloseDocument(); }
+VQuickWidget::~VQuickWidget()
+{
+  CloseDocument();
+}
 
-void VQuickWidget::CloseDocument() { delete rootObject(); }
+void VQuickWidget::CloseDocument()
+{
+  delete rootObject();
+}
 
 void VQuickWidget::SetContextProperty( const QString& i_rName, const QVariant& i_rValue )
 {
   m_pContext->setContextProperty( i_rName, i_rValue );
 }
 
-void VQuickWidget::SetContextProperty( const QString& i_rName, QObject* i_pValue )
+void VQuickWidget::SetContextObject( const QString& i_rName, QObject* i_pValue )
 {
   m_pContext->setContextProperty( i_rName, i_pValue );
 }

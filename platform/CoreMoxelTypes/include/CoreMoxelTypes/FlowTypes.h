@@ -100,63 +100,54 @@ struct FlowValueType< CoreMoxelTypes::FlowParametersItem >
   static constexpr VFlowItemType Descriptor{
       "FlowParametersItem", 0x1, 1, 0, 0, "Parameters that can be tagged and addressed to a particular target" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraHardware >
 {
   using type = CoreMoxelTypes::VCameraHardware;
   static constexpr VFlowItemType Descriptor{ "FlowCameraHardware", 0x1000, 1, 0, 1, "CameraHardware Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraSettings >
 {
   using type = CoreMoxelTypes::VCameraSettings;
   static constexpr VFlowItemType Descriptor{ "FlowCameraSettings", 0x1001, 1, 0, 0, "CameraSettings Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraMaskGrid >
 {
   using type = CoreMoxelTypes::VCameraMaskGrid;
   static constexpr VFlowItemType Descriptor{ "FlowCameraMaskGrid", 0x1002, 1, 0, 0, "CameraMaskGrid Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCentroidSet >
 {
   using type = CoreMoxelTypes::VCentroidSet;
   static constexpr VFlowItemType Descriptor{ "FlowCentroidSet", 0x1003, 2, 0, 0, "CentroidSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowGreyscaleBlobSet >
 {
   using type = CoreMoxelTypes::VGreyscaleBlobSet;
   static constexpr VFlowItemType Descriptor{ "FlowGreyscaleBlobSet", 0x1005, 1, 0, 4, "GreyscaleBlobSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowEdgePairSet >
 {
   using type = CoreMoxelTypes::VEdgePairSet;
   static constexpr VFlowItemType Descriptor{ "FlowEdgePairSet", 0x1006, 1, 0, 1, "EdgePairSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowVideoFrame >
 {
   using type = CoreMoxelTypes::VVideoFrame;
   static constexpr VFlowItemType Descriptor{ "FlowVideoFrame", 0x1007, 3, 1, 5, "VideoFrame Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraCalibration >
 {
   using type = CoreMoxelTypes::VCameraCalibration;
   static constexpr VFlowItemType Descriptor{ "FlowCameraCalibration", 0x100a, 1, 1, 0, "CameraCalibration Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraCalibrationHealth >
 {
@@ -164,7 +155,6 @@ struct FlowValueType< CoreMoxelTypes::FlowCameraCalibrationHealth >
   static constexpr VFlowItemType Descriptor{ "FlowCameraCalibrationHealth", 0x100b, 2, 0, 3,
                                              "CameraCalibrationHealth Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCentroidAssignmentSet >
 {
@@ -172,14 +162,12 @@ struct FlowValueType< CoreMoxelTypes::FlowCentroidAssignmentSet >
   static constexpr VFlowItemType Descriptor{ "FlowCentroidAssignmentSet", 0x100c, 1, 0, 0,
                                              "CentroidAssignmentSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowReconstructionSet >
 {
   using type = CoreMoxelTypes::VReconstructionSet;
   static constexpr VFlowItemType Descriptor{ "FlowReconstructionSet", 0x100d, 1, 0, 0, "ReconstructionSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowReconstructionTrackSet >
 {
@@ -187,7 +175,6 @@ struct FlowValueType< CoreMoxelTypes::FlowReconstructionTrackSet >
   static constexpr VFlowItemType Descriptor{ "FlowReconstructionTrackSet", 0x100e, 1, 0, 0,
                                              "ReconstructionTrackSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowReconstructionLabelSet >
 {
@@ -195,7 +182,6 @@ struct FlowValueType< CoreMoxelTypes::FlowReconstructionLabelSet >
   static constexpr VFlowItemType Descriptor{ "FlowReconstructionLabelSet", 0x100f, 1, 0, 0,
                                              "ReconstructionLabelSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectDynamicParameters >
 {
@@ -203,14 +189,12 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectDynamicParameters >
   static constexpr VFlowItemType Descriptor{ "FlowSubjectDynamicParameters", 0x1011, 1, 0, 0,
                                              "SubjectDynamicParameters Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubject >
 {
   using type = CoreMoxelTypes::VSubject;
   static constexpr VFlowItemType Descriptor{ "FlowSubject", 0x1012, 1, 1, 2, "Subject Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectApplicationData >
 {
@@ -218,35 +202,30 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectApplicationData >
   static constexpr VFlowItemType Descriptor{ "FlowSubjectApplicationData", 0x1013, 1, 0, 4,
                                              "SubjectApplicationData Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraWand2d >
 {
   using type = CoreMoxelTypes::VCameraWand2d;
   static constexpr VFlowItemType Descriptor{ "FlowCameraWand2d", 0x1015, 2, 0, 2, "CameraWand2d Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowGeometrySet >
 {
   using type = CoreMoxelTypes::VGeometrySet;
   static constexpr VFlowItemType Descriptor{ "FlowGeometrySet", 0x1018, 1, 0, 0, "GeometrySet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectParametrised >
 {
   using type = CoreMoxelTypes::VSubjectParametrised;
   static constexpr VFlowItemType Descriptor{ "FlowSubjectParametrised", 0x101a, 1, 1, 1, "SubjectParametrised Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectForSolving >
 {
   using type = CoreMoxelTypes::VSubject;
   static constexpr VFlowItemType Descriptor{ "FlowSubjectForSolving", 0x101b, 1, 1, 2, "Subject Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectApplicationDataForSolving >
 {
@@ -254,7 +233,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectApplicationDataForSolving >
   static constexpr VFlowItemType Descriptor{ "FlowSubjectApplicationDataForSolving", 0x101c, 1, 0, 4,
                                              "SubjectApplicationData Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectDynamicParametersForSolving >
 {
@@ -262,7 +240,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectDynamicParametersForSolving >
   static constexpr VFlowItemType Descriptor{ "FlowSubjectDynamicParametersForSolving", 0x101d, 1, 0, 0,
                                              "SubjectDynamicParameters Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowReconstructionSetForSolving >
 {
@@ -270,7 +247,6 @@ struct FlowValueType< CoreMoxelTypes::FlowReconstructionSetForSolving >
   static constexpr VFlowItemType Descriptor{ "FlowReconstructionSetForSolving", 0x101e, 1, 0, 0,
                                              "ReconstructionSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowReconstructionLabelSetForSolving >
 {
@@ -278,21 +254,18 @@ struct FlowValueType< CoreMoxelTypes::FlowReconstructionLabelSetForSolving >
   static constexpr VFlowItemType Descriptor{ "FlowReconstructionLabelSetForSolving", 0x101f, 1, 0, 0,
                                              "ReconstructionLabelSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCentroidLabelSet >
 {
   using type = CoreMoxelTypes::VCentroidLabelSet;
   static constexpr VFlowItemType Descriptor{ "FlowCentroidLabelSet", 0x1022, 1, 0, 0, "CentroidLabelSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowDevice >
 {
   using type = CoreMoxelTypes::VDevice;
   static constexpr VFlowItemType Descriptor{ "FlowDevice", 0x1023, 2, 1, 2, "Device Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowDeviceApplicationData >
 {
@@ -300,35 +273,30 @@ struct FlowValueType< CoreMoxelTypes::FlowDeviceApplicationData >
   static constexpr VFlowItemType Descriptor{ "FlowDeviceApplicationData", 0x1024, 2, 0, 0,
                                              "DeviceApplicationData Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowDeviceSamples >
 {
   using type = CoreMoxelTypes::VDeviceSamples;
   static constexpr VFlowItemType Descriptor{ "FlowDeviceSamples", 0x1025, 2, 0, 0, "DeviceSamples Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowAudioFrame >
 {
   using type = CoreMoxelTypes::VAudioFrame;
   static constexpr VFlowItemType Descriptor{ "FlowAudioFrame", 0x1026, 1, 0, 2, "AudioFrame Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectSettings >
 {
   using type = CoreMoxelTypes::VSubjectSettings;
   static constexpr VFlowItemType Descriptor{ "FlowSubjectSettings", 0x1027, 1, 0, 6, "SubjectSettings Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowWorldAxis >
 {
   using type = CoreMoxelTypes::VWorldAxis;
   static constexpr VFlowItemType Descriptor{ "FlowWorldAxis", 0x1029, 1, 0, 0, "WorldAxis Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectTemplate >
 {
@@ -336,7 +304,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectTemplate >
   static constexpr VFlowItemType Descriptor{
       "FlowSubjectTemplate", 0x102a, 1, 1, 1, "Uncalibrated subject template item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectParametrisedForSolving >
 {
@@ -344,14 +311,12 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectParametrisedForSolving >
   static constexpr VFlowItemType Descriptor{ "FlowSubjectParametrisedForSolving",        0x102c, 1, 1, 1,
                                              "SubjectParametrised for second solve item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraPhysicalStatus >
 {
   using type = CoreMoxelTypes::VCameraPhysicalStatus;
   static constexpr VFlowItemType Descriptor{ "FlowCameraPhysicalStatus", 0x102d, 1, 0, 1, "CameraPhysicalStatus Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraPhysicalSensorData >
 {
@@ -359,7 +324,6 @@ struct FlowValueType< CoreMoxelTypes::FlowCameraPhysicalSensorData >
   static constexpr VFlowItemType Descriptor{ "FlowCameraPhysicalSensorData", 0x102e, 2, 0, 2,
                                              "CameraPhysicalSensorData Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraCalibrationDetails >
 {
@@ -367,7 +331,6 @@ struct FlowValueType< CoreMoxelTypes::FlowCameraCalibrationDetails >
   static constexpr VFlowItemType Descriptor{ "FlowCameraCalibrationDetails", 0x102f, 1, 0, 1,
                                              "CameraCalibrationDetails Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectTemplateForSolving >
 {
@@ -375,21 +338,18 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectTemplateForSolving >
   static constexpr VFlowItemType Descriptor{
       "FlowSubjectTemplateForSolving", 0x1030, 1, 1, 1, "Uncalibrated solving subject template item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowVolumeProperties >
 {
   using type = CoreMoxelTypes::VVolumeProperties;
   static constexpr VFlowItemType Descriptor{ "FlowVolumeProperties", 0x1031, 1, 0, 0, "VolumeProperties Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowLabelledRotationSet >
 {
   using type = CoreMoxelTypes::VLabelledRotationSet;
   static constexpr VFlowItemType Descriptor{ "FlowLabelledRotationSet", 0x1033, 1, 0, 0, "LabelledRotationSet Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowRigidObjectDynamicParameters >
 {
@@ -397,14 +357,12 @@ struct FlowValueType< CoreMoxelTypes::FlowRigidObjectDynamicParameters >
   static constexpr VFlowItemType Descriptor{ "FlowRigidObjectDynamicParameters", 0x1034, 1, 0, 0,
                                              "RigidObjectDynamicParameters Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowRigidObject >
 {
   using type = CoreMoxelTypes::VRigidObject;
   static constexpr VFlowItemType Descriptor{ "FlowRigidObject", 0x1035, 1, 1, 2, "Rigid Object Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowRigidObjectApplicationData >
 {
@@ -412,14 +370,12 @@ struct FlowValueType< CoreMoxelTypes::FlowRigidObjectApplicationData >
   static constexpr VFlowItemType Descriptor{ "FlowRigidObjectApplicationData", 0x1036, 1, 0, 3,
                                              "RigidObjectApplicationData Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowCameraWarnings >
 {
   using type = CoreMoxelTypes::VDeviceWarnings;
   static constexpr VFlowItemType Descriptor{ "FlowCameraWarnings", 0x1037, 1, 0, 0, "CameraWarnings Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectForRetargeting >
 {
@@ -427,7 +383,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectForRetargeting >
   static constexpr VFlowItemType Descriptor{ "FlowSubjectForRetargeting", 0x1038, 1, 1, 2,
                                              "SubjectForRetargeting Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectApplicationDataForRetargeting >
 {
@@ -435,7 +390,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectApplicationDataForRetargeting >
   static constexpr VFlowItemType Descriptor{ "FlowSubjectApplicationDataForRetargeting", 0x1039, 1, 0, 3,
                                              "SubjectApplicationDataForRetargeting Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectDynamicParametersForRetargeting >
 {
@@ -443,7 +397,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectDynamicParametersForRetargeting
   static constexpr VFlowItemType Descriptor{ "FlowSubjectDynamicParametersForRetargeting", 0x103a, 1, 0, 0,
                                              "SubjectDynamicParametersForRetargeting Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSubjectTemplateForRetargeting >
 {
@@ -451,7 +404,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSubjectTemplateForRetargeting >
   static constexpr VFlowItemType Descriptor{
       "FlowSubjectTemplateForRetargeting", 0x103c, 1, 1, 1, "Uncalibrated retargeting subject template item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowLabelledRotationSetForSolving >
 {
@@ -459,21 +411,18 @@ struct FlowValueType< CoreMoxelTypes::FlowLabelledRotationSetForSolving >
   static constexpr VFlowItemType Descriptor{ "FlowLabelledRotationSetForSolving", 0x1040, 1, 0, 0,
                                              "LabelledRotationSetForSolving Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSmartObject >
 {
   using type = CoreMoxelTypes::VSmartObject;
   static constexpr VFlowItemType Descriptor{ "FlowSmartObject", 0x1044, 1, 0, 2, "Smart Object Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSceneMesh >
 {
   using type = CoreMoxelTypes::VSceneMesh;
   static constexpr VFlowItemType Descriptor{ "FlowSceneMesh", 0x1050, 1, 0, 0, "SceneMesh Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSceneMeshApplicationData >
 {
@@ -481,7 +430,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSceneMeshApplicationData >
   static constexpr VFlowItemType Descriptor{ "FlowSceneMeshApplicationData", 0x1051, 1, 0, 0,
                                              "SceneMeshApplicationData Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSceneMeshDynamicParameters >
 {
@@ -489,7 +437,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSceneMeshDynamicParameters >
   static constexpr VFlowItemType Descriptor{ "FlowSceneMeshDynamicParameters", 0x1052, 1, 0, 0,
                                              "SceneMeshDynamicParameters Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowSceneMeshSettings >
 {
@@ -497,7 +444,6 @@ struct FlowValueType< CoreMoxelTypes::FlowSceneMeshSettings >
   static constexpr VFlowItemType Descriptor{ "FlowSceneMeshSettings",          0x1054, 1, 0, 6,
                                              "Scene Mesh SubjectSettings Item" };
 };
-
 template <>
 struct FlowValueType< CoreMoxelTypes::FlowImageSet >
 {

@@ -2,10 +2,9 @@
 
 // The vocabulary of a frame of state: keys, values, items, states. The host implements it; the plug-in only calls.
 
-#include <ZEK/Export.h>
-
 #include <atomic>
 #include <compare>
+#include <cstddef>
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -48,7 +47,38 @@ enum class EFlowTimeMatch : std::uint32_t
   Overlap = 5 ///< same clock and overlapping spans: a slow item is found in every fast frame that it covers
 };
 
-ZEK_API bool FlowTimeMatches( EFlowTimeMatch i_Match, const VFlowTimeKey& i_rEntry, const VFlowTimeKey& i_rQuery );
+/// Inline, because every walk over a state asks it for every entry.
+inline bool FlowTimeMatches( EFlowTimeMatch i_Match, const VFlowTimeKey& i_rEntry, const VFlowTimeKey& i_rQuery )
+{
+  switch ( i_Match )
+  {
+  case EFlowTimeMatch::Equal:
+    return i_rEntry == i_rQuery;
+  case EFlowTimeMatch::Before:
+    return i_rEntry < i_rQuery;
+  case EFlowTimeMatch::BeforeOrAt:
+    return i_rEntry <= i_rQuery;
+  case EFlowTimeMatch::After:
+    return i_rEntry > i_rQuery;
+  case EFlowTimeMatch::AtOrAfter:
+    return i_rEntry >= i_rQuery;
+  case EFlowTimeMatch::Overlap:
+    break;
+  }
+  // Lengths are compared as differences, so that a span up to the greatest number does not overflow a sum.
+  const auto Length = []( const VFlowTimeKey& i_rKey )
+  {
+    return i_rKey.Span > 1 ? static_cast< std::uint64_t >( i_rKey.Span ) : std::uint64_t{ 1 };
+  };
+  if ( i_rEntry.Clock != i_rQuery.Clock )
+  {
+    return false;
+  }
+  const auto EntryFrame = static_cast< std::uint64_t >( i_rEntry.Frame );
+  const auto QueryFrame = static_cast< std::uint64_t >( i_rQuery.Frame );
+  return i_rEntry.Frame <= i_rQuery.Frame ? QueryFrame - EntryFrame < Length( i_rEntry )
+                                          : EntryFrame - QueryFrame < Length( i_rQuery );
+}
 
 /// Tells one value from another: equal ids mean equal values, so a consumer may skip all work.
 struct VFlowValueId

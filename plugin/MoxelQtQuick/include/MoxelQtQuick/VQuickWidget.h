@@ -45,7 +45,8 @@ public:
 
   /// Publishes or replaces a property of this widget's documents.
   void SetContextProperty( const QString& i_rName, const QVariant& i_rValue );
-  void SetContextProperty( const QString& i_rName, QObject* i_pValue );
+  /// Of another name than the one above, because a literal 0 would be taken for an object.
+  void SetContextObject( const QString& i_rName, QObject* i_pValue );
   QVariant ContextProperty( const QString& i_rName ) const;
 
   /// Loads the document in this widget's context. Load errors go to the log, category "MoxelQtQuick", and leave
