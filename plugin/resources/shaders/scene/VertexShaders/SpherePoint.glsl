@@ -21,5 +21,6 @@ void main()
   v_normal = normalize( u_CameraPosition - a_position.xyz );
   v_colour = u_ModelColour;
   gl_Position = u_ViewProjection * vec4( a_position.xyz, 1.0 );
-  gl_PointSize = max( 1.0, a_position.w * u_Projection[1][1] * u_ViewportSize.y / max( gl_Position.w, 1.0e-6 ) );
+  // Never a speck: the size that Sphere keeps, too.
+  gl_PointSize = max( 3.0, a_position.w * u_Projection[1][1] * u_ViewportSize.y / max( gl_Position.w, 1.0e-6 ) );
 }
