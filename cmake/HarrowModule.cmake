@@ -39,6 +39,14 @@ set( HarrowPchQt ${HarrowPchStd} <QtCore/QObject> <QtCore/QPointer> <QtCore/QStr
   <QtCore/QVariantMap> <QtGui/QColor> <QtGui/QMatrix4x4> <QtGui/QOpenGLContext> <QtGui/QOpenGLExtraFunctions> <QtGui/QVector3D> )
 set( HarrowPchQuick ${HarrowPchQt} <QtQml/QQmlEngine> <QtQml/QQmlPropertyMap> <QtQuick/QQuickItem> )
 
+# For programs: under the address sanitizer, no library is unloaded before leaks are looked for.
+function( harrow_keep_libraries Target )
+  if( HARROW_SANITIZE STREQUAL "address" )
+    target_sources( ${Target} PRIVATE ${PROJECT_SOURCE_DIR}/tests/support/src/KeepLibraries.cpp )
+    set_target_properties( ${Target} PROPERTIES ENABLE_EXPORTS ON )
+  endif()
+endfunction()
+
 function( harrow_precompile Target Kind )
   if( Kind STREQUAL "QUICK" )
     target_precompile_headers( ${Target} PRIVATE ${HarrowPchQuick} )
@@ -94,6 +102,7 @@ function( harrow_test Name )
   add_executable( ${Name} ${T_SOURCES} )
   target_link_libraries( ${Name} PRIVATE ${T_LINKS} HarrowFlags ${T_MAIN} )
   harrow_precompile( ${Name} "${T_PCH}" )
+  harrow_keep_libraries( ${Name} )
   if( T_PCH STREQUAL "QT" OR T_PCH STREQUAL "QUICK" )
     set_target_properties( ${Name} PROPERTIES AUTOMOC ON )
   endif()

@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
-#include <regex>
 #include <string>
 #include <vector>
 
@@ -57,15 +56,14 @@ std::vector< fs::path > Sources( const fs::path& i_rFolder )
 
 std::vector< VInclude > Includes( const fs::path& i_rFile )
 {
-  static const std::regex Pattern( R"(^\s*#include\s*[<"]([^>"]+)[>"])" );
   std::vector< VInclude > Found;
   std::ifstream Stream( i_rFile );
-  std::smatch Match;
   for ( std::string Line; std::getline( Stream, Line ); )
   {
-    if ( std::regex_search( Line, Match, Pattern ) )
+    const std::size_t Begin = Line.find_first_of( "<\"" );
+    if ( Line.starts_with( "#include" ) && Begin != std::string::npos )
     {
-      Found.push_back( { i_rFile, Match[1] } );
+      Found.push_back( { i_rFile, Line.substr( Begin + 1, Line.find_first_of( ">\"", Begin + 1 ) - Begin - 1 ) } );
     }
   }
   return Found;

@@ -9,6 +9,8 @@
 #include <HostServices/VStateJson.h>
 #include <TestSupport/LogGuard.h>
 
+#include <QtCore/QCoreApplication>
+#include <QtCore/QElapsedTimer>
 #include <QtCore/QMimeData>
 #include <QtQml/QQmlContext>
 #include <QtQml/QQmlEngine>
@@ -82,6 +84,31 @@ TEST_F( SceneWindow, TheToolbarComboTurnsTheViewAndGoesWithTheWindow )
   EXPECT_EQ( pContent->SceneWidget().SceneItem()->CameraType(), 5 );
   pContent.reset();
   EXPECT_EQ( Toolbar.findChild< QComboBox* >(), nullptr );
+}
+
+TEST_F( SceneWindow, TheTimerAloneKeepsAShownViewDrawing )
+{
+  const auto pContent = Open();
+  const auto Frames = [&]
+  {
+    return pContent->SceneWidget().SceneItem()->frameReport()["frames"].toULongLong();
+  };
+  const auto DrawsMore = [&]( qint64 i_LimitMs )
+  {
+    const quint64 Before = Frames();
+    QElapsedTimer Timer;
+    for ( Timer.start(); Timer.elapsed() < i_LimitMs && Frames() < Before + 3; )
+    {
+      QCoreApplication::processEvents( QEventLoop::AllEvents, 10 );
+    }
+    return Frames() >= Before + 3;
+  };
+  pContent->resize( 160, 120 );
+  pContent->show();
+  EXPECT_TRUE( DrawsMore( 20000 ) );
+  pContent->hide();
+  QCoreApplication::processEvents();
+  EXPECT_FALSE( DrawsMore( 300 ) ) << "a hidden view draws nothing";
 }
 
 TEST_F( SceneWindow, CommandsAnswerForTheirConditions )
