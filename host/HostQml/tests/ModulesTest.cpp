@@ -87,9 +87,10 @@ TEST( QmlModules, SelectionCountsKindsAndSignals )
     })" );
   ASSERT_TRUE( pObject );
   EXPECT_EQ( pObject->property( "lock" ).toInt(), 34 );
-  Host.Selection()->Set( ZEK::ISelectionService::EPrimary, { { .Kind = ZEK::ESelectCamera, .Device = "A" },
-                                                             { .Kind = ZEK::ESelectMarker, .Device = "S:M" },
-                                                             { .Kind = ZEK::ESelectReconstruction, .Device = "", .Sub = 3 } } );
+  Host.Selection()->Set( ZEK::ISelectionService::EPrimary,
+                         { { .Kind = ZEK::ESelectCamera, .Device = "A" },
+                           { .Kind = ZEK::ESelectMarker, .Device = "S:M" },
+                           { .Kind = ZEK::ESelectReconstruction, .Device = "", .Sub = 3 } } );
   EXPECT_TRUE( Host.Postal()->DrainForTest() );
   EXPECT_EQ( pObject->property( "points" ).toInt(), 2 );
   EXPECT_EQ( pObject->property( "all" ).toInt(), 3 );
