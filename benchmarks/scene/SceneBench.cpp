@@ -14,10 +14,12 @@ namespace
 {
 using namespace SceneBench;
 
+/// Made by main, because it must go before the application object.
+VOffscreen* pOffscreen = nullptr;
+
 VOffscreen& Offscreen()
 {
-  static VOffscreen The;
-  return The;
+  return *pOffscreen;
 }
 
 struct VView
@@ -47,7 +49,6 @@ struct VView
 
 void Run( benchmark::State& io_rState, bool i_bNew )
 {
-  Offscreen();
   VView View( static_cast< std::size_t >( io_rState.range( 0 ) ) );
   int Frame = 0;
   for ( ; Frame < FrameCount; ++Frame )
@@ -69,7 +70,6 @@ void Run( benchmark::State& io_rState, bool i_bNew )
 
 void Floor( benchmark::State& io_rState )
 {
-  Offscreen();
   VSphereFloor Floor( static_cast< std::size_t >( io_rState.range( 0 ) ) );
   Offscreen().Target().bind();
   int Frame = 0;
@@ -94,6 +94,8 @@ BENCHMARK( Floor )->Name( "scene/recons/floor_frame" )->Arg( 1000 )->Arg( 10000 
 int main( int i_Count, char** i_ppArguments )
 {
   QGuiApplication Application( i_Count, i_ppArguments );
+  VOffscreen The;
+  pOffscreen = &The;
   benchmark::Initialize( &i_Count, i_ppArguments );
   benchmark::RunSpecifiedBenchmarks();
   benchmark::Shutdown();
