@@ -30,4 +30,7 @@ export MESA_SHADER_CACHE_DISABLE=true
 export ASAN_OPTIONS=detect_leaks=1:new_delete_type_mismatch=1 UBSAN_OPTIONS=halt_on_error=1:print_stacktrace=1
 export LSAN_OPTIONS=suppressions=$PWD/tools/lsan.supp:print_suppressions=0
 export TSAN_OPTIONS=suppressions=$PWD/tools/tsan.supp:halt_on_error=0:exitcode=66
-exec xvfb-run -a -s "-screen 0 1920x1080x24 -noreset" ctest --test-dir build/$preset -R "$filter" --output-on-failure --no-tests=error
+# The thread sanitizer wants its shadow memory at fixed places, which a randomised layout can take.
+fixed=()
+[ "$preset" = tsan ] && fixed=(setarch "$(uname -m)" -R)
+exec "${fixed[@]}" xvfb-run -a -s "-screen 0 1920x1080x24 -noreset" ctest --test-dir build/$preset -R "$filter" --output-on-failure --no-tests=error
