@@ -62,7 +62,6 @@ void VSceneWindowContent::RestoreState( const HarrowPluginInterface::IStateReade
   {
     return;
   }
-  const MoxelGraphics::VSceneOptions Defaults;
   pItem->setOption( "CameraView", m_Kind == EWindowKindCameras );
   pItem->setOption( "3D", m_Kind != EWindowKindCameras );
   ReadOptions( i_rReader, i_rPrefix + "Options", pItem->OptionsMap(),
