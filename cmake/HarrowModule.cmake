@@ -44,9 +44,9 @@ set( HarrowPchQt ${HarrowPchStd} <QtCore/QObject> <QtCore/QPointer> <QtCore/QStr
   <QtCore/QVariantMap> <QtGui/QColor> <QtGui/QMatrix4x4> <QtGui/QOpenGLContext> <QtGui/QOpenGLExtraFunctions> <QtGui/QVector3D> )
 set( HarrowPchQuick ${HarrowPchQt} <QtQml/QQmlEngine> <QtQml/QQmlPropertyMap> <QtQuick/QQuickItem> )
 
-# For programs: under the address sanitizer, no library is unloaded before leaks are looked for.
+# For programs: under a sanitizer no library is unloaded, so that reports can name it.
 function( harrow_keep_libraries Target )
-  if( HARROW_SANITIZE STREQUAL "address" )
+  if( HARROW_SANITIZE )
     target_sources( ${Target} PRIVATE ${PROJECT_SOURCE_DIR}/tests/support/src/KeepLibraries.cpp )
     set_target_properties( ${Target} PROPERTIES ENABLE_EXPORTS ON )
   endif()

@@ -1,5 +1,6 @@
-// Linked into programs that are built with the address sanitizer. A driver that is unloaded before the leak check takes
-// its name with it, and what it left can no longer be told from what we left: libraries stay until the process ends.
+// Linked into programs that are built with a sanitizer. A driver that is unloaded takes its name with it: what it left
+// can no longer be told from what we left, and the thread sanitizer gives up when a library of its suppressions goes.
+// Libraries therefore stay until the process ends.
 extern "C" __attribute__( ( visibility( "default" ) ) ) int dlclose( void* )
 {
   return 0;
