@@ -222,6 +222,8 @@ void VRenderContext::ResetState()
   BindVertexArray();
   m_EnabledArrays |= ( 1u << FixedArrays ) - 1;
   SetEnabledArrays( 0 );
+  // A mesh without colours is white.
+  m_pFunctions->glVertexAttrib4f( EAttributeColour, 1.0f, 1.0f, 1.0f, 1.0f );
   m_pFunctions->glBindBuffer( GL_ARRAY_BUFFER, 0 );
   m_pFunctions->glBindBuffer( GL_ELEMENT_ARRAY_BUFFER, 0 );
   m_pFunctions->glUseProgram( 0 );

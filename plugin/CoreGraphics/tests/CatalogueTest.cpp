@@ -76,11 +76,23 @@ TEST_P( CatalogueTest, EveryPairLinks )
   VTestContext Context( GetParam() );
   VResources Resources;
   ASSERT_TRUE( Resources.Prepare() );
-  const std::vector< std::array< const char*, 2 > > Pairs = {
-      { "FloorGrid", "FloorGrid" },    { "FloorGrid", "UniformColour" },      { "ScreenSpaceAxis", "Colour" },
-      { "Sphere", "SimpleLighting" },  { "SpherePoint", "SimpleLighting" },   { "SphereShadow", "Colour" },
-      { "Simple3D", "UniformColour" }, { "Simple3DUniformColour", "Colour" }, { "Simple3DVertexColour", "Colour" },
-      { "FullScreen", "Copy" } };
+  const std::vector< std::array< const char*, 2 > > Pairs = { { "FloorGrid", "FloorGrid" },
+                                                              { "FloorGrid", "UniformColour" },
+                                                              { "ScreenSpaceAxis", "Colour" },
+                                                              { "Sphere", "SimpleLighting" },
+                                                              { "SpherePoint", "SimpleLighting" },
+                                                              { "SphereShadow", "Colour" },
+                                                              { "Simple3D", "UniformColour" },
+                                                              { "Simple3DUniformColour", "Colour" },
+                                                              { "Simple3DVertexColour", "Colour" },
+                                                              { "FullScreen", "Copy" },
+                                                              { "Simple", "Outlines" },
+                                                              { "Simple", "AntiAlias" },
+                                                              { "ForcePlate", "ForcePlate" },
+                                                              { "ForcePlate", "SimpleLighting" },
+                                                              { "Simple3DModelColour", "SimpleLighting" },
+                                                              { "Simple3DModelWireframe", "Colour" },
+                                                              { "Simple3DModelWireframe", "UniformColour" } };
   for ( const auto& [pVertex, pFragment] : Pairs )
   {
     EXPECT_TRUE( Resources.GetProgram( pVertex, pFragment )->IsUsable() ) << pVertex << ' ' << pFragment;
@@ -114,13 +126,29 @@ TEST( CatalogueText, PrecisionIsNeverLowered )
 // A uniform with a misspelt name or another type compiles and links, and stays 0.
 TEST( CatalogueText, EveryUniformIsOneThatSomebodySets )
 {
-  std::map< QString, QString > Known = {
-      { "u_ViewProjection", "mat4" }, { "u_View", "mat4" },           { "u_Projection", "mat4" },
-      { "u_View2D", "vec4" },         { "u_ViewportSize", "vec2" },   { "u_ViewportOffset", "vec2" },
-      { "u_FrameSize", "vec2" },      { "u_LightVector", "vec3" },    { "u_Up", "vec3" },
-      { "u_GlobalTime", "float" },    { "u_CameraPosition", "vec3" }, { "u_Extents", "vec4" },
-      { "u_GridSpacings", "vec2" },   { "t_Texture", "sampler2D" },   { "t_DiffuseTexture", "sampler2D" },
-      { "u_Colour", "vec4" },         { "u_SelectionId", "vec3" } };
+  std::map< QString, QString > Known = { { "u_ViewProjection", "mat4" },
+                                         { "u_View", "mat4" },
+                                         { "u_Projection", "mat4" },
+                                         { "u_View2D", "vec4" },
+                                         { "u_ViewportSize", "vec2" },
+                                         { "u_ViewportOffset", "vec2" },
+                                         { "u_FrameSize", "vec2" },
+                                         { "u_LightVector", "vec3" },
+                                         { "u_Up", "vec3" },
+                                         { "u_GlobalTime", "float" },
+                                         { "u_CameraPosition", "vec3" },
+                                         { "u_Extents", "vec4" },
+                                         { "u_GridSpacings", "vec2" },
+                                         { "t_Texture", "sampler2D" },
+                                         { "t_DiffuseTexture", "sampler2D" },
+                                         { "u_Colour", "vec4" },
+                                         { "u_SelectionId", "vec3" },
+                                         { "t_Selection", "sampler2D" },
+                                         { "t_Buffer", "sampler2D" },
+                                         { "u_PrimaryColour", "vec4" },
+                                         { "u_PreSelectColour", "vec3" },
+                                         { "u_Force", "vec3" },
+                                         { "u_CentreOfPressure", "vec3" } };
   std::set< QString > PerObject;
   for ( int Attribute = EAttributeModelTransform; Attribute < EAttributeInstanceFlags; ++Attribute )
   {

@@ -64,7 +64,8 @@ public:
   /// a buffer has no contents, or more than 8 attributes are asked for: nothing may be drawn then.
   bool SetVertexBuffer( const VVertexStream& i_rStream );
   bool SetVertexStreams( std::span< const VVertexStream > i_Streams );
-  /// The value of an attribute that no stream feeds, for all vertices or instances of the draws that follow.
+  /// The value of an attribute that no stream feeds, for all vertices or instances of the draws that follow. From
+  /// `ResetState` on the colour is white.
   void SetConstantAttribute( EVertexAttribute i_Attribute, const QVector4D& i_rValue );
 
   void DrawArrays( GLenum i_Mode, int i_Count, int i_First = 0 );

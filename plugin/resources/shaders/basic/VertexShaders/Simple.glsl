@@ -1,0 +1,7 @@
+// Positions are clip positions.
+attribute vec3 a_position;
+
+void main()
+{
+  gl_Position = vec4( a_position, 1.0 );
+}

@@ -1,0 +1,50 @@
+#ifndef PER_OBJECT
+#define PER_OBJECT uniform
+#endif
+
+PER_OBJECT mat4 u_ModelTransform;
+PER_OBJECT vec4 u_ModelColour;
+uniform mat4 u_ViewProjection;
+uniform mat4 u_Projection;
+
+attribute vec3 a_position;
+attribute vec4 a_colour;
+attribute vec3 a_normal;
+
+varying vec3 v_position;
+varying vec3 v_normal;
+varying vec4 v_colour;
+
+// Normals of a scaled mesh stand on its scaled faces.
+vec3 WorldNormal( mat4 model, vec3 normal )
+{
+  vec3 x = model[0].xyz;
+  vec3 y = model[1].xyz;
+  vec3 z = model[2].xyz;
+  vec3 yz = cross( y, z );
+  vec3 turned = yz * normal.x + cross( z, x ) * normal.y + cross( x, y ) * normal.z;
+  return dot( x, yz ) < 0.0 ? -turned : turned;
+}
+
+// In front of what lies in the same plane. A parallel view would shrink with w: there it is 10 mm of depth.
+vec4 Nearer( vec4 position )
+{
+  if ( u_Projection[3][3] != 0.0 )
+  {
+    position.z += 10.0 * u_Projection[2][2];
+  }
+  else
+  {
+    position.w += 0.02;
+  }
+  return position;
+}
+
+void main()
+{
+  vec4 world = u_ModelTransform * vec4( a_position, 1.0 );
+  v_position = world.xyz;
+  v_normal = WorldNormal( u_ModelTransform, a_normal );
+  v_colour = a_colour * u_ModelColour;
+  gl_Position = Nearer( u_ViewProjection * world );
+}
