@@ -45,7 +45,7 @@ QByteArray SelectionLines( EShaderForm i_Form )
          "  highp int Flags = int( a_InstanceFlags + 0.5 );\n"
          "  highp int Word = ( ( u_FirstId + " +
          Index +
-         " ) & 0x1FFFFF ) | ( ( Flags & 7 ) << 21 );\n"
+         " + ( Flags >> 8 ) ) & 0x1FFFFF ) | ( ( Flags & 7 ) << 21 );\n"
          "  u_SelectionId = vec3( float( Word & 255 ), float( ( Word >> 8 ) & 255 ), float( Word >> 16 ) ) / 255.0;\n"
          "  bool bMissing = u_RequiredFlags != 0 && ( Flags & u_RequiredFlags ) == 0;\n"
          "  if ( bMissing || ( Flags & u_RefusedFlags ) != 0 )\n"

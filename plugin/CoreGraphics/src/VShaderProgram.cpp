@@ -190,4 +190,14 @@ void VShaderProgram::SetUniform( int i_Location, const QMatrix4x4& i_rValue )
   }
 }
 
+void VShaderProgram::SetUniformMatrices( int i_Location, std::span< const float > i_Columns )
+{
+  constexpr std::size_t MatrixFloats = 16;
+  const auto Count = GLsizei( i_Columns.size() / MatrixFloats );
+  if ( i_Location >= 0 && m_pProgram && Count > 0 )
+  {
+    QOpenGLContext::currentContext()->functions()->glUniformMatrix4fv( i_Location, Count, GL_FALSE, i_Columns.data() );
+  }
+}
+
 } // namespace CoreGraphics

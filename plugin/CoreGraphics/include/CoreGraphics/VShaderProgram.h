@@ -12,6 +12,7 @@
 #include <array>
 #include <cstdint>
 #include <memory>
+#include <span>
 #include <string_view>
 #include <vector>
 
@@ -63,6 +64,8 @@ public:
   void SetUniform( int i_Location, const QVector4D& i_rValue );
   void SetUniform( int i_Location, const QMatrix2x2& i_rValue );
   void SetUniform( int i_Location, const QMatrix4x4& i_rValue );
+  /// Fills an array of mat4 from its start: 16 floats a matrix, column-major. A rest that is no matrix is left out.
+  void SetUniformMatrices( int i_Location, std::span< const float > i_Columns );
 
   /// Links again after a shader was reloaded.
   void Relink();

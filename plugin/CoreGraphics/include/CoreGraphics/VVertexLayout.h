@@ -29,7 +29,7 @@ enum EVertexAttribute : std::uint8_t
   EAttributeStickColourA,     ///< vec4
   EAttributeStickColourB,     ///< vec4
   EAttributeSegmentColour,    ///< vec4
-  EAttributeInstanceFlags,    ///< one byte of EInstanceFlag bits, not normalised
+  EAttributeInstanceFlags,    ///< EInstanceFlag bits, not normalised; from bit 8 on, ids left out so far, below 0x4000
   EAttributeCount
 };
 

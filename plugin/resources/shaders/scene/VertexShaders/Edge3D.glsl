@@ -1,0 +1,25 @@
+#ifndef PER_OBJECT
+#define PER_OBJECT uniform
+#endif
+
+PER_OBJECT mat4 u_ModelTransform;
+uniform mat4 u_ViewProjection;
+uniform vec2 u_SensorSize;
+uniform vec4 u_SensorImageOffsetScale; // of an image in the sensor: offset in pixels, scale
+
+attribute vec2 a_position;
+
+varying vec4 v_colour;
+
+// On the plane z = 1 of the camera, where the sensor reaches from -1 to 1.
+vec4 OnPlane( vec2 p )
+{
+  return u_ViewProjection * ( u_ModelTransform * vec4( p / u_SensorSize * 2.0 - 1.0, 1.0, 1.0 ) );
+}
+
+void main()
+{
+  v_colour = vec4( 0.5, 0.5, 1.0, 1.0 );
+  vec2 edge = a_position - vec2( 0.5, 0.0 );
+  gl_Position = OnPlane( u_SensorImageOffsetScale.zw * edge + u_SensorImageOffsetScale.xy );
+}
