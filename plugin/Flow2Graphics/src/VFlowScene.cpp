@@ -5,6 +5,7 @@
 
 #include <CoreMoxelTypes/FlowTypes.h>
 #include <MoxelGraphics/VRenderAxis.h>
+#include <MoxelGraphics/VRenderOutlines.h>
 
 namespace Flow2Graphics
 {
@@ -33,6 +34,7 @@ void VFlowScene::CreateRenderTypes()
   const auto pReconstructions = std::make_shared< VFlowRenderReconstructions >( *this );
   const auto pAxis = std::make_shared< MoxelGraphics::VRenderAxis >( Resources() );
 
+  m_PostList = { std::make_shared< MoxelGraphics::VRenderOutlines >( *this ) };
   m_RenderList = { pFloor, pReconstructions, pAxis };
   m_FlowRenderTypes = { pFloor, pReconstructions };
 }

@@ -116,16 +116,16 @@ void VMoxelScene::SelectDevice( const QString&, bool ) {}
 
 void VMoxelScene::SetIgnoredIds( std::span< const std::uint32_t > i_Ids )
 {
-  if ( i_Ids.empty() && m_IgnoredIds.empty() )
-  {
-    return;
-  }
   m_IgnoredIds.clear();
+  IgnoreIds( i_Ids );
+}
+
+void VMoxelScene::IgnoreIds( std::span< const std::uint32_t > i_Ids )
+{
   for ( const std::uint32_t Id : i_Ids )
   {
     m_IgnoredIds.insert( Id & EIdMask );
   }
-  ++m_IgnoredGeneration;
 }
 
 bool VMoxelScene::IgnoreId( std::uint32_t i_Word, int i_RenderMode ) const
@@ -155,6 +155,7 @@ void VMoxelScene::Clear( CoreGraphics::VRenderContext& io_rContext, const VScene
   io_rContext.SetClearColour( bBackground ? QColor( qRed( Background ), qGreen( Background ), qBlue( Background ) )
                                           : QColor( 0, 0, 0, 0 ) );
   io_rContext.Clear( true, true );
+  m_DrawsAtClear = io_rContext.DrawCalls();
   if ( m_pSphereHelper )
   {
     m_pSphereHelper->Clear();
@@ -170,7 +171,11 @@ void VMoxelScene::DrawScene( CoreGraphics::VRenderContext& io_rContext, const VS
     RenderPass( io_rContext, i_rOptions, ERenderPassOpaque );
     RenderPass( io_rContext, i_rOptions, ERenderPassTranslucent );
   }
-  io_rContext.Clear( false, true );
+  // Depth that nothing drew into is clear already: most picks look at a window that shows nothing.
+  if ( io_rContext.DrawCalls() != m_DrawsAtClear )
+  {
+    io_rContext.Clear( false, true );
+  }
   RenderPass( io_rContext, i_rOptions, ERenderPassOverlay );
 }
 

@@ -3,6 +3,7 @@
 #include "Log.h"
 
 #include <MoxelGraphics/VMoxelScene.h>
+#include <MoxelGraphics/VSphereHelper.h>
 
 #include <CoreGraphics/VCameraController.h>
 #include <CoreGraphics/VRenderContext.h>
@@ -91,7 +92,7 @@ void VSceneFrame::Resize( QSize i_Size )
   m_pSelectionTarget.reset();
   m_pOutlineTarget.reset();
   m_Gl.clear();
-  m_bMaskDirty = true;
+  m_DirtyMask = QRect( QPoint( 0, 0 ), i_Size );
   if ( i_Size.isEmpty() )
   {
     return;
@@ -145,7 +146,7 @@ bool VSceneFrame::Render( QOpenGLFramebufferObject& io_rTarget )
     m_pContext->Functions()->glClearColor( 0, 0, 0, 1 );
     m_pContext->Functions()->glClear( GL_COLOR_BUFFER_BIT );
   }
-  if ( !bReady || !m_Input.bVisible || m_Size.isEmpty() || !m_pSelectionTarget || !m_pSelectionTarget->isValid() )
+  if ( !bReady || !m_Input.bVisible || m_Size.isEmpty() || !m_pSelectionTarget )
   {
     return false;
   }
@@ -155,7 +156,12 @@ bool VSceneFrame::Render( QOpenGLFramebufferObject& io_rTarget )
   }
   Begin();
   m_Figures.UpdateMs = Lap();
-  SelectAndHighlight();
+  m_pScene->SetHighlighted( false );
+  // A device that refuses the off-screen target costs the view its picks and highlights, not its picture.
+  if ( m_pSelectionTarget->isValid() )
+  {
+    SelectAndHighlight();
+  }
   DrawVisible( io_rTarget );
   m_Figures.DrawMs = Lap();
   m_Figures.DrawCalls = m_pContext->DrawCalls();
@@ -238,7 +244,6 @@ void VSceneFrame::SelectAndHighlight()
   m_pContext->BindFramebuffer( m_pSelectionTarget.get() );
   if ( m_Input.PickMode != EPickNone )
   {
-    m_bMaskDirty = true;
     m_Found.clear();
     m_Result.Layers = IsBand() ? PickBand() : 0;
     const bool bBand = m_Result.Layers > 0;
@@ -247,7 +252,6 @@ void VSceneFrame::SelectAndHighlight()
       PickPoint();
       m_Result.Layers = 1;
     }
-    m_pScene->SetIgnoredIds( {} );
     ++m_Result.Serial;
     m_Result.Mode = m_Input.PickMode;
     m_Result.Edit = m_Input.Edit;
@@ -271,23 +275,32 @@ void VSceneFrame::SelectAndHighlight()
 void VSceneFrame::Highlight()
 {
   m_pContext->SetRenderMode( ERenderModeHighlight );
-  // Nothing has a flag, so nothing would draw; the mask that is empty already stays as it is.
+  bool bDrawn = false;
   if ( !m_pScene->Registry().Marks().empty() )
   {
+    const std::uint64_t Draws = m_pContext->DrawCalls();
     DrawView();
-    m_bMaskDirty = true;
+    bDrawn = m_pContext->DrawCalls() != Draws;
+    m_DirtyMask = bDrawn ? QRect( QPoint( 0, 0 ), m_Size ) : QRect();
   }
-  else if ( m_bMaskDirty )
+  else if ( !m_DirtyMask.isEmpty() )
   {
-    m_pScene->Clear( *m_pContext, m_Input.Options );
-    m_bMaskDirty = false;
+    // Nothing has a flag, so nothing would draw: only what a pick or an older frame left has to go.
+    m_pScene->Clear( *m_pContext, m_Input.Options, m_DirtyMask );
+    m_DirtyMask = QRect();
   }
+  m_pScene->SetHighlighted( bDrawn );
 }
 
 void VSceneFrame::Draw( const QRect& i_rScissor )
 {
+  m_DirtyMask |= i_rScissor;
   m_pScene->Clear( *m_pContext, m_Input.Options, i_rScissor );
-  m_pScene->DrawScene( *m_pContext, m_Input.Options );
+  // What is not to be seen is not to be picked either.
+  if ( !m_Input.Options.CameraView )
+  {
+    m_pScene->DrawScene( *m_pContext, m_Input.Options );
+  }
 }
 
 void VSceneFrame::PickPoint()
@@ -349,7 +362,16 @@ int VSceneFrame::PickBand()
   const QRect Scissor = m_pContext->Scissor();
   m_pContext->SetViewport( Frame );
   m_pContext->SetFrameSize( Frame.size() );
+  const auto Remember = [this]( bool i_bOn )
+  {
+    if ( VSphereHelper* const pHelper = m_pScene->SphereHelper() )
+    {
+      pHelper->Remember( i_bOn );
+    }
+  };
+  Remember( true );
   const int Layers = PickLayers( Band );
+  Remember( false );
   m_pContext->SetFrameSize( m_Size );
   m_pContext->SetViewport( Viewport );
   m_pContext->SetScissor( Scissor );
@@ -360,13 +382,12 @@ int VSceneFrame::PickLayers( const QRect& i_rBand )
 {
   constexpr int MaximumLayers = 16;
   m_Pixels.resize( static_cast< std::size_t >( i_rBand.width() ) * static_cast< std::size_t >( i_rBand.height() ) );
+  m_pScene->SetIgnoredIds( {} );
   int Layers = 0;
   bool bNew = true;
   while ( bNew && Layers < MaximumLayers )
   {
     ++Layers;
-    // What was found no longer draws, so that the next layer shows what it hid.
-    m_pScene->SetIgnoredIds( m_Found );
     Draw( i_rBand );
     m_pContext->ReadPixels( i_rBand, m_Pixels.data(), GL_RGBA );
     m_Layer.clear();
@@ -380,27 +401,28 @@ int VSceneFrame::PickLayers( const QRect& i_rBand )
       }
       Last = Id;
     }
-    std::sort( m_Layer.begin(), m_Layer.end() );
-    m_Layer.erase( std::unique( m_Layer.begin(), m_Layer.end() ), m_Layer.end() );
-    std::erase_if( m_Layer,
-                   [&]( std::uint32_t i_Id )
-                   {
-                     return m_pScene->IgnoredIds().contains( i_Id );
-                   } );
-    bNew = !m_Layer.empty();
-    m_Found.insert( m_Found.end(), m_Layer.begin(), m_Layer.end() );
+    // What was found no longer draws, so that the next layer shows what it hid.
+    bNew = TakeNew();
   }
-  m_pScene->SetIgnoredIds( m_Found );
   m_Layer.clear();
   m_pScene->PickInRect( *m_pContext, m_Input.Options, i_rBand, m_Layer );
+  TakeNew();
+  m_pScene->SetIgnoredIds( {} );
+  return Layers;
+}
+
+bool VSceneFrame::TakeNew()
+{
   std::sort( m_Layer.begin(), m_Layer.end() );
   m_Layer.erase( std::unique( m_Layer.begin(), m_Layer.end() ), m_Layer.end() );
-  std::copy_if( m_Layer.begin(), m_Layer.end(), std::back_inserter( m_Found ),
-                [&]( std::uint32_t i_Id )
-                {
-                  return i_Id != 0 && !m_pScene->IgnoredIds().contains( i_Id );
-                } );
-  return Layers;
+  std::erase_if( m_Layer,
+                 [&]( std::uint32_t i_Id )
+                 {
+                   return i_Id == 0 || m_pScene->IgnoredIds().contains( i_Id );
+                 } );
+  m_Found.insert( m_Found.end(), m_Layer.begin(), m_Layer.end() );
+  m_pScene->IgnoreIds( m_Layer );
+  return !m_Layer.empty();
 }
 
 void VSceneFrame::DrawView()

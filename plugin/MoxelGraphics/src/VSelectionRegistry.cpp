@@ -7,6 +7,17 @@
 
 namespace MoxelGraphics
 {
+namespace
+{
+constexpr std::uint32_t BothMarks = EIdSelected | EIdPreselected;
+/// The first id whose upper bits, with both marks, reach what the outline takes for the current item.
+constexpr std::uint32_t FirstLookalike = 0x40000;
+
+bool IsOfGreatNumbers( std::uint32_t i_Kind )
+{
+  return i_Kind == ZEK::ESelectGreyscaleBlob || i_Kind == ZEK::ESelectMaskCell;
+}
+} // namespace
 
 template < typename TValue >
 void VSelectionRegistry::VTable< TValue >::Clear()
@@ -135,8 +146,11 @@ bool VSelectionRegistry::Take( std::uint32_t i_Count, VRange*& o_rpRange )
   // The last id is EIdMask itself.
   if ( i_Count > EIdMask + 1 - m_NextId )
   {
-    ZEK::Log( LogCategory(), ZEK::ELogDetail, "Selection ids ran out: %1% more were asked for after %2%", i_Count,
-              m_NextId - 1 );
+    if ( !std::exchange( m_bRanOut, true ) )
+    {
+      ZEK::Log( LogCategory(), ZEK::ELogDetail, "Selection ids ran out: %1% more were asked for after %2%", i_Count,
+                m_NextId - 1 );
+    }
     return false;
   }
   if ( m_Ranges.empty() || m_Ranges.back().First != m_NextId )
@@ -162,6 +176,7 @@ std::uint32_t VSelectionRegistry::Allocate( const ZEK::VSelectionItem& i_rItem, 
   }
   m_Items[m_ItemCount] = i_rItem;
   pRange->ItemIndex = static_cast< std::uint32_t >( m_ItemCount++ );
+  WarnOfLookalikes( *pRange );
   return pRange->First;
 }
 
@@ -194,7 +209,49 @@ std::uint32_t VSelectionRegistry::AllocateRange( std::uint32_t i_Count, const IR
     return 0;
   }
   pRange->pResolver = &i_rResolver;
+  WarnOfLookalikes( *pRange );
   return pRange->First;
+}
+
+bool VSelectionRegistry::FindIn( const VRange& i_rRange, const ZEK::VSelectionItem& i_rItem,
+                                 std::uint32_t& o_rIndex ) const
+{
+  if ( i_rRange.pResolver )
+  {
+    return i_rRange.pResolver->FindIndex( i_rItem, o_rIndex ) && o_rIndex < i_rRange.Count;
+  }
+  ZEK::VSelectionItem Item = m_Items[i_rRange.ItemIndex];
+  const bool bSub = ZEK::HasSubIndex( Item.Kind ) && i_rRange.Count > 1;
+  o_rIndex = 0;
+  if ( Item == i_rItem )
+  {
+    return true;
+  }
+  Item.Sub = i_rItem.Sub;
+  o_rIndex = i_rItem.Sub;
+  return bSub && Item == i_rItem && i_rItem.Sub < i_rRange.Count;
+}
+
+void VSelectionRegistry::WarnOfLookalikes( const VRange& i_rRange )
+{
+  if ( m_NextId <= FirstLookalike || m_bWarned )
+  {
+    return;
+  }
+  for ( const VMark& rMark : m_Marks )
+  {
+    std::uint32_t Index = 0;
+    if ( ( rMark.Flags & BothMarks ) == BothMarks && !IsOfGreatNumbers( rMark.Item.Kind ) &&
+         FindIn( i_rRange, rMark.Item, Index ) && i_rRange.First + Index >= FirstLookalike )
+    {
+      m_bWarned = true;
+      ZEK::Log(
+          LogCategory(), ZEK::ELogWarning,
+          "Selection id %1% is so high that its object, both selected and preselected, looks like the current one",
+          i_rRange.First + Index );
+      return;
+    }
+  }
 }
 
 std::uint32_t VSelectionRegistry::Word( const ZEK::VSelectionItem& i_rItem )
@@ -354,24 +411,9 @@ std::uint32_t VSelectionRegistry::FindId( const ZEK::VSelectionItem& i_rItem ) c
   for ( const VRange& rRange : m_Ranges )
   {
     std::uint32_t Index = 0;
-    if ( rRange.pResolver )
+    if ( FindIn( rRange, i_rItem, Index ) )
     {
-      if ( rRange.pResolver->FindIndex( i_rItem, Index ) && Index < rRange.Count )
-      {
-        return rRange.First + Index;
-      }
-      continue;
-    }
-    ZEK::VSelectionItem Item = m_Items[rRange.ItemIndex];
-    const bool bSub = ZEK::HasSubIndex( Item.Kind ) && rRange.Count > 1;
-    if ( Item == i_rItem )
-    {
-      return rRange.First;
-    }
-    Item.Sub = i_rItem.Sub;
-    if ( bSub && Item == i_rItem && i_rItem.Sub < rRange.Count )
-    {
-      return rRange.First + i_rItem.Sub;
+      return rRange.First + Index;
     }
   }
   return 0;

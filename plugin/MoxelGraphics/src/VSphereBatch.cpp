@@ -1,3 +1,4 @@
+#include "VPickWindow.h"
 #include "VSphereBatchGl.h"
 
 #include <MoxelGraphics/VMoxelScene.h>
@@ -11,17 +12,29 @@ namespace MoxelGraphics
 namespace
 {
 constexpr std::uint32_t FlagShift = 21;
+constexpr std::uint32_t SkippedShift = 8;
 constexpr std::uint8_t MarkedFlags = CoreGraphics::EInstanceSelected | CoreGraphics::EInstancePreselected;
 
 static_assert( EIdSelected >> FlagShift == CoreGraphics::EInstanceSelected &&
                EIdPreselected >> FlagShift == CoreGraphics::EInstancePreselected &&
                EIdPrimary >> FlagShift == CoreGraphics::EInstancePrimary );
 
-bool IsPlace( const VScenePoint& i_rPoint )
+/// Walks over all spheres are written in blocks without branches, which the compiler turns into vector code.
+constexpr std::size_t Lanes = 8;
+
+constexpr VScenePoint Nowhere{ 1e18f, 1e18f, 1e18f, 0 };
+
+bool IsFinite( float i_Value )
 {
-  return std::isfinite( i_rPoint.X ) && std::isfinite( i_rPoint.Y ) && std::isfinite( i_rPoint.Z );
+  return i_Value - i_Value == 0.0f;
 }
 } // namespace
+
+float PixelsAtOne( CoreGraphics::VRenderContext& io_rContext )
+{
+  // Half the frame's height, over what the projection maps to it at distance 1.
+  return io_rContext.Projection()( 1, 1 ) * 0.5f * static_cast< float >( io_rContext.Viewport().height() );
+}
 
 VSphereBatch::VSphereBatch() = default;
 VSphereBatch::~VSphereBatch() = default;
@@ -37,29 +50,25 @@ void VSphereBatch::SetSpheres( std::span< const VScenePoint > i_Spheres )
     ++m_FlagsGeneration;
     ++m_ColoursGeneration;
   }
-  m_Spheres.assign( i_Spheres.begin(), i_Spheres.end() );
-  MeasureBox();
-  ++m_SpheresGeneration;
-}
-
-void VSphereBatch::MeasureBox()
-{
+  m_Spheres.resize( i_Spheres.size() );
   m_BoxMin.fill( std::numeric_limits< float >::max() );
   m_BoxMax.fill( std::numeric_limits< float >::lowest() );
   m_LargestRadius = 0;
-  for ( const VScenePoint& rSphere : m_Spheres )
+  for ( std::size_t Index = 0; Index < i_Spheres.size(); ++Index )
   {
-    if ( IsPlace( rSphere ) )
+    const VScenePoint& rNew = i_Spheres[Index];
+    VScenePoint& rSphere = m_Spheres[Index];
+    if ( !IsFinite( rNew.X ) || !IsFinite( rNew.Y ) || !IsFinite( rNew.Z ) )
     {
-      const std::array< float, 3 > Place{ rSphere.X, rSphere.Y, rSphere.Z };
-      for ( std::size_t Axis = 0; Axis < 3; ++Axis )
-      {
-        m_BoxMin[Axis] = std::min( m_BoxMin[Axis], Place[Axis] );
-        m_BoxMax[Axis] = std::max( m_BoxMax[Axis], Place[Axis] );
-      }
-      m_LargestRadius = std::max( m_LargestRadius, rSphere.Radius );
+      rSphere = { 0, 0, 0, -1 };
+      continue;
     }
+    rSphere = { rNew.X, rNew.Y, rNew.Z, IsFinite( rNew.Radius ) ? std::max( rNew.Radius, 0.0f ) : 0.0f };
+    m_BoxMin = { std::min( m_BoxMin[0], rNew.X ), std::min( m_BoxMin[1], rNew.Y ), std::min( m_BoxMin[2], rNew.Z ) };
+    m_BoxMax = { std::max( m_BoxMax[0], rNew.X ), std::max( m_BoxMax[1], rNew.Y ), std::max( m_BoxMax[2], rNew.Z ) };
+    m_LargestRadius = std::max( m_LargestRadius, rSphere.Radius );
   }
+  ++m_SpheresGeneration;
 }
 
 void VSphereBatch::SetColour( const std::array< float, 4 >& i_rColour )
@@ -103,22 +112,13 @@ void VSphereBatch::SetIds( std::uint32_t i_FirstId, std::span< const std::uint8_
   }
 }
 
-float VSphereBatch::Radius( const VScenePoint& i_rSphere, const VSphereSizing& i_rSizing ) const
-{
-  const float Own = i_rSizing.FixedRadius < 0 ? i_rSphere.Radius : i_rSizing.FixedRadius;
-  return std::isfinite( Own ) && Own > 0 && IsPlace( i_rSphere ) ? Own * i_rSizing.Scale : 0.0f;
-}
-
-VSphereBatch::VExtent VSphereBatch::Extent( CoreGraphics::VRenderContext& io_rContext,
-                                            const VSphereSizing& i_rSizing ) const
+VSphereExtent VSphereBatch::Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing )
 {
   const float Largest = ( i_rSizing.FixedRadius < 0 ? m_LargestRadius : i_rSizing.FixedRadius ) * i_rSizing.Scale;
-  const QMatrix4x4& rProjection = io_rContext.Projection();
-  // Half the frame's height, over what the projection maps to it at distance 1.
-  const float PixelsAtOne = rProjection( 1, 1 ) * 0.5f * static_cast< float >( io_rContext.Viewport().height() );
-  if ( rProjection( 3, 3 ) != 0.0f )
+  const float AtOne = PixelsAtOne( io_rContext );
+  if ( io_rContext.Projection()( 3, 3 ) != 0.0f )
   {
-    const float Pixels = Largest * PixelsAtOne;
+    const float Pixels = Largest * AtOne;
     return { Pixels, Pixels >= FinePixels ? m_Spheres.size() : 0 };
   }
   const QVector3D Eye = io_rContext.CameraPosition();
@@ -129,23 +129,88 @@ VSphereBatch::VExtent VSphereBatch::Extent( CoreGraphics::VRenderContext& io_rCo
     const float Gap = std::max( { m_BoxMin[Index] - Eye[Axis], Eye[Axis] - m_BoxMax[Index], 0.0f } );
     Square += Gap * Gap;
   }
-  const float AtMost = Largest * PixelsAtOne / std::max( std::sqrt( Square ), 1e-3f );
+  const float AtMost = Largest * AtOne / std::max( std::sqrt( Square ), 1e-3f );
   if ( AtMost < CoarsePixels )
   {
     return { AtMost, 0 };
   }
   // The box may reach to the eye where no sphere does: look at each.
-  const QVector4D Depth = io_rContext.ViewProjection().row( 3 );
-  VExtent Result;
-  for ( const VScenePoint& rSphere : m_Spheres )
+  const QMatrix4x4& rViewProjection = io_rContext.ViewProjection();
+  for ( const VSeen& rSeen : m_Seen )
   {
-    const float Away = Depth.x() * rSphere.X + Depth.y() * rSphere.Y + Depth.z() * rSphere.Z + Depth.w();
-    const float Size = Radius( rSphere, i_rSizing );
-    const float Pixels = Away + Size > 0 ? Size * PixelsAtOne / std::max( Away, 1.0f ) : 0.0f;
-    Result.Largest = std::max( Result.Largest, Pixels );
-    Result.FineCount += Pixels >= FinePixels ? 1 : 0;
+    if ( rSeen.Generation == m_SpheresGeneration && rSeen.PixelsAtOne == AtOne && rSeen.Sizing == i_rSizing &&
+         rSeen.ViewProjection == rViewProjection )
+    {
+      return rSeen.Extent;
+    }
+  }
+  VSeen& rSeen = m_Seen[m_NextSeen];
+  m_NextSeen = ( m_NextSeen + 1 ) % m_Seen.size();
+  rSeen = { rViewProjection, AtOne, i_rSizing, m_SpheresGeneration,
+            MeasureEach( rViewProjection.row( 3 ), AtOne, i_rSizing ) };
+  return rSeen.Extent;
+}
+
+VSphereExtent VSphereBatch::MeasureEach( const QVector4D& i_rDepth, float i_PixelsAtOne,
+                                         const VSphereSizing& i_rSizing ) const
+{
+  const float X = i_rDepth.x(), Y = i_rDepth.y(), Z = i_rDepth.z(), W = i_rDepth.w();
+  std::array< float, Lanes > Largest{};
+  std::array< std::uint32_t, Lanes > Fine{};
+  const auto Measure = [&]( const VScenePoint& i_rSphere, std::size_t i_Lane )
+  {
+    const float Away = X * i_rSphere.X + Y * i_rSphere.Y + Z * i_rSphere.Z + W;
+    const float Size = SizeOf( i_rSphere, i_rSizing );
+    const float Near = Size * i_PixelsAtOne / std::max( Away, 1.0f );
+    const float Pixels = Away + Size > 0 ? Near : 0.0f;
+    Largest[i_Lane] = std::max( Largest[i_Lane], Pixels );
+    Fine[i_Lane] += Pixels >= FinePixels ? 1u : 0u;
+  };
+  const std::size_t Blocks = m_Spheres.size() / Lanes * Lanes;
+  for ( std::size_t First = 0; First < Blocks; First += Lanes )
+  {
+    for ( std::size_t Lane = 0; Lane < Lanes; ++Lane )
+    {
+      Measure( m_Spheres[First + Lane], Lane );
+    }
+  }
+  for ( std::size_t Index = Blocks; Index < m_Spheres.size(); ++Index )
+  {
+    Measure( m_Spheres[Index], 0 );
+  }
+  VSphereExtent Result;
+  for ( std::size_t Lane = 0; Lane < Lanes; ++Lane )
+  {
+    Result.Largest = std::max( Result.Largest, Largest[Lane] );
+    Result.FineCount += Fine[Lane];
   }
   return Result;
+}
+
+VSphereExtent VSphereBatch::Gather( const VPickWindow& i_rWindow, const VSphereSizing& i_rSizing,
+                                    const VMoxelScene& i_rScene, std::uint32_t i_First, std::uint32_t i_End,
+                                    std::vector< VPickedSphere >& io_rPicked ) const
+{
+  VSphereExtent Extent;
+  const bool bIgnoring = !i_rScene.IgnoredIds().empty();
+  for ( std::uint32_t Index = i_First; Index < i_End; ++Index )
+  {
+    const VScenePoint& rSphere = m_Spheres[Index];
+    const float Size = SizeOf( rSphere, i_rSizing );
+    const float Depth = i_rWindow.Depth( rSphere.X, rSphere.Y, rSphere.Z );
+    if ( !( Size > 0 ) || !i_rWindow.Meets( rSphere.X, rSphere.Y, rSphere.Z, i_rWindow.Drawn( Size, Depth ) ) ||
+         ( bIgnoring && i_rScene.IgnoredIds().contains( m_FirstId + Index ) ) )
+    {
+      continue;
+    }
+    const auto Skipped = Index - i_First - static_cast< std::uint32_t >( io_rPicked.size() );
+    io_rPicked.push_back( { { rSphere.X, rSphere.Y, rSphere.Z, Size },
+                            ( m_Flags.empty() ? 0u : m_Flags[Index] ) | Skipped << SkippedShift } );
+    const float Pixels = Size * i_rWindow.PixelsAtOne() / std::max( Depth, 1.0f );
+    Extent.Largest = std::max( Extent.Largest, Pixels );
+    Extent.FineCount += Pixels >= FinePixels ? 1 : 0;
+  }
+  return Extent;
 }
 
 bool VSphereBatch::UploadSpheres( const VSphereSizing& i_rSizing )
@@ -161,9 +226,9 @@ bool VSphereBatch::UploadSpheres( const VSphereSizing& i_rSizing )
   }
   for ( const VScenePoint& rSphere : m_Spheres )
   {
-    const float Size = Radius( rSphere, i_rSizing );
-    // A sphere without size has no area, wherever its place.
-    *pInstance++ = Size > 0 ? VScenePoint{ rSphere.X, rSphere.Y, rSphere.Z, Size } : VScenePoint{};
+    // What is not drawn stands where no view reaches: a point would show there even without a size.
+    const float Size = SizeOf( rSphere, i_rSizing );
+    *pInstance++ = Size > 0 ? VScenePoint{ rSphere.X, rSphere.Y, rSphere.Z, Size } : Nowhere;
   }
   m_pGl->Sizing = i_rSizing;
   m_pGl->SpheresGeneration = m_pGl->Spheres.Unmap() ? m_SpheresGeneration : 0;
@@ -180,11 +245,9 @@ bool VSphereBatch::UploadColours()
   return m_pGl->ColoursGeneration != 0;
 }
 
-bool VSphereBatch::UploadFlags( const VMoxelScene& i_rScene, bool i_bIgnoring )
+bool VSphereBatch::UploadFlags()
 {
-  const std::uint64_t Ignored = i_bIgnoring ? i_rScene.IgnoredGeneration() : 0;
-  if ( m_pGl->FlagsGeneration == m_FlagsGeneration && m_pGl->Ignored == Ignored &&
-       ( Ignored == 0 || m_pGl->IgnoredFirstId == m_FirstId ) )
+  if ( m_pGl->FlagsGeneration == m_FlagsGeneration )
   {
     return true;
   }
@@ -193,15 +256,8 @@ bool VSphereBatch::UploadFlags( const VMoxelScene& i_rScene, bool i_bIgnoring )
   {
     return false;
   }
-  for ( std::size_t Index = 0; Index < m_Spheres.size(); ++Index )
-  {
-    const bool bHidden =
-        i_bIgnoring && i_rScene.IgnoredIds().contains( m_FirstId + static_cast< std::uint32_t >( Index ) );
-    pFlags[Index] = static_cast< std::uint8_t >( ( m_Flags.empty() ? 0 : m_Flags[Index] ) |
-                                                 ( bHidden ? CoreGraphics::EInstanceHidden : 0 ) );
-  }
-  m_pGl->Ignored = Ignored;
-  m_pGl->IgnoredFirstId = m_FirstId;
+  m_Flags.empty() ? std::fill_n( pFlags, m_Spheres.size(), std::uint8_t( 0 ) )
+                  : std::copy( m_Flags.begin(), m_Flags.end(), pFlags );
   m_pGl->FlagsGeneration = m_pGl->Flags.Unmap() ? m_FlagsGeneration : 0;
   return m_pGl->FlagsGeneration != 0;
 }

@@ -14,6 +14,23 @@ constexpr float RoughPixels = 2.5f;
 /// Below this a sphere is a point: nobody sees the difference, and it costs a vertex in place of 42.
 constexpr float CoarsePixels = 1.0f;
 
+/// The radius in pixels below which no sphere is drawn, as its vertex shader has it.
+constexpr float SmallestPixels = 1.75f;
+
+/// mm; a larger sphere, through a scale that makes no sense, is not drawn.
+constexpr float LargestSize = 1e9f;
+
+/// How large a sphere of radius 1 is in pixels at a distance of 1.
+float PixelsAtOne( CoreGraphics::VRenderContext& io_rContext );
+
+/// The size of a sphere in the world; 0 when it is not drawn.
+inline float SizeOf( const VScenePoint& i_rSphere, const VSphereSizing& i_rSizing )
+{
+  const float Own = i_rSizing.FixedRadius < 0 ? i_rSphere.Radius : i_rSizing.FixedRadius;
+  const float Size = Own * i_rSizing.Scale;
+  return i_rSphere.Radius >= 0 && Size > 0 && Size < LargestSize ? Size : 0.0f;
+}
+
 /// The buffers of a batch, and what they hold: generations of the batch's own contents, 0 for nothing.
 struct VSphereBatch::VGl
 {
@@ -24,8 +41,6 @@ struct VSphereBatch::VGl
   std::uint64_t SpheresGeneration = 0;
   std::uint64_t ColoursGeneration = 0;
   std::uint64_t FlagsGeneration = 0;
-  std::uint64_t Ignored = 0; ///< generation of the scene's ignored ids that the flags hold; 0 for none
-  std::uint32_t IgnoredFirstId = 0;
 
   void Forget() { SpheresGeneration = ColoursGeneration = FlagsGeneration = 0; }
 };

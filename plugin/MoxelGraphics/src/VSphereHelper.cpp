@@ -1,5 +1,6 @@
 #include <MoxelGraphics/VSphereHelper.h>
 
+#include "VPickWindow.h"
 #include "VSphereBatchGl.h"
 
 #include <MoxelGraphics/VMoxelScene.h>
@@ -24,6 +25,18 @@ const VVertexLayout PointLayout( sizeof( VScenePoint ), 0, { { EAttributePositio
 const VVertexLayout PointColourLayout( 4, 0, { { EAttributeModelColour, 4, GL_UNSIGNED_BYTE, true, 0 } } );
 const VVertexLayout PointFlagsLayout( 1, 0, { { EAttributeInstanceFlags, 1, GL_UNSIGNED_BYTE, false, 0 } } );
 
+// What a pick gathered, an instance or a vertex a sphere.
+const VVertexLayout PickedLayout( sizeof( VPickedSphere ), 1,
+                                  { { EAttributeReconPosAndSize, 4, GL_FLOAT, false, 0 },
+                                    { EAttributeInstanceFlags, 1, GL_UNSIGNED_INT, false, sizeof( VScenePoint ) } } );
+const VVertexLayout
+    PickedPointLayout( sizeof( VPickedSphere ), 0,
+                       { { EAttributePosition, 4, GL_FLOAT, false, 0 },
+                         { EAttributeInstanceFlags, 1, GL_UNSIGNED_INT, false, sizeof( VScenePoint ) } } );
+
+/// Gathered at a time: the flags' upper bits count up to here, and a float holds them exactly.
+constexpr std::uint32_t GatherBlock = 0x4000;
+
 /// A batch of up to so many spheres gets the fine mesh when one sphere deserves it, a larger one when an eighth does:
 /// all spheres of a batch share one mesh, so that they stay one draw.
 constexpr std::size_t SmallBatch = 2000;
@@ -44,14 +57,18 @@ struct VSphereHelper::VGl
   VMesh Fine = MakeSphereMesh( 2 );
   VMesh Coarse = MakeSphereMesh( 1 );
   VMesh Rough = MakeSphereMesh( 0 );
-
-  /// Null for points.
-  VMesh* MeshFor( float i_Largest, bool i_bFine )
-  {
-    VMesh* pSmall = i_Largest < CoarsePixels ? nullptr : i_Largest < RoughPixels ? &Rough : &Coarse;
-    return i_bFine ? &Fine : pSmall;
-  }
+  VDynamicBuffer Picked;
   VRenderState State = SphereState();
+
+  /// Null for points, which do for radii below `i_PointPixels`.
+  VMesh* MeshFor( const VSphereExtent& i_rExtent, std::size_t i_Count, float i_PointPixels )
+  {
+    if ( i_rExtent.FineCount > 0 && ( i_Count <= SmallBatch || i_rExtent.FineCount >= i_Count / 8 ) )
+    {
+      return &Fine;
+    }
+    return i_rExtent.Largest < i_PointPixels ? nullptr : i_rExtent.Largest < RoughPixels ? &Rough : &Coarse;
+  }
 };
 
 VSphereHelper::VSphereHelper( std::shared_ptr< CoreGraphics::VResources > i_pResources )
@@ -69,6 +86,11 @@ void VSphereHelper::Clear()
   m_Drawn.clear();
 }
 
+void VSphereHelper::Remember( bool i_bOn )
+{
+  m_bRemembering = i_bOn;
+}
+
 void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene,
                           VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing )
 {
@@ -82,16 +104,13 @@ void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxe
   }
   if ( Mode == ERenderModeSelection )
   {
-    m_Drawn.push_back( { &io_rBatch, io_rContext.ViewProjection(), i_rSizing } );
+    DrawPicked( io_rContext, i_rScene, io_rBatch, i_rSizing );
+    return;
   }
   // In the highlight mask only the stretch that holds all marked spheres is drawn.
-  const std::uint32_t First = Mode == ERenderModeHighlight ? io_rBatch.m_MarkedBegin : 0;
-  const std::uint32_t End =
-      Mode == ERenderModeHighlight ? io_rBatch.m_MarkedEnd : static_cast< std::uint32_t >( io_rBatch.Count() );
-  const auto Extent = io_rBatch.Extent( io_rContext, i_rSizing );
-  const bool bFine =
-      Extent.FineCount > 0 && ( io_rBatch.Count() <= SmallBatch || Extent.FineCount >= io_rBatch.Count() / 8 );
-  VMesh* pMesh = m_pGl->MeshFor( Extent.Largest, bFine );
+  const std::uint32_t First = bVisible ? 0 : io_rBatch.m_MarkedBegin;
+  const std::uint32_t End = bVisible ? static_cast< std::uint32_t >( io_rBatch.Count() ) : io_rBatch.m_MarkedEnd;
+  VMesh* pMesh = m_pGl->MeshFor( io_rBatch.Extent( io_rContext, i_rSizing ), io_rBatch.Count(), CoarsePixels );
   VInstancedProgramPair& rPrograms = pMesh ? m_pGl->Programs : m_pGl->Points;
   if ( !rPrograms.Use( io_rContext, io_rBatch.FirstId() == 0 ? 0 : io_rBatch.FirstId() + First ) )
   {
@@ -102,10 +121,10 @@ void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxe
     io_rBatch.m_pGl = std::make_unique< VSphereBatch::VGl >();
   }
   // A second attempt writes everything again: the buffers may have died with the windows that shared them.
-  if ( !Feed( io_rContext, i_rScene, io_rBatch, i_rSizing, pMesh, First ) )
+  if ( !Feed( io_rContext, io_rBatch, i_rSizing, pMesh, First ) )
   {
     io_rBatch.m_pGl->Forget();
-    if ( !Feed( io_rContext, i_rScene, io_rBatch, i_rSizing, pMesh, First ) )
+    if ( !Feed( io_rContext, io_rBatch, i_rSizing, pMesh, First ) )
     {
       return;
     }
@@ -121,9 +140,56 @@ void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxe
   }
 }
 
-bool VSphereHelper::Feed( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene,
-                          VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing, CoreGraphics::VMesh* i_pMesh,
-                          std::uint32_t i_First )
+void VSphereHelper::DrawPicked( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene,
+                                VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing )
+{
+  if ( m_bRemembering )
+  {
+    m_Drawn.push_back( { &io_rBatch, io_rContext.ViewProjection(), i_rSizing } );
+  }
+  const VPickWindow Window( io_rContext );
+  const auto Count = static_cast< std::uint32_t >( io_rBatch.Count() );
+  for ( std::uint32_t First = 0; First < Count; First += GatherBlock )
+  {
+    m_Picked.clear();
+    const std::uint32_t End = std::min( First + GatherBlock, Count );
+    const VSphereExtent Extent = io_rBatch.Gather( Window, i_rSizing, i_rScene, First, End, m_Picked );
+    if ( !m_Picked.empty() )
+    {
+      DrawGathered( io_rContext, io_rBatch.FirstId() + First, Extent );
+    }
+  }
+}
+
+void VSphereHelper::DrawGathered( CoreGraphics::VRenderContext& io_rContext, std::uint32_t i_FirstId,
+                                  const VSphereExtent& i_rExtent )
+{
+  // A point covers what the smallest sphere does.
+  VMesh* pMesh = m_pGl->MeshFor( i_rExtent, m_Picked.size(), SmallestPixels );
+  VInstancedProgramPair& rPrograms = pMesh ? m_pGl->Programs : m_pGl->Points;
+  if ( !rPrograms.Use( io_rContext, i_FirstId ) || !m_pGl->Picked.Write( std::span( m_Picked ) ) )
+  {
+    return;
+  }
+  std::array< VVertexStream, 2 > Streams;
+  std::size_t Count = 0;
+  Streams[Count++] = { &m_pGl->Picked, pMesh ? &PickedLayout : &PickedPointLayout, 0 };
+  if ( pMesh )
+  {
+    Streams[Count++] = pMesh->Stream();
+  }
+  if ( !io_rContext.SetVertexStreams( std::span( Streams ).first( Count ) ) )
+  {
+    return;
+  }
+  io_rContext.SetRenderState( m_pGl->State );
+  const auto Spheres = static_cast< int >( m_Picked.size() );
+  pMesh ? io_rContext.DrawElementsInstanced( GL_TRIANGLES, *pMesh, Spheres )
+        : io_rContext.DrawArrays( GL_POINTS, Spheres );
+}
+
+bool VSphereHelper::Feed( CoreGraphics::VRenderContext& io_rContext, VSphereBatch& io_rBatch,
+                          const VSphereSizing& i_rSizing, CoreGraphics::VMesh* i_pMesh, std::uint32_t i_First )
 {
   VSphereBatch::VGl& rGl = *io_rBatch.m_pGl;
   if ( !io_rBatch.UploadSpheres( i_rSizing ) )
@@ -140,8 +206,7 @@ bool VSphereHelper::Feed( CoreGraphics::VRenderContext& io_rContext, const VMoxe
   const bool bVisible = io_rContext.RenderMode() == ERenderModeNormal;
   if ( !bVisible )
   {
-    const bool bIgnoring = io_rContext.RenderMode() == ERenderModeSelection && !i_rScene.IgnoredIds().empty();
-    if ( !io_rBatch.UploadFlags( i_rScene, bIgnoring ) )
+    if ( !io_rBatch.UploadFlags() )
     {
       return false;
     }
@@ -182,7 +247,7 @@ void VSphereHelper::PickInRect( const CoreGraphics::VRenderContext& i_rContext, 
     for ( const VScenePoint& rSphere : rDrawn.pBatch->Spheres() )
     {
       const std::uint32_t Own = Id++;
-      if ( rDrawn.pBatch->Radius( rSphere, rDrawn.Sizing ) <= 0 )
+      if ( !( SizeOf( rSphere, rDrawn.Sizing ) > 0 ) )
       {
         continue;
       }

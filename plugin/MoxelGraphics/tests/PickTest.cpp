@@ -150,6 +150,9 @@ TEST_F( VFrameTest, TheAnalyticBandCountsItsBoundsAndNothingBehindTheEye )
   pScene->SphereHelper()->Clear();
   rContext.SetRenderMode( ERenderModeSelection );
   pScene->RenderPass( rContext, {}, ERenderPassOpaque );
+  EXPECT_EQ( pScene->SphereHelper()->Remembered(), 0u );
+  pScene->SphereHelper()->Remember( true );
+  pScene->RenderPass( rContext, {}, ERenderPassOpaque );
   const auto InRect = [&]( QRect i_Rect )
   {
     std::vector< std::uint32_t > Ids;

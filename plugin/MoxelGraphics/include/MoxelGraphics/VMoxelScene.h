@@ -98,11 +98,12 @@ public:
   // What a frame does, in the order of a frame.
   bool IsPending() const { return m_pFlags->bPending.load( std::memory_order_acquire ); }
   void SetIgnoredIds( std::span< const std::uint32_t > i_Ids );
+  /// Adds to them.
+  void IgnoreIds( std::span< const std::uint32_t > i_Ids );
   /// What a render type asks before it draws an object: `i_Word` is the object's selection word.
   bool IgnoreId( std::uint32_t i_Word, int i_RenderMode ) const;
-  /// Ids that the running band pick has found already, in no order; with the generation at which they last changed.
+  /// Ids that the running band pick has found already, in no order.
   const std::unordered_set< std::uint32_t >& IgnoredIds() const { return m_IgnoredIds; }
-  std::uint64_t IgnoredGeneration() const { return m_IgnoredGeneration; }
   /// The start of a view; `i_rScissor` is all that it will touch, in pixels, y up.
   void Clear( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, const QRect& i_rScissor );
   void Clear( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
@@ -113,6 +114,10 @@ public:
   void Paint( QPainter& io_rPainter, CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   void PickInRect( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, const QRect& i_rRect,
                    std::vector< std::uint32_t >& io_rIds );
+
+  /// Whether the highlight mask of the view that is being drawn shows anything. Set by the view, read by post types.
+  bool IsHighlighted() const { return m_bHighlighted; }
+  void SetHighlighted( bool i_bHighlighted ) { m_bHighlighted = i_bHighlighted; }
 
   /// What is selected now.
   ZEK::VSelection GetSelection() const;
@@ -182,9 +187,10 @@ private:
   std::shared_ptr< VSphereHelper > m_pSphereHelper;
   bool m_bDeveloperMode = false;
   bool m_bCanDraw = false;
+  bool m_bHighlighted = false;
   std::atomic< bool > m_bYUp{ false };
   std::unordered_set< std::uint32_t > m_IgnoredIds;
-  std::uint64_t m_IgnoredGeneration = 1;
+  std::uint64_t m_DrawsAtClear = 0; ///< the context's draw calls when the depth was last cleared
   std::shared_ptr< VFlags > m_pFlags;
   std::mutex m_CallbackGuard;
   std::vector< std::shared_ptr< VRenderCallback > > m_Callbacks;

@@ -8,6 +8,7 @@
 
 #include <QtCore/QElapsedTimer>
 #include <QtCore/QPoint>
+#include <QtCore/QRect>
 #include <QtCore/QSize>
 #include <QtCore/QString>
 #include <QtCore/QVariantMap>
@@ -19,7 +20,6 @@
 #include <string>
 #include <vector>
 
-class QRect;
 class QOpenGLFramebufferObject;
 
 namespace CoreGraphics
@@ -122,6 +122,7 @@ private:
   void PickPoint();
   int PickBand();
   int PickLayers( const QRect& i_rBand );
+  bool TakeNew();
   void Draw( const QRect& i_rScissor );
   void Highlight();
   void DrawView();
@@ -140,7 +141,7 @@ private:
   QString m_Notice;
   QSize m_Size;
   bool m_bRefused = false;
-  bool m_bMaskDirty = true;
+  QRect m_DirtyMask; ///< of the selection target, what is not known to be clear
   QElapsedTimer m_Clock;
   std::vector< std::uint32_t > m_Pixels;
   std::vector< std::uint32_t > m_Found; ///< in the order in which they were found

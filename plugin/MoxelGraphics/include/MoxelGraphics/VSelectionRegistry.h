@@ -52,6 +52,10 @@ public:
 ///
 /// Ids are taken in ranges into flat storage that keeps its capacity: taking one allocates nothing in the steady
 /// state. An id is meaningless after the next `Reset`. Thread: render thread.
+///
+/// Ids are given in the order of asking. From 0x40000 on an id's own bits make an object that is both selected and
+/// preselected look like the current item in the outline: what comes in great numbers, mask cells and grey blobs,
+/// asks last, so that only those ever get there.
 class VSelectionRegistry
 {
 public:
@@ -140,6 +144,8 @@ private:
   };
 
   bool Take( std::uint32_t i_Count, VRange*& o_rpRange );
+  void WarnOfLookalikes( const VRange& i_rRange );
+  bool FindIn( const VRange& i_rRange, const ZEK::VSelectionItem& i_rItem, std::uint32_t& o_rIndex ) const;
   void TakeMarks();
   const VRange* RangeOf( std::uint32_t i_Id ) const;
 
@@ -156,6 +162,8 @@ private:
   std::uint64_t m_MarksGeneration = 1;
   std::uint64_t m_ServiceGeneration = 0;
   bool m_bMarksTaken = false;
+  bool m_bRanOut = false;
+  bool m_bWarned = false;
 };
 
 } // namespace MoxelGraphics

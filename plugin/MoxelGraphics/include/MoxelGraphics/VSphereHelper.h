@@ -3,7 +3,7 @@
 // How render types draw many spheres: each owns a VSphereBatch per kind, fills it when its data change, and hands it
 // to the scene's VSphereHelper in Render. One batch is one buffer write when it changed and one instanced draw; a
 // batch that did not change touches no buffer, and a batch without anything selected is not drawn into the
-// highlight mask at all.
+// highlight mask at all. A pick draws only the spheres that reach into its window, gathered anew for each draw.
 
 #include <MoxelGraphics/VSelectionRegistry.h>
 
@@ -36,6 +36,22 @@ struct VSphereSizing
   friend bool operator==( const VSphereSizing&, const VSphereSizing& ) = default;
 };
 
+class VPickWindow;
+
+/// A sphere as a pick draws it.
+struct VPickedSphere
+{
+  VScenePoint Sphere;
+  std::uint32_t Flags = 0; ///< EInstanceFlag bits, and from bit 8 on how many ids were left out before it
+};
+
+/// How large spheres are on the screen.
+struct VSphereExtent
+{
+  float Largest = 0;         ///< radius in pixels
+  std::size_t FineCount = 0; ///< how many are large enough for the fine mesh
+};
+
 /// The spheres of one kind. Geometry, colours and selection are set apart, and each is taken to the GPU only after
 /// it was set anew. Thread: render thread; OpenGL objects are made when it is first drawn.
 class VSphereBatch
@@ -45,7 +61,7 @@ public:
   ~VSphereBatch();
 
   /// World positions and radii in mm. A sphere whose position is not finite is kept, so that indices hold, and is
-  /// neither drawn nor picked. Colours and flags are kept as far as the count is the same.
+  /// neither drawn nor picked; its radius is then negative. Colours and flags are kept while the count is the same.
   void SetSpheres( std::span< const VScenePoint > i_Spheres );
   /// One colour for all, red, green, blue, alpha, 0 to 1.
   void SetColour( const std::array< float, 4 >& i_rColour );
@@ -66,18 +82,24 @@ private:
   friend class VSphereHelper;
   struct VGl;
 
-  void MeasureBox();
-  float Radius( const VScenePoint& i_rSphere, const VSphereSizing& i_rSizing ) const;
-  /// How large the spheres of the batch are in pixels.
-  struct VExtent
+  /// What `Extent` found for a view; a still frame need not look at each sphere again.
+  struct VSeen
   {
-    float Largest = 0;
-    std::size_t FineCount = 0; ///< how many are large enough for the fine mesh
+    QMatrix4x4 ViewProjection;
+    float PixelsAtOne = 0;
+    VSphereSizing Sizing;
+    std::uint64_t Generation = 0;
+    VSphereExtent Extent;
   };
-  VExtent Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing ) const;
+
+  VSphereExtent Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing );
+  VSphereExtent MeasureEach( const QVector4D& i_rDepth, float i_PixelsAtOne, const VSphereSizing& i_rSizing ) const;
+  /// Appends those of the spheres from `i_First` to `i_End` that reach into the window and are not ignored.
+  VSphereExtent Gather( const VPickWindow& i_rWindow, const VSphereSizing& i_rSizing, const VMoxelScene& i_rScene,
+                        std::uint32_t i_First, std::uint32_t i_End, std::vector< VPickedSphere >& io_rPicked ) const;
   bool UploadSpheres( const VSphereSizing& i_rSizing );
   bool UploadColours();
-  bool UploadFlags( const VMoxelScene& i_rScene, bool i_bIgnoring );
+  bool UploadFlags();
 
   std::vector< VScenePoint > m_Spheres;
   std::vector< std::uint32_t > m_Colours; ///< empty: one colour
@@ -90,11 +112,13 @@ private:
   std::uint64_t m_SpheresGeneration = 1;
   std::uint64_t m_ColoursGeneration = 1;
   std::uint64_t m_FlagsGeneration = 1;
+  std::array< VSeen, 4 > m_Seen; ///< as many views may look at the scene in turn
+  std::size_t m_NextSeen = 0;
   std::unique_ptr< VGl > m_pGl;
 };
 
-/// Draws batches of spheres, and knows what was drawn since the last clear so that a band can be tested against it.
-/// One per scene; the scene makes a new one for each of its views, so nobody keeps it.
+/// Draws batches of spheres, and knows what a band pick drew since the last clear so that the band can be tested
+/// against it. One per scene; the scene makes a new one for each of its views, so nobody keeps it.
 class VSphereHelper
 {
 public:
@@ -103,11 +127,16 @@ public:
 
   /// The start of a view: nothing is drawn yet.
   void Clear();
-  /// Draws the batch as the context's render mode asks. The batch must live until the next `Clear`.
+  /// Whether draws in the selection mode are remembered for `PickInRect`: only a band pick wants that.
+  void Remember( bool i_bOn );
+  /// How many draws are remembered.
+  std::size_t Remembered() const { return m_Drawn.size(); }
+  /// Draws the batch as the context's render mode asks; in the selection mode only what reaches into its scissor.
+  /// The batch must live until the next `Clear`.
   void Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene, VSphereBatch& io_rBatch,
              const VSphereSizing& i_rSizing );
-  /// Appends the id of every sphere drawn in the selection mode since `Clear` whose centre lies in the rectangle,
-  /// bounds included, unless it lies behind the eye. The rectangle is in pixels of the context's frame, y up.
+  /// Appends the id of every remembered sphere whose centre lies in the rectangle, bounds included, unless it lies
+  /// behind the eye. The rectangle is in pixels of the context's frame, y up.
   void PickInRect( const CoreGraphics::VRenderContext& i_rContext, const QRect& i_rRect,
                    std::vector< std::uint32_t >& io_rIds ) const;
 
@@ -120,12 +149,18 @@ private:
     VSphereSizing Sizing;
   };
 
-  bool Feed( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene, VSphereBatch& io_rBatch,
-             const VSphereSizing& i_rSizing, CoreGraphics::VMesh* i_pMesh, std::uint32_t i_First );
+  void DrawPicked( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene, VSphereBatch& io_rBatch,
+                   const VSphereSizing& i_rSizing );
+  void DrawGathered( CoreGraphics::VRenderContext& io_rContext, std::uint32_t i_FirstId,
+                     const VSphereExtent& i_rExtent );
+  bool Feed( CoreGraphics::VRenderContext& io_rContext, VSphereBatch& io_rBatch, const VSphereSizing& i_rSizing,
+             CoreGraphics::VMesh* i_pMesh, std::uint32_t i_First );
 
   std::shared_ptr< CoreGraphics::VResources > m_pResources;
   std::unique_ptr< VGl > m_pGl;
+  bool m_bRemembering = false;
   std::vector< VDrawn > m_Drawn;
+  std::vector< VPickedSphere > m_Picked;
 };
 
 } // namespace MoxelGraphics
