@@ -4,6 +4,7 @@
 
 #include <MoxelGraphics/VMoxelScene.h>
 
+#include <CoreGraphics/VCameraController.h>
 #include <CoreGraphics/VInteractionMapper.h>
 
 #include <QtGui/QHoverEvent>
@@ -24,6 +25,68 @@ bool IsBandGesture( const QMouseEvent& i_rEvent )
                                       static_cast< int >( i_rEvent.modifiers() ) );
 }
 } // namespace
+
+bool VSceneFramebufferObject::Gesture( VGesture i_Gesture )
+{
+  const bool bMeans = Perform( i_Gesture, *m_pHandCamera );
+  m_pSynced->Gestures.push_back( std::move( i_Gesture ) );
+  return bMeans;
+}
+
+void VSceneFramebufferObject::MouseGesture( int i_Kind, const QMouseEvent& i_rEvent )
+{
+  if ( !m_Options.CameraView )
+  {
+    Gesture( { static_cast< VGesture::EKind >( i_Kind ), 0, Ratio(), std::unique_ptr< QEvent >( i_rEvent.clone() ) } );
+  }
+}
+
+bool VSceneFramebufferObject::AskManipulators(
+    const std::function< bool( IManipulator&, std::uint32_t ) >& i_Ask ) const
+{
+  const auto Ask = [&]( const std::shared_ptr< IManipulator >& i_rpManipulator, std::uint32_t i_Kind )
+  {
+    return i_rpManipulator && i_rpManipulator->IsShown() && i_Ask( *i_rpManipulator, i_Kind );
+  };
+  return Ask( m_Manipulators.pObject, ZEK::ESelectObjectManipulator ) ||
+         Ask( m_Manipulators.pVolume, ZEK::ESelectVolumeManipulator ) ||
+         Ask( m_Manipulators.pHotspot, ZEK::ESelectVolumeManipulator );
+}
+
+void VSceneFramebufferObject::SelectHandles( std::uint32_t i_Kind )
+{
+  const auto pService = m_pScene ? m_pScene->SelectionService() : nullptr;
+  if ( !pService )
+  {
+    return;
+  }
+  // What the handles act on stays selected.
+  ZEK::VSelection Selection = pService->Get( ZEK::ISelectionService::EPrimary );
+  std::erase_if( Selection,
+                 [&]( const ZEK::VSelectionItem& i_rItem )
+                 {
+                   return i_rItem.Kind == i_Kind;
+                 } );
+  ZEK::VSelection Handles;
+  pService->Get( ZEK::ISelectionService::ESecondary, { i_Kind }, Handles );
+  Selection.insert( Selection.end(), Handles.begin(), Handles.end() );
+  pService->Set( ZEK::ISelectionService::EPrimary, std::move( Selection ) );
+}
+
+bool VSceneFramebufferObject::OfferPress( const QMouseEvent& i_rEvent )
+{
+  return AskManipulators(
+      [&]( IManipulator& io_rManipulator, std::uint32_t i_Kind )
+      {
+        const bool bTakes = io_rManipulator.TakesPress( i_rEvent, *m_pHandCamera, Ratio() );
+        if ( bTakes )
+        {
+          SelectHandles( i_Kind );
+          io_rManipulator.Press( i_rEvent, *m_pHandCamera, Ratio() );
+        }
+        return bTakes;
+      } );
+}
 
 void VSceneFramebufferObject::TakeModifiers( Qt::KeyboardModifiers i_Modifiers )
 {
@@ -49,21 +112,21 @@ void VSceneFramebufferObject::mousePressEvent( QMouseEvent* i_pEvent )
   forceActiveFocus( Qt::MouseFocusReason );
   m_Pointer = m_PressPoint = i_pEvent->position();
   m_PickMode = EPickNone;
+  m_bClickPending = false;
   TakeModifiers( i_pEvent->modifiers() );
-  if ( IsBandGesture( *i_pEvent ) )
+  if ( OfferPress( *i_pEvent ) )
+  {
+    // It is the manipulator's until the button is let go.
+  }
+  else if ( IsBandGesture( *i_pEvent ) )
   {
     m_PickMode = EPickBand;
     m_BandStart = m_Pointer;
-    m_bClickPending = false;
   }
   else
   {
     m_bClickPending = i_pEvent->button() == Qt::LeftButton;
-    if ( !m_Options.CameraView )
-    {
-      const std::lock_guard Lock( *m_pCameraGuard );
-      m_pController->OnMousePress( *i_pEvent, Ratio() );
-    }
+    MouseGesture( VGesture::EPress, *i_pEvent );
   }
   i_pEvent->accept();
   Refresh();
@@ -78,14 +141,15 @@ void VSceneFramebufferObject::mouseMoveEvent( QMouseEvent* i_pEvent )
   {
     m_bClickPending = false;
   }
-  if ( m_PickMode != EPickBand && !IsBandGesture( *i_pEvent ) )
+  const bool bTaken = AskManipulators(
+      [&]( IManipulator& io_rManipulator, std::uint32_t )
+      {
+        return io_rManipulator.Move( *i_pEvent, *m_pHandCamera, Ratio() );
+      } );
+  if ( !bTaken && m_PickMode != EPickBand && !IsBandGesture( *i_pEvent ) )
   {
     m_PickMode = EPickNone;
-    if ( !m_Options.CameraView )
-    {
-      const std::lock_guard Lock( *m_pCameraGuard );
-      m_pController->OnMouseMove( *i_pEvent, Ratio() );
-    }
+    MouseGesture( VGesture::EMove, *i_pEvent );
   }
   i_pEvent->accept();
   emit MouseMoved();
@@ -102,10 +166,14 @@ void VSceneFramebufferObject::mouseReleaseEvent( QMouseEvent* i_pEvent )
     m_PickMode = m_PickMode == EPickBand ? EPickBandDone : EPickClick;
   }
   m_bClickPending = false;
-  if ( !m_Options.CameraView )
+  const bool bTaken = AskManipulators(
+      [&]( IManipulator& io_rManipulator, std::uint32_t )
+      {
+        return io_rManipulator.Release( *i_pEvent, *m_pHandCamera, Ratio() );
+      } );
+  if ( !bTaken )
   {
-    const std::lock_guard Lock( *m_pCameraGuard );
-    m_pController->OnMouseRelease( *i_pEvent, Ratio() );
+    MouseGesture( VGesture::ERelease, *i_pEvent );
   }
   i_pEvent->accept();
   Refresh();
@@ -118,6 +186,22 @@ void VSceneFramebufferObject::mouseUngrabEvent()
   if ( m_PickMode == EPickBand )
   {
     m_PickMode = EPickNone;
+  }
+  AskManipulators(
+      []( IManipulator& io_rManipulator, std::uint32_t )
+      {
+        if ( io_rManipulator.IsGrabbed() )
+        {
+          io_rManipulator.LetGo();
+        }
+        return false;
+      } );
+  // A camera that went on with its gesture would jump at the next press.
+  const CoreGraphics::VCameraFields& rCamera = m_pHandCamera->Fields();
+  if ( rCamera.panning || rCamera.orbiting || rCamera.zooming )
+  {
+    MouseGesture( VGesture::ERelease, QMouseEvent( QEvent::MouseButtonRelease, m_Pointer, mapToGlobal( m_Pointer ),
+                                                   Qt::NoButton, Qt::NoButton, Qt::NoModifier ) );
   }
   update();
 }
@@ -135,8 +219,7 @@ void VSceneFramebufferObject::wheelEvent( QWheelEvent* i_pEvent )
 {
   if ( !m_Options.CameraView )
   {
-    const std::lock_guard Lock( *m_pCameraGuard );
-    m_pController->OnWheel( *i_pEvent );
+    Gesture( { VGesture::EWheel, 0, Ratio(), std::unique_ptr< QEvent >( i_pEvent->clone() ) } );
   }
   i_pEvent->accept();
   Refresh();
@@ -144,12 +227,7 @@ void VSceneFramebufferObject::wheelEvent( QWheelEvent* i_pEvent )
 
 void VSceneFramebufferObject::keyPressEvent( QKeyEvent* i_pEvent )
 {
-  bool bTaken = false;
-  if ( !m_Options.CameraView )
-  {
-    const std::lock_guard Lock( *m_pCameraGuard );
-    bTaken = m_pController->OnKeyPress( i_pEvent->key() );
-  }
+  const bool bTaken = !m_Options.CameraView && Gesture( { VGesture::EKey, i_pEvent->key(), Ratio(), nullptr } );
   TakeModifiers( i_pEvent->modifiers() );
   i_pEvent->setAccepted( bTaken );
   Refresh();
@@ -170,6 +248,15 @@ void VSceneFramebufferObject::hoverEnterEvent( QHoverEvent* i_pEvent )
 void VSceneFramebufferObject::hoverMoveEvent( QHoverEvent* i_pEvent )
 {
   TakeModifiers( i_pEvent->modifiers() );
+  const bool bGrabbed = AskManipulators(
+      []( IManipulator& io_rManipulator, std::uint32_t )
+      {
+        return io_rManipulator.IsGrabbed();
+      } );
+  if ( bGrabbed )
+  {
+    return;
+  }
   // Qt repeats the event after each frame; answering that with a frame would never end.
   if ( m_PickMode == EPickHover && m_Pointer == i_pEvent->position() )
   {

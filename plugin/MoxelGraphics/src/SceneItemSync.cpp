@@ -53,11 +53,63 @@ void VSceneFramebufferObject::Refresh()
   update();
 }
 
+void VSceneFramebufferObject::PassGestures()
+{
+  for ( const VGesture& rGesture : m_pSynced->Gestures )
+  {
+    Perform( rGesture, *m_pController );
+  }
+  m_pSynced->Gestures.clear();
+}
+
+void VSceneFramebufferObject::BeginFrames()
+{
+  m_pSynced->Serial = 0;
+  // What the former renderer did not come to do.
+  m_bFocusPending = m_bFocusPending || m_pSynced->bFitUnderWay;
+}
+
+void VSceneFramebufferObject::CollectOverlay( const VSceneFrame& i_rFrame )
+{
+  // Before the first frame there is no camera that anything could be seen with.
+  const bool bDrawn = i_rFrame.Figures().Frames > 0;
+  if ( bDrawn && m_pSynced->Overlay.Collect( *m_pScene, m_pController->Fields(), size() ) &&
+       !std::exchange( m_pSynced->bOverlayPosted, true ) )
+  {
+    Post(
+        [this]
+        {
+          ApplyOverlay();
+        } );
+  }
+}
+
+void VSceneFramebufferObject::ApplyOverlay()
+{
+  m_pSynced->bOverlayPosted = false;
+  if ( UpdateCameraObjects( m_CameraObjects, m_pSynced->Overlay.Cameras(), *this ) )
+  {
+    emit CamerasChanged();
+  }
+  if ( UpdateSubjectObjects( m_SubjectObjects, m_pSynced->SubjectKeys, m_pSynced->Overlay.Subjects(), *this ) )
+  {
+    emit SubjectsChanged();
+  }
+  SetShowCameraNumbers( m_bWantsCameraNumbers );
+}
+
 void VSceneFramebufferObject::Exchange( VSceneFrame& io_rFrame )
 {
+  m_pSynced->Camera = m_pController->Fields();
+  CollectOverlay( io_rFrame );
+  PassGestures();
   TakeResult( io_rFrame );
   GiveOrders( io_rFrame );
-  m_pSynced->Camera = m_pController->Fields();
+  *m_pHandCamera = *m_pController;
+  if ( m_pManipulatorSource )
+  {
+    m_Manipulators = m_pManipulatorSource->Manipulators();
+  }
   m_pSynced->Figures = io_rFrame.Figures();
   m_pSynced->Gl = io_rFrame.Gl();
   if ( m_pSynced->Notice != io_rFrame.Notice() )
@@ -122,6 +174,7 @@ void VSceneFramebufferObject::GiveOrders( VSceneFrame& io_rFrame )
   rInput.PreselectColour = m_PreselectColour;
   rInput.PixelRatio = static_cast< float >( DeviceRatio );
   FollowTracking();
+  m_pSynced->bFitUnderWay = rInput.bFit || m_bFocusPending;
   if ( m_bFocusPending )
   {
     m_bFocusPending = false;

@@ -1,5 +1,6 @@
 #include <MoxelGraphics/VSceneFramebufferObject.h>
 
+#include "HandOver.h"
 #include "Log.h"
 #include "VSceneFramebufferRenderer.h"
 #include "VSynced.h"
@@ -68,7 +69,7 @@ QStringList Texts( const std::vector< std::string >& i_rTexts )
 VSceneFramebufferObject::VSceneFramebufferObject( QQuickItem* i_pParent )
   : QQuickFramebufferObject( i_pParent )
   , m_pController( std::make_shared< CoreGraphics::VCameraController >() )
-  , m_pCameraGuard( std::make_shared< std::mutex >() )
+  , m_pHandCamera( std::make_unique< CoreGraphics::VCameraController >() )
   , m_pOptionsMap( new QQmlPropertyMap( this ) )
   , m_pSynced( std::make_unique< VSynced >() )
 {
@@ -79,9 +80,41 @@ VSceneFramebufferObject::VSceneFramebufferObject( QQuickItem* i_pParent )
   setFlag( ItemAcceptsInputMethod, false );
   WriteSceneOptions( m_Options, *m_pOptionsMap );
   connect( m_pOptionsMap, &QQmlPropertyMap::valueChanged, this, &VSceneFramebufferObject::OnSceneOptionsMapChanged );
+  FollowWindow( window() );
 }
 
 VSceneFramebufferObject::~VSceneFramebufferObject() = default;
+
+void VSceneFramebufferObject::FollowWindow( QQuickWindow* i_pWindow )
+{
+  // The last thing that the GUI thread does before it is held for the renderers of a window.
+  disconnect( m_BeforeMeeting );
+  m_BeforeMeeting = i_pWindow ? connect(
+                                    i_pWindow, &QQuickWindow::afterAnimating, this,
+                                    [this]
+                                    {
+                                      HandOver( m_pSynced.get() );
+                                    },
+                                    Qt::DirectConnection )
+                              : QMetaObject::Connection();
+}
+
+void VSceneFramebufferObject::itemChange( ItemChange i_Change, const ItemChangeData& i_rData )
+{
+  if ( i_Change == ItemSceneChange )
+  {
+    FollowWindow( i_rData.window );
+  }
+  QQuickFramebufferObject::itemChange( i_Change, i_rData );
+}
+
+bool VSceneFramebufferObject::event( QEvent* i_pEvent )
+{
+  TakeOver( m_pSynced.get() );
+  const bool bTaken = QQuickFramebufferObject::event( i_pEvent );
+  HandOver( m_pSynced.get() );
+  return bTaken;
+}
 
 QQuickFramebufferObject::Renderer* VSceneFramebufferObject::createRenderer() const
 {
@@ -89,6 +122,14 @@ QQuickFramebufferObject::Renderer* VSceneFramebufferObject::createRenderer() con
 }
 
 QSGNode* VSceneFramebufferObject::updatePaintNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData )
+{
+  TakeOver( m_pSynced.get() );
+  QSGNode* const pNode = MakeNode( i_pNode, i_pData );
+  HandOver( m_pSynced.get() );
+  return pNode;
+}
+
+QSGNode* VSceneFramebufferObject::MakeNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData )
 {
   const auto Api = window()->rendererInterface()->graphicsApi();
   if ( Api == QSGRendererInterface::OpenGL )
@@ -130,6 +171,8 @@ void VSceneFramebufferObject::SetScene( QObject* i_pScene )
     return;
   }
   m_pScene = std::move( pShared );
+  m_pManipulatorSource = dynamic_cast< IManipulatorSource* >( m_pScene.get() );
+  m_Manipulators = {};
   update();
 }
 
@@ -141,24 +184,22 @@ void VSceneFramebufferObject::SetPreviewCamera( const QString& i_rURN )
 
 int VSceneFramebufferObject::CameraType() const
 {
-  const std::lock_guard Lock( *m_pCameraGuard );
-  return m_pController->GetViewType();
+  return m_pHandCamera->GetViewType();
 }
 
 void VSceneFramebufferObject::SetCameraType( int i_Type )
 {
-  {
-    const std::lock_guard Lock( *m_pCameraGuard );
-    m_pController->SetViewType( i_Type );
-  }
+  Gesture( { VGesture::EViewType, i_Type, 1.0, nullptr } );
   update();
 }
 
 void VSceneFramebufferObject::SetShowCameraNumbers( bool i_bShow )
 {
-  if ( i_bShow != m_bShowCameraNumbers )
+  m_bWantsCameraNumbers = i_bShow;
+  const bool bShow = i_bShow || m_pSynced->Overlay.IsCameraHeld();
+  if ( bShow != m_bShowCameraNumbers )
   {
-    m_bShowCameraNumbers = i_bShow;
+    m_bShowCameraNumbers = bShow;
     emit ShowCameraNumbersChanged();
   }
 }
@@ -208,9 +249,17 @@ void VSceneFramebufferObject::setOption( const QString& i_rKey, const QVariant& 
   OnSceneOptionsMapChanged( i_rKey, i_rValue );
 }
 
-void VSceneFramebufferObject::OptionsRestored()
+void VSceneFramebufferObject::SetOptions( const VSceneOptions& i_rOptions )
 {
+  const bool bOtherAxis = i_rOptions.YUp != m_Options.YUp;
+  m_Options = i_rOptions;
+  WriteSceneOptions( m_Options, *m_pOptionsMap );
+  if ( m_pScene && bOtherAxis )
+  {
+    m_pScene->SetYUp( m_Options.YUp );
+  }
   emit SceneOptionsChanged();
+  update();
 }
 
 void VSceneFramebufferObject::OnSceneOptionsMapChanged( const QString& i_rKey, const QVariant& )
@@ -225,6 +274,7 @@ void VSceneFramebufferObject::OnSceneOptionsMapChanged( const QString& i_rKey, c
 
 QVariantMap VSceneFramebufferObject::frameReport() const
 {
+  TakeOver( m_pSynced.get() );
   const VFrameFigures& rFigures = m_pSynced->Figures;
   return { { "camera", CameraReport( m_pSynced->Camera ) },
            { "timings", QVariantMap{ { "update_ms", rFigures.UpdateMs },

@@ -37,7 +37,8 @@ void VSceneFramebufferRenderer::synchronize( QQuickFramebufferObject* i_pItem )
   const bool bOtherScene = rItem.m_pScene && ( !m_pFrame || m_pFrame->Scene() != rItem.m_pScene );
   if ( bOtherScene )
   {
-    m_pFrame = std::make_unique< VSceneFrame >( rItem.m_pScene, rItem.m_pController, rItem.m_pCameraGuard );
+    m_pFrame = std::make_unique< VSceneFrame >( rItem.m_pScene, rItem.m_pController );
+    rItem.BeginFrames();
     invalidateFramebufferObject();
   }
   else if ( !rItem.m_pScene )
@@ -46,6 +47,7 @@ void VSceneFramebufferRenderer::synchronize( QQuickFramebufferObject* i_pItem )
   }
   if ( !m_pFrame )
   {
+    rItem.PassGestures();
     return;
   }
   const VSceneOptions& rFormer = m_pFrame->Input().Options;

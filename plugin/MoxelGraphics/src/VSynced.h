@@ -1,5 +1,8 @@
 #pragma once
 
+#include "VGestures.h"
+#include "VOverlay.h"
+
 #include <MoxelGraphics/VSceneFrame.h>
 #include <MoxelGraphics/VSceneFramebufferObject.h>
 
@@ -8,9 +11,10 @@
 namespace MoxelGraphics
 {
 
-/// What the item took from the renderer when they last met.
+/// What the item took from the renderer when they last met, and what it has for the next time.
 struct VSceneFramebufferObject::VSynced
 {
+  std::vector< VGesture > Gestures; ///< since the last meeting, in their order
   CoreGraphics::VCameraFields Camera;
   VFrameFigures Figures;
   QVariantMap Gl;
@@ -21,6 +25,10 @@ struct VSceneFramebufferObject::VSynced
   bool bPreselected = false; ///< the selection and labels above are those of a preselection that was posted
   int Unanswered = 0;        ///< meetings since a commit was asked for
   ETracking Tracking = ETrackNone;
+  bool bFitUnderWay = false; ///< a renderer was asked to frame the selection and may not have done so yet
+  VOverlay Overlay;
+  bool bOverlayPosted = false;
+  std::vector< ZEK::VSelectionItem > SubjectKeys; ///< of the subject objects; GUI side
 };
 
 } // namespace MoxelGraphics

@@ -1,117 +1,12 @@
-#include "TestScene.h"
-
-#include <MoxelGraphics/VSceneFramebufferObject.h>
-
-#include <CoreGraphics/VInteractionMapper.h>
+#include "ItemFixture.h"
 
 #include <TestSupport/LogGuard.h>
 
-#include <QtCore/QCoreApplication>
-#include <QtCore/QDeadlineTimer>
-#include <QtCore/QThread>
 #include <QtCore/QVersionNumber>
-#include <QtGui/QMouseEvent>
-#include <QtQml/QQmlComponent>
-#include <QtQml/QQmlEngine>
 #include <QtQuick/QQuickWindow>
-#include <QtQuickWidgets/QQuickWidget>
-#include <QtWidgets/QApplication>
 
 namespace MoxelGraphics
 {
-namespace
-{
-constexpr QSize Size( 640, 360 );
-
-class VItemTest : public testing::Test
-{
-protected:
-  VItemTest()
-  {
-    InitShaders();
-    CoreGraphics::SetInteractionMapper( std::make_shared< CoreGraphics::VInteractionMapper >() );
-    pScene = std::make_shared< VTestScene >();
-    pScene->Change( { { 0, 0, 0, 7 }, { 1500, 300, 900, 7 }, { -900, -1600, 200, 7 } } );
-    Component.setData( "import QtQuick\nItem {}", {} );
-    auto* pRoot = qobject_cast< QQuickItem* >( Component.create() );
-    pItem = new VSceneFramebufferObject( pRoot );
-    pItem->setSize( Size );
-    pItem->SetScene( pScene.get() );
-    pItem->setOption( "ReconstructionScale", 6.0 );
-    Widget.setContent( {}, &Component, pRoot );
-    Widget.setResizeMode( QQuickWidget::SizeRootObjectToView );
-    Widget.resize( Size );
-    Widget.show();
-    Frames( 3 );
-  }
-  ~VItemTest() override { CoreGraphics::SetInteractionMapper( nullptr ); }
-
-  quint64 Drawn() const { return pItem->frameReport()["frames"].toULongLong(); }
-  template < typename TCondition >
-  bool Until( TCondition i_Condition )
-  {
-    const QDeadlineTimer Patience( 20000 );
-    while ( !i_Condition() && !Patience.hasExpired() )
-    {
-      QCoreApplication::processEvents( QEventLoop::AllEvents, 20 );
-    }
-    return i_Condition();
-  }
-  /// Lets that many frames be drawn, as the views' timer does.
-  void Frames( int i_Count )
-  {
-    for ( int Frame = 0; Frame < i_Count; ++Frame )
-    {
-      const quint64 Before = Drawn();
-      ASSERT_TRUE( Until(
-          [&]
-          {
-            pItem->update();
-            return Drawn() > Before;
-          } ) );
-    }
-  }
-  /// Lets everything run out that is still under way.
-  void Settle()
-  {
-    quint64 Last = Drawn();
-    for ( int Quiet = 0; Quiet < 10; ++Quiet )
-    {
-      QCoreApplication::processEvents( QEventLoop::AllEvents, 20 );
-      QThread::msleep( 5 );
-      Quiet = Drawn() == Last ? Quiet : 0;
-      Last = Drawn();
-    }
-  }
-  void Mouse( QEvent::Type i_Type, QPointF i_Place, Qt::MouseButton i_Button, Qt::MouseButtons i_Buttons,
-              Qt::KeyboardModifiers i_Modifiers = Qt::NoModifier )
-  {
-    QMouseEvent Event( i_Type, i_Place, Widget.mapToGlobal( i_Place ), i_Button, i_Buttons, i_Modifiers );
-    QCoreApplication::sendEvent( &Widget, &Event );
-  }
-  void Click( QPointF i_Place, Qt::KeyboardModifiers i_Modifiers = Qt::NoModifier )
-  {
-    Mouse( QEvent::MouseButtonPress, i_Place, Qt::LeftButton, Qt::LeftButton, i_Modifiers );
-    Mouse( QEvent::MouseButtonRelease, i_Place, Qt::LeftButton, Qt::NoButton, i_Modifiers );
-    EXPECT_TRUE( Until(
-        [&]
-        {
-          return !pItem->IsPickPending();
-        } ) );
-    QCoreApplication::processEvents();
-  }
-  void Hover( QPointF i_Place ) { Mouse( QEvent::MouseMove, i_Place, Qt::NoButton, Qt::NoButton ); }
-  QPointF Place( std::uint32_t i_Index ) { return ScreenPoint( pScene->Resolver.Points[i_Index], Size ); }
-  ZEK::VSelection Selected() { return pScene->pSelection->Get( ZEK::ISelectionService::EPrimary ); }
-  ZEK::VSelection Preselected() { return pScene->pSelection->Get( ZEK::ISelectionService::ESecondary ); }
-
-  std::shared_ptr< VTestScene > pScene;
-  QQmlEngine Engine;
-  QQmlComponent Component{ &Engine };
-  QQuickWidget Widget{ &Engine, nullptr };
-  VSceneFramebufferObject* pItem = nullptr;
-};
-} // namespace
 
 TEST_F( VItemTest, ThePictureStandsUpright )
 {
@@ -188,10 +83,10 @@ TEST_F( VItemTest, ModifiersSayWhatAClickDoesToTheSelection )
 
 TEST_F( VItemTest, ADragIsNoClickAndAShakingHandIs )
 {
-  const float Azimuth = pItem->Controller()->Fields().azimuth;
+  const float Azimuth = pItem->Camera().Fields().azimuth;
   Mouse( QEvent::MouseButtonPress, Place( 0 ), Qt::LeftButton, Qt::LeftButton );
   Mouse( QEvent::MouseMove, Place( 0 ) + QPointF( 10, 0 ), Qt::NoButton, Qt::LeftButton );
-  EXPECT_NE( pItem->Controller()->Fields().azimuth, Azimuth );
+  EXPECT_NE( pItem->Camera().Fields().azimuth, Azimuth );
   Mouse( QEvent::MouseMove, Place( 0 ), Qt::NoButton, Qt::LeftButton );
   Mouse( QEvent::MouseButtonRelease, Place( 0 ), Qt::LeftButton, Qt::NoButton );
   EXPECT_FALSE( pItem->IsPickPending() );
@@ -327,27 +222,23 @@ TEST_F( VItemTest, FramingTwiceFramesTwice )
   pScene->pSelection->Set( ZEK::ISelectionService::EPrimary, { Recon( 1 ) } );
   for ( int Time = 0; Time < 2; ++Time )
   {
-    pItem->Controller()->SetFocusPoints( std::array{ QVector4D( 5, 5, 5, 0 ) }, false );
+    Press( Qt::Key_Home );
+    ASSERT_EQ( pItem->Camera().Fields().centre.x(), 0 );
     pItem->setProperty( "focusSelection", true );
-    ASSERT_TRUE( Until(
-        [&]
-        {
-          return pItem->Controller()->Fields().centre == QVector3D( 1500, 300, 900 );
-        } ) );
+    Frames( 2 );
+    EXPECT_EQ( pItem->Camera().Fields().centre, QVector3D( 1500, 300, 900 ) );
   }
 }
 
 TEST_F( VItemTest, KeysAndWheelMoveTheCamera )
 {
-  QWheelEvent Wheel( { 300, 200 }, Widget.mapToGlobal( QPointF( 300, 200 ) ), {}, { 0, 120 }, Qt::NoButton,
-                     Qt::NoModifier, Qt::NoScrollPhase, false );
-  QCoreApplication::sendEvent( &Widget, &Wheel );
-  EXPECT_NEAR( pItem->Controller()->Fields().distance, 6300, 1 );
+  Wheel( 120 );
+  EXPECT_NEAR( pItem->Camera().Fields().distance, 6300, 1 );
   pItem->forceActiveFocus();
   QKeyEvent Key( QEvent::KeyPress, Qt::Key_Home, Qt::NoModifier );
   QCoreApplication::sendEvent( pItem, &Key );
   EXPECT_TRUE( Key.isAccepted() );
-  EXPECT_NEAR( pItem->Controller()->Fields().distance, 7000, 1 );
+  EXPECT_NEAR( pItem->Camera().Fields().distance, 7000, 1 );
   QKeyEvent Other( QEvent::KeyPress, Qt::Key_F7, Qt::NoModifier );
   QCoreApplication::sendEvent( pItem, &Other );
   EXPECT_FALSE( Other.isAccepted() );

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <MoxelGraphics/ETracking.h>
+#include <MoxelGraphics/IManipulator.h>
 #include <MoxelGraphics/VSceneOptions.h>
 
 #include <ZEK/Selection.h>
@@ -14,7 +15,6 @@
 
 #include <functional>
 #include <memory>
-#include <mutex>
 #include <string>
 #include <vector>
 
@@ -27,6 +27,7 @@ namespace MoxelGraphics
 {
 class VMoxelScene;
 class VSceneFrame;
+struct VGesture;
 struct VPickResult;
 
 /// The QML item that shows one view of a scene and takes its input. Registered in QML as `SceneFramebufferObject`.
@@ -72,8 +73,11 @@ public:
   void SetCameraType( int i_Type );
   QString ToolTipText() const { return m_ToolTipText; }
   QPoint MousePos() const { return m_Pointer.toPoint(); }
+  /// True when a document wants the numbers, and while a camera is selected or lies under the pointer.
   bool ShowCameraNumbers() const { return m_bShowCameraNumbers; }
   void SetShowCameraNumbers( bool i_bShow );
+  /// `VCameraObject` and `VSubjectObject` of what the last frame showed. An object stays the same for as long as its
+  /// camera or subject stays in the list.
   QList< QObject* > CameraObjects() const { return m_CameraObjects; }
   QList< QObject* > SubjectObjects() const { return m_SubjectObjects; }
   bool FocusSelection() const { return false; }
@@ -83,8 +87,8 @@ public:
   void SetTracking( ETracking i_Tracking );
   QString Notice() const { return m_Notice; }
 
-  /// Where the view has a render thread of its own, read its fields from `frameReport` instead.
-  const std::shared_ptr< CoreGraphics::VCameraController >& Controller() const { return m_pController; }
+  /// The camera as the hand last left it: that of the last frame, and what was done to it since.
+  const CoreGraphics::VCameraController& Camera() const { return *m_pHandCamera; }
   /// What lies under the pointer or in the band, as of the last pick that was delivered.
   const ZEK::VSelection& Preselection() const { return m_Preselection; }
   const std::vector< std::string >& PreselectionLabels() const { return m_PreselectionLabels; }
@@ -96,8 +100,8 @@ public:
 
   /// Sets one option as a person would: the map, the record, bindings and the view follow.
   Q_INVOKABLE void setOption( const QString& i_rKey, const QVariant& i_rValue );
-  /// To be called after options were restored as a whole: announces `SceneOptionsChanged` once.
-  void OptionsRestored();
+  /// Sets all options at once and announces `SceneOptionsChanged`.
+  void SetOptions( const VSceneOptions& i_rOptions );
   /// Measures the stages of each frame with glFinish, which slows frames down. Off at first.
   Q_INVOKABLE void setReporting( bool i_bOn ) { m_bReporting = i_bOn; }
   /// Every frame asks for the next. For the next renderer that is made.
@@ -136,6 +140,8 @@ protected:
   void hoverMoveEvent( QHoverEvent* i_pEvent ) override;
   void hoverLeaveEvent( QHoverEvent* i_pEvent ) override;
 
+  bool event( QEvent* i_pEvent ) override;
+  void itemChange( ItemChange i_Change, const ItemChangeData& i_rData ) override;
   QSGNode* updatePaintNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData ) override;
 
 private:
@@ -143,6 +149,15 @@ private:
   struct VSynced;
 
   double Ratio() const;
+  void FollowWindow( QQuickWindow* i_pWindow );
+  QSGNode* MakeNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData );
+  /// Does it to the camera that the hand sees, and keeps it for the one that draws. True when it meant something.
+  bool Gesture( VGesture i_Gesture );
+  void MouseGesture( int i_Kind, const QMouseEvent& i_rEvent );
+  /// Each manipulator that is shown, in the order of asking, with its selection kind, until `i_Ask` says true.
+  bool AskManipulators( const std::function< bool( IManipulator&, std::uint32_t ) >& i_Ask ) const;
+  bool OfferPress( const QMouseEvent& i_rEvent );
+  void SelectHandles( std::uint32_t i_Kind );
   void TakeModifiers( Qt::KeyboardModifiers i_Modifiers );
   /// Asks for a frame, and for a second one that brings what the first has picked.
   void Refresh();
@@ -150,21 +165,27 @@ private:
 
   // Sync phase, on the render thread with the GUI thread held.
   void Exchange( VSceneFrame& io_rFrame );
+  void BeginFrames();
+  void PassGestures();
+  void CollectOverlay( const VSceneFrame& i_rFrame );
   void TakeResult( const VSceneFrame& i_rFrame );
   void GiveOrders( VSceneFrame& io_rFrame );
   void FollowTracking();
   void Post( std::function< void() > i_Function );
 
-  /// GUI thread, a later turn: what a pick changes.
+  /// GUI thread, a later turn: what a pick changes, and what documents draw over the view.
   void ApplyPick( const VPickResult& i_rResult );
+  void ApplyOverlay();
   void Preselect( const ZEK::VSelection& i_rSelection, const std::vector< std::string >& i_rLabels );
 
   std::shared_ptr< VMoxelScene > m_pScene;
   QPointer< QObject > m_pCameraGrid;
+  QMetaObject::Connection m_BeforeMeeting;
+  IManipulatorSource* m_pManipulatorSource = nullptr; ///< the scene, when it is one
+  VManipulators m_Manipulators;
+  /// Draws, and is touched by this side only while the renderer is met.
   std::shared_ptr< CoreGraphics::VCameraController > m_pController;
-  /// Gestures come on the GUI thread and frames on the render thread. Held for a step of either; where the two
-  /// threads are one it is never contended.
-  std::shared_ptr< std::mutex > m_pCameraGuard;
+  std::unique_ptr< CoreGraphics::VCameraController > m_pHandCamera;
   QQmlPropertyMap* m_pOptionsMap = nullptr;
   VSceneOptions m_Options;
   QString m_PreviewCamera;
@@ -172,6 +193,7 @@ private:
   QString m_Notice;
   QList< QObject* > m_CameraObjects;
   QList< QObject* > m_SubjectObjects;
+  bool m_bWantsCameraNumbers = false;
   bool m_bShowCameraNumbers = false;
   bool m_bContinuous = false;
   bool m_bReporting = false;
