@@ -64,6 +64,15 @@ public:
   }
   void PutRaw( const void* i_pBytes, std::size_t i_Size ) { m_rBytes.Append( i_pBytes, i_Size ); }
 
+  std::size_t Size() const { return m_rBytes.Size(); }
+  /// Sets a count that was put at `i_Position` before it was known.
+  void SetCount( std::size_t i_Position, std::size_t i_Count )
+  {
+    VValueBytes Count;
+    VByteWriter( Count ).PutCount( i_Count );
+    std::memcpy( m_rBytes.Data() + i_Position, Count.Data(), Count.Size() );
+  }
+
 private:
   VValueBytes& m_rBytes;
 };

@@ -48,7 +48,8 @@ public:
   std::string_view LeafView() const { return std::string_view( m_Text ).substr( m_Leaf ); }
 
   /// Makes this the path of the child `i_Name` of `i_rParent`, which may be this path: a `/` stands between them
-  /// unless the parent is the root. Hashes the added bytes only and keeps the text's memory.
+  /// unless the parent is the root. Hashes the added bytes only and keeps the text's memory. The name may not lie in
+  /// this path.
   ZEK_API void AssignChild( const VEntryPath& i_rParent, std::string_view i_Name );
 
   friend bool operator==( const VEntryPath& i_rA, const VEntryPath& i_rB )
