@@ -53,10 +53,11 @@ void VUnlabelledPoints::Clear()
   Points.clear();
   Reconstruction.clear();
   Ids.clear();
+  Residuals.clear();
 }
 
 bool VLabelledPoints::Add( const CoreMoxelTypes::VReconstructionLabelSet::L& i_rLabel,
-                           const MoxelGraphics::VScenePoint& i_rPoint )
+                           const MoxelGraphics::VScenePoint& i_rPoint, float i_Residual )
 {
   const auto It = std::find_if( Subjects.begin(), Subjects.end(),
                                 [&]( const VLabellingSubject& i_rSubject )
@@ -78,6 +79,7 @@ bool VLabelledPoints::Add( const CoreMoxelTypes::VReconstructionLabelSet::L& i_r
   Points.push_back( Point );
   Colours.push_back( bColours ? It->pApplicationData->MarkerColours[i_rLabel.MarkerId]
                               : Palette[Index % Palette.size()] );
+  Residuals.push_back( i_Residual );
   Members.push_back( { Index, i_rLabel.MarkerId } );
   return true;
 }
@@ -125,6 +127,7 @@ void VLabelledPoints::ClearPoints()
 {
   Points.clear();
   Colours.clear();
+  Residuals.clear();
   Members.clear();
 }
 

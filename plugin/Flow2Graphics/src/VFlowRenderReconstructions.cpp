@@ -13,8 +13,8 @@ using CoreMoxelTypes::VReconstructionSet;
 using MoxelGraphics::VScenePoint;
 using ZEK::EFlowTimeMatch;
 
-/// Labelled points whose marker has no radius of its own, mm.
-constexpr float DefaultMarkerRadius = 7.0F;
+/// Of points that were recorded without one, mm.
+constexpr float UsualRadius = 7.0F;
 constexpr unsigned FlagShift = 21;
 
 bool Take( ZEK::VFlowItemRef& io_rHeld, const ZEK::IFlowState& i_rState, std::uint32_t i_Tag )
@@ -29,7 +29,8 @@ bool Take( ZEK::VFlowItemRef& io_rHeld, const ZEK::IFlowState& i_rState, std::ui
 VScenePoint PointOf( const VReconstruction& i_rReconstruction )
 {
   return { static_cast< float >( i_rReconstruction.Position.x ), static_cast< float >( i_rReconstruction.Position.y ),
-           static_cast< float >( i_rReconstruction.Position.z ), i_rReconstruction.Radius };
+           static_cast< float >( i_rReconstruction.Position.z ),
+           i_rReconstruction.Radius > 0 ? i_rReconstruction.Radius : UsualRadius };
 }
 
 /// The flags of a range's members, empty when none has any.
@@ -127,9 +128,8 @@ void VFlowRenderReconstructions::Rebuild()
         {
           continue;
         }
-        VScenePoint Point = PointOf( rItems[rLabel.Reconstruction] );
-        Point.Radius = Point.Radius > 0 ? Point.Radius : DefaultMarkerRadius;
-        m_bLabelled[rLabel.Reconstruction] = m_LabelledPoints.Add( rLabel, Point ) ? 1 : 0;
+        const VReconstruction& rItem = rItems[rLabel.Reconstruction];
+        m_bLabelled[rLabel.Reconstruction] = m_LabelledPoints.Add( rLabel, PointOf( rItem ), rItem.Residual ) ? 1 : 0;
       }
     }
     for ( std::size_t Index = 0; Index < rItems.size(); ++Index )
@@ -139,12 +139,15 @@ void VFlowRenderReconstructions::Rebuild()
         m_UnlabelledPoints.Points.push_back( PointOf( rItems[Index] ) );
         m_UnlabelledPoints.Reconstruction.push_back( static_cast< std::uint32_t >( Index ) );
         m_UnlabelledPoints.Ids.push_back( rItems[Index].Id );
+        m_UnlabelledPoints.Residuals.push_back( rItems[Index].Residual );
       }
     }
   }
   SetReconstructions( m_UnlabelledPoints.Points );
+  SetResiduals( m_UnlabelledPoints.Residuals );
   SetLabelled( m_LabelledPoints.Points );
   SetLabelledColours( m_LabelledPoints.Colours );
+  SetLabelledResiduals( m_LabelledPoints.Residuals );
 }
 
 void VFlowRenderReconstructions::GiveIds()

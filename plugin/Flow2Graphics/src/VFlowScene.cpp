@@ -1,6 +1,10 @@
 #include <Flow2Graphics/VFlowScene.h>
 
+#include "StateUpAxis.h"
+
 #include <Flow2Graphics/VFlowRenderFloorGrid.h>
+#include <Flow2Graphics/VFlowRenderForcePlates.h>
+#include <Flow2Graphics/VFlowRenderReconstructionVolume.h>
 #include <Flow2Graphics/VFlowRenderReconstructions.h>
 
 #include <CoreMoxelTypes/FlowTypes.h>
@@ -9,11 +13,6 @@
 
 namespace Flow2Graphics
 {
-namespace
-{
-constexpr std::uint32_t UpIsY = 1;
-}
-
 VFlowScene::~VFlowScene() = default;
 
 void VFlowScene::Initialise( CoreGraphics::VRenderContext& io_rContext )
@@ -31,12 +30,14 @@ void VFlowScene::CreateRenderTypes()
   // The order of the lines is the order of drawing and of updating: the floor lies under everything that follows, and
   // the gizmo is drawn over it.
   const auto pFloor = std::make_shared< VFlowRenderFloorGrid >( Resources() );
+  const auto pPlates = std::make_shared< VFlowRenderForcePlates >( *this );
   const auto pReconstructions = std::make_shared< VFlowRenderReconstructions >( *this );
+  const auto pVolume = std::make_shared< VFlowRenderReconstructionVolume >( Resources() );
   const auto pAxis = std::make_shared< MoxelGraphics::VRenderAxis >( Resources() );
 
   m_PostList = { std::make_shared< MoxelGraphics::VRenderOutlines >( *this ) };
-  m_RenderList = { pFloor, pReconstructions, pAxis };
-  m_FlowRenderTypes = { pFloor, pReconstructions };
+  m_RenderList = { pFloor, pPlates, pReconstructions, pVolume, pAxis };
+  m_FlowRenderTypes = { pFloor, pPlates, pReconstructions, pVolume };
 }
 
 bool VFlowScene::ProcessPending()
@@ -67,12 +68,7 @@ void VFlowScene::UpdateFromState( const ZEK::IFlowState& i_rState, const VSubjec
   {
     rpType->UpdateFromState( i_rState, i_rChanges );
   }
-  ZEK::VFlowItemRef Axis;
-  i_rState.FindItem( Axis, ZEK::FlowTag< CoreMoxelTypes::FlowWorldAxis >, ZEK::EFlowTimeMatch::Overlap );
-  if ( const auto* const pAxis = ZEK::FlowPayload< CoreMoxelTypes::VWorldAxis >( Axis.Get() ) )
-  {
-    SetYUp( pAxis->Up == UpIsY );
-  }
+  SetYUp( IsYUp( i_rState, YUp() ) );
   emit Updated();
 }
 

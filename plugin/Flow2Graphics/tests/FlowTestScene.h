@@ -2,6 +2,8 @@
 
 #include <CoreMoxelTypes/FlowTypes.h>
 #include <Flow2Graphics/VFlowRenderFloorGrid.h>
+#include <Flow2Graphics/VFlowRenderForcePlates.h>
+#include <Flow2Graphics/VFlowRenderReconstructionVolume.h>
 #include <Flow2Graphics/VFlowRenderReconstructions.h>
 #include <Flow2Graphics/VFlowScene.h>
 #include <HostFlow/VFlowFramework.h>
@@ -72,7 +74,15 @@ public:
   }
   Flow2Graphics::VFlowRenderReconstructions& Reconstructions()
   {
-    return dynamic_cast< Flow2Graphics::VFlowRenderReconstructions& >( *FlowRenderTypes().at( 1 ) );
+    return dynamic_cast< Flow2Graphics::VFlowRenderReconstructions& >( *FlowRenderTypes().at( 2 ) );
+  }
+  Flow2Graphics::VFlowRenderForcePlates& Plates()
+  {
+    return dynamic_cast< Flow2Graphics::VFlowRenderForcePlates& >( *FlowRenderTypes().at( 1 ) );
+  }
+  Flow2Graphics::VFlowRenderReconstructionVolume& Volume()
+  {
+    return dynamic_cast< Flow2Graphics::VFlowRenderReconstructionVolume& >( *FlowRenderTypes().at( 3 ) );
   }
 
   ZEK::VFlowStateRef State;

@@ -10,8 +10,11 @@ TEST( VFlowScene, RenderTypesAreMadeOnceInTheirOrder )
   const auto Before = Scene.FlowRenderTypes();
   Scene.CreateRenderTypes();
   EXPECT_EQ( Scene.FlowRenderTypes(), Before );
-  EXPECT_NE( dynamic_cast< Flow2Graphics::VFlowRenderFloorGrid* >( Before.at( 0 ).get() ), nullptr );
-  EXPECT_NE( dynamic_cast< Flow2Graphics::VFlowRenderReconstructions* >( Before.at( 1 ).get() ), nullptr );
+  ASSERT_EQ( Before.size(), 4u );
+  EXPECT_NE( dynamic_cast< Flow2Graphics::VFlowRenderFloorGrid* >( Before[0].get() ), nullptr );
+  EXPECT_NE( dynamic_cast< Flow2Graphics::VFlowRenderForcePlates* >( Before[1].get() ), nullptr );
+  EXPECT_NE( dynamic_cast< Flow2Graphics::VFlowRenderReconstructions* >( Before[2].get() ), nullptr );
+  EXPECT_NE( dynamic_cast< Flow2Graphics::VFlowRenderReconstructionVolume* >( Before[3].get() ), nullptr );
 }
 
 TEST( VFlowScene, WithoutAStateTheFlagStaysAndTheNextFrameAsksAgain )

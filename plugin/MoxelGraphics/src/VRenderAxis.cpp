@@ -21,12 +21,11 @@ const VVertexLayout AxisLayout( sizeof( VAxisVertex ), 0,
                                 { { EAttributePosition, 3, GL_FLOAT, false, 0 },
                                   { EAttributeColour, 4, GL_UNSIGNED_BYTE, true, 12 } } );
 
-// Leaves a margin around the longest projected axis.
-constexpr float Length = 0.85f;
+constexpr float Length = 0.8f; // of half the square's side
 constexpr VAxisVertex Vertices[] = {
-    { { 0, 0, 0 }, { 230, 70, 70, 255 } },  { { Length, 0, 0 }, { 230, 70, 70, 255 } },
-    { { 0, 0, 0 }, { 90, 200, 90, 255 } },  { { 0, Length, 0 }, { 90, 200, 90, 255 } },
-    { { 0, 0, 0 }, { 80, 140, 240, 255 } }, { { 0, 0, Length }, { 80, 140, 240, 255 } },
+    { { 0, 0, 0 }, { 230, 51, 51, 255 } },  { { Length, 0, 0 }, { 230, 51, 51, 255 } },
+    { { 0, 0, 0 }, { 51, 204, 51, 255 } },  { { 0, Length, 0 }, { 51, 204, 51, 255 } },
+    { { 0, 0, 0 }, { 77, 102, 255, 255 } }, { { 0, 0, Length }, { 77, 102, 255, 255 } },
 };
 } // namespace
 

@@ -7,6 +7,8 @@
 #include <CoreGraphics/VRenderContext.h>
 #include <CoreGraphics/VResources.h>
 
+#include <cmath>
+
 namespace MoxelGraphics
 {
 namespace
@@ -16,7 +18,9 @@ using namespace CoreGraphics;
 // A fan, and as a loop the border.
 constexpr float Corners[] = { 0, 0, 0, 1, 0, 0, 1, 1, 0, 0, 1, 0 };
 const QVector4D BorderColour( 0.5f, 0.5f, 0.5f, 1.0f );
-constexpr int CrossHalfWidth = 10; // mm
+constexpr int CrossHalfWidth = 10;  // mm
+constexpr float HalfMetre = 500.0F; // mm
+constexpr float LargestSize = 1e5F; // m
 
 QVector4D Extents( const std::array< int, 4 >& i_rExtents )
 {
@@ -55,9 +59,28 @@ VRenderFloorGrid::VRenderFloorGrid( std::shared_ptr< CoreGraphics::VResources > 
 
 VRenderFloorGrid::~VRenderFloorGrid() = default;
 
+void VRenderFloorGrid::SetExtents( const std::array< int, 4 >& i_rExtents )
+{
+  if ( i_rExtents[0] < i_rExtents[2] && i_rExtents[1] < i_rExtents[3] )
+  {
+    m_Extents = i_rExtents;
+    m_bOwnExtents = true;
+  }
+}
+
+void VRenderFloorGrid::FollowOptions( const VSceneOptions& i_rOptions )
+{
+  const float Size = i_rOptions.FloorGridSize;
+  if ( !m_bOwnExtents && Size > 0 && Size < LargestSize )
+  {
+    const int Half = static_cast< int >( std::lround( Size * HalfMetre ) );
+    m_Extents = { -Half, -Half, Half, Half };
+  }
+}
+
 void VRenderFloorGrid::SetSpacing( float i_Spacing, int i_Subdivision )
 {
-  m_Spacing = i_Spacing > 0 ? i_Spacing : m_Spacing;
+  m_Spacing = i_Spacing > 0 && std::isfinite( i_Spacing ) ? i_Spacing : m_Spacing;
   m_Subdivision = i_Subdivision > 0 ? i_Subdivision : m_Subdivision;
 }
 
@@ -70,6 +93,7 @@ void VRenderFloorGrid::Render( CoreGraphics::VRenderContext& io_rContext, const 
   {
     return;
   }
+  FollowOptions( i_rOptions );
   RenderGrid( io_rContext, bTranslucent );
   RenderBorder( io_rContext, bTranslucent );
 }

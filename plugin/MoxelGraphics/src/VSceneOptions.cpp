@@ -77,6 +77,7 @@ std::vector< VOptionField > MakeFields()
       { "Reconstructions", &O::Reconstructions },
       { "ReconstructedRadius", &O::ReconstructedRadius },
       { "ReconstructionScale", &O::ReconstructionScale },
+      { "ReconstructionResiduals", &O::ReconstructionResiduals },
       { "ContributionsType", &O::ContributionsType, ENone, EIntersection },
       { "MarkerRadius", &O::MarkerRadius },
       { "FillMethod", &O::FillMethod },

@@ -18,6 +18,7 @@ public:
   std::vector< MoxelGraphics::VScenePoint > Points;
   std::vector< std::uint32_t > Reconstruction; ///< index in the set of the frame, ascending
   std::vector< std::uint32_t > Ids;            ///< the number that the reconstruction carries
+  std::vector< float > Residuals;              ///< mm
 
   bool ResolveIndex( std::uint32_t i_Index, ZEK::VSelectionItem& o_rItem, std::string& o_rLabel ) const override;
   bool FindIndex( const ZEK::VSelectionItem& i_rItem, std::uint32_t& o_rIndex ) const override;
@@ -47,10 +48,12 @@ public:
   std::vector< VLabellingSubject > Subjects;
   std::vector< MoxelGraphics::VScenePoint > Points;
   std::vector< std::uint32_t > Colours; ///< 0xAABBGGRR
+  std::vector< float > Residuals;       ///< mm
   std::vector< VMember > Members;
 
   /// Adds a point; false when the label names no subject or no marker of this frame.
-  bool Add( const CoreMoxelTypes::VReconstructionLabelSet::L& i_rLabel, const MoxelGraphics::VScenePoint& i_rPoint );
+  bool Add( const CoreMoxelTypes::VReconstructionLabelSet::L& i_rLabel, const MoxelGraphics::VScenePoint& i_rPoint,
+            float i_Residual );
   bool ResolveIndex( std::uint32_t i_Index, ZEK::VSelectionItem& o_rItem, std::string& o_rLabel ) const override;
   bool FindIndex( const ZEK::VSelectionItem& i_rItem, std::uint32_t& o_rIndex ) const override;
   bool GetPoint( std::uint32_t i_Index, MoxelGraphics::VScenePoint& o_rPoint ) const override;

@@ -85,7 +85,8 @@ struct VSceneOptions
   bool Reconstructions = true;
   bool ReconstructedRadius = false;
   float ReconstructionScale = 1.0f;
-  int ContributionsType = ENone; ///< ECentroidAssignments
+  bool ReconstructionResiduals = false; ///< points are coloured by their residual
+  int ContributionsType = ENone;        ///< ECentroidAssignments
   bool MarkerRadius = true;
   bool FillMethod = true;
   bool MarkerTrails = false;
