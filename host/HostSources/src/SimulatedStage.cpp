@@ -1,5 +1,7 @@
 #include "SimulatedStage.h"
 
+#include <CoreMoxelTypes/Parameters.h>
+
 #include <algorithm>
 #include <iterator>
 #include <limits>
@@ -168,6 +170,17 @@ void FillPlate( std::size_t i_Plate, VDevice& o_rDevice )
   for ( std::size_t Corner = 0; Corner < 4; ++Corner )
   {
     o_rDevice.Corners[Corner] = Middle + D3{ Signs[Corner][0], Signs[Corner][1], 0 } * PlateHalf;
+  }
+}
+
+void FillVolume( VParametersItem& o_rParameters )
+{
+  constexpr double Half = FloorHalf - 200, Height = 2400;
+  constexpr double Corners[] = { -Half, -Half, 0, Half, Half, Height };
+  o_rParameters.Target = ReconstructionTarget;
+  for ( std::size_t Index = 0; Index < ReconstructionVolumeNames.size(); ++Index )
+  {
+    o_rParameters.Values[ReconstructionVolumeNames[Index]] = Corners[Index];
   }
 }
 

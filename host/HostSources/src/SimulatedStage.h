@@ -27,6 +27,9 @@ void FillSubject( std::uint32_t i_Performer, CoreMoxelTypes::VSubject& o_rSubjec
 void FillColours( std::uint32_t i_Performer, CoreMoxelTypes::VSubjectApplicationData& o_rData );
 void FillPlate( std::size_t i_Plate, CoreMoxelTypes::VDevice& o_rDevice );
 
+/// What the parameters of the reconstruction say: people and objects, and no more.
+void FillVolume( CoreMoxelTypes::VParametersItem& o_rParameters );
+
 /// The prop turns on its stand, the wand is waved, both in corners that nobody crosses.
 void PoseObjects( double i_Seconds, std::array< D3, ObjectMarkers >& o_rMarkers );
 

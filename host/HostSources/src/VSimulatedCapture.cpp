@@ -3,6 +3,7 @@
 #include "SimulatedStage.h"
 
 #include <CoreMoxelTypes/FlowTypes.h>
+#include <CoreMoxelTypes/Parameters.h>
 
 #include <algorithm>
 #include <cmath>
@@ -170,6 +171,7 @@ void VSimulatedCapture::VImpl::MakeSlowItems( const VStateMaker& i_rMaker )
                                       constexpr auto Half = static_cast< i32 >( FloorHalf );
                                       o_rValue = { -Half, -Half, Half, Half, 0, 0 };
                                     } );
+  MakeSlow< FlowParametersItem >( i_rMaker, EFlowNameTarget, ReconstructionTarget, FillVolume );
   bSlowMade = Failure.IsOk();
 }
 

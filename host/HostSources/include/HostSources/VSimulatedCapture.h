@@ -29,11 +29,11 @@ struct VSimulatedCaptureOptions
 ///
 /// Each state holds: 0x1000 and 0x100a of each camera (names "Camera 1", ... under the device selector); 0x1012 and
 /// 0x1013 of each performer (names "Ada", "Ben", ... under the object selector); 0x1023 and 0x1025 of the two plates
-/// "Plate 1" and "Plate 2"; 0x1029; 0x1031; 0x100d and 0x100f. A label's `SubjectId` is `VSubject::Id`, its `MarkerId`
-/// the index into `VSubject::Markers`, which is also `VMarker::Id`. Prop, wand and extra points have no label.
-/// 0x1025 holds the samples of the frame's own time, at a whole multiple of the rate near 1000 Hz; the moment is about
-/// the middle of the plate. All but 0x100d and 0x1025 are the same objects in every state; 0x100f is while no label
-/// comes or goes.
+/// "Plate 1" and "Plate 2"; 0x1 with the reconstruction's volume; 0x1029; 0x1031; 0x100d and 0x100f. A label's
+/// `SubjectId` is `VSubject::Id`, its `MarkerId` the index into `VSubject::Markers`, which is also `VMarker::Id`. Prop,
+/// wand and extra points have no label. 0x1025 holds the samples of the frame's own time, at a whole multiple of the
+/// rate near 1000 Hz; the moment is about the middle of the plate. All but 0x100d and 0x1025 are the same objects in
+/// every state; 0x100f is while no label comes or goes.
 class VSimulatedCapture final : public IFrameSource
 {
 public:
