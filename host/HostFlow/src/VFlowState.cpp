@@ -65,16 +65,20 @@ void VFlowState::Release() const
 
 void VFlowState::Recycle()
 {
-  for ( const VFlowEntry& rEntry : m_Entries )
+  if ( m_pBuilder )
   {
-    rEntry.pItem->Release();
+    // The references are the builder's, even where a lack of memory left copies of its entries behind.
+    VStateBuilder::GiveBack( std::move( m_pBuilder ) );
+  }
+  else
+  {
+    for ( const VFlowEntry& rEntry : m_Entries )
+    {
+      rEntry.pItem->Release();
+    }
   }
   m_Entries.clear();
   m_Tags.clear();
-  if ( m_pBuilder )
-  {
-    VStateBuilder::GiveBack( std::move( m_pBuilder ) );
-  }
   m_Count = 0;
   m_bFrozen.store( false, std::memory_order_relaxed );
   m_bSettled.store( true, std::memory_order_relaxed );

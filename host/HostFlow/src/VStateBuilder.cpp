@@ -161,6 +161,9 @@ VStateBuilder::VSlot& VStateBuilder::FindSlot( std::uint32_t i_Hash, const ZEK::
 void VStateBuilder::Grow()
 {
   std::vector< VSlot > Old( std::max< std::size_t >( m_Table.size() * 2, 256 ) );
+  // Never more than half full, so that adding itself cannot fail between the two lists.
+  m_Entries.reserve( Old.size() / 2 );
+  m_TagOf.reserve( Old.size() / 2 );
   Old.swap( m_Table );
   const std::size_t Mask = m_Table.size() - 1;
   for ( const VSlot& rSlot : Old )

@@ -4,88 +4,77 @@
 
 #include <CoreMoxelTypes/FlowTypes.h>
 
+#include <tuple>
 #include <utility>
-#include <vector>
 
 namespace HostFlow
 {
 
-/// Gives every field its first value; the vectors named keep their room.
-template < typename T, typename... TMembers >
-void ResetKeeping( T& io_rPayload, std::vector< TMembers > T::*... i_pMembers )
-{
-  T Fresh;
-  ( ( ( io_rPayload.*i_pMembers ).clear(), std::swap( Fresh.*i_pMembers, io_rPayload.*i_pMembers ) ), ... );
-  io_rPayload = std::move( Fresh );
-}
+/// The vectors of a frequent payload, which keep their room from one use to the next.
+template < typename T >
+inline constexpr auto KeptVectors = std::tuple();
 
+template <>
+inline constexpr auto
+    KeptVectors< CoreMoxelTypes::VCentroidSet > = std::tuple( &CoreMoxelTypes::VCentroidSet::Centroids );
+template <>
+inline constexpr auto
+    KeptVectors< CoreMoxelTypes::VCentroidLabelSet > = std::tuple( &CoreMoxelTypes::VCentroidLabelSet::Labels );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VCentroidAssignmentSet > =
+    std::tuple( &CoreMoxelTypes::VCentroidAssignmentSet::Reconstruction );
+template <>
+inline constexpr auto
+    KeptVectors< CoreMoxelTypes::VGreyscaleBlobSet > = std::tuple( &CoreMoxelTypes::VGreyscaleBlobSet::Blobs,
+                                                                   &CoreMoxelTypes::VGreyscaleBlobSet::Lines,
+                                                                   &CoreMoxelTypes::VGreyscaleBlobSet::Pixels );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VEdgePairSet > = std::tuple( &CoreMoxelTypes::VEdgePairSet::Pairs );
+template <>
+inline constexpr auto
+    KeptVectors< CoreMoxelTypes::VCameraWand2d > = std::tuple( &CoreMoxelTypes::VCameraWand2d::Points );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VAudioFrame > = std::tuple( &CoreMoxelTypes::VAudioFrame::Samples );
+template <>
+inline constexpr auto
+    KeptVectors< CoreMoxelTypes::VReconstructionSet > = std::tuple( &CoreMoxelTypes::VReconstructionSet::Items );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VReconstructionLabelSet > =
+    std::tuple( &CoreMoxelTypes::VReconstructionLabelSet::Labels );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VReconstructionTrackSet > =
+    std::tuple( &CoreMoxelTypes::VReconstructionTrackSet::Tracks );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VSubjectDynamicParameters > = std::tuple(
+    &CoreMoxelTypes::VSubjectDynamicParameters::JointState, &CoreMoxelTypes::VSubjectDynamicParameters::Segments,
+    &CoreMoxelTypes::VSubjectDynamicParameters::MarkerPositions,
+    &CoreMoxelTypes::VSubjectDynamicParameters::MarkerVisible,
+    &CoreMoxelTypes::VSubjectDynamicParameters::SegmentHealth );
+template <>
+inline constexpr auto
+    KeptVectors< CoreMoxelTypes::VLabelledRotationSet > = std::tuple( &CoreMoxelTypes::VLabelledRotationSet::Items );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VRigidObjectDynamicParameters > =
+    std::tuple( &CoreMoxelTypes::VRigidObjectDynamicParameters::MarkerVisible );
+template <>
+inline constexpr auto
+    KeptVectors< CoreMoxelTypes::VDeviceSamples > = std::tuple( &CoreMoxelTypes::VDeviceSamples::Wrench );
+template <>
+inline constexpr auto KeptVectors< CoreMoxelTypes::VSceneMeshDynamicParameters > =
+    std::tuple( &CoreMoxelTypes::VSceneMeshDynamicParameters::Bones );
+
+/// Gives every field its first value.
 template < typename T >
 void ResetPayloadOf( T& io_rPayload )
 {
-  io_rPayload = T();
-}
-
-inline void ResetPayloadOf( CoreMoxelTypes::VCentroidSet& io_rPayload )
-{
-  io_rPayload.Centroids.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VCentroidLabelSet& io_rPayload )
-{
-  io_rPayload.Labels.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VCentroidAssignmentSet& io_rPayload )
-{
-  io_rPayload.Reconstruction.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VGreyscaleBlobSet& io_rPayload )
-{
-  using T = CoreMoxelTypes::VGreyscaleBlobSet;
-  ResetKeeping( io_rPayload, &T::Blobs, &T::Lines, &T::Pixels );
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VEdgePairSet& io_rPayload )
-{
-  ResetKeeping( io_rPayload, &CoreMoxelTypes::VEdgePairSet::Pairs );
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VCameraWand2d& io_rPayload )
-{
-  io_rPayload.Points.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VAudioFrame& io_rPayload )
-{
-  ResetKeeping( io_rPayload, &CoreMoxelTypes::VAudioFrame::Samples );
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VReconstructionSet& io_rPayload )
-{
-  io_rPayload.Items.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VReconstructionLabelSet& io_rPayload )
-{
-  io_rPayload.Labels.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VReconstructionTrackSet& io_rPayload )
-{
-  io_rPayload.Tracks.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VSubjectDynamicParameters& io_rPayload )
-{
-  using T = CoreMoxelTypes::VSubjectDynamicParameters;
-  ResetKeeping( io_rPayload, &T::JointState, &T::Segments, &T::MarkerPositions, &T::MarkerVisible, &T::SegmentHealth );
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VLabelledRotationSet& io_rPayload )
-{
-  io_rPayload.Items.clear();
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VRigidObjectDynamicParameters& io_rPayload )
-{
-  ResetKeeping( io_rPayload, &CoreMoxelTypes::VRigidObjectDynamicParameters::MarkerVisible );
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VDeviceSamples& io_rPayload )
-{
-  ResetKeeping( io_rPayload, &CoreMoxelTypes::VDeviceSamples::Wrench );
-}
-inline void ResetPayloadOf( CoreMoxelTypes::VSceneMeshDynamicParameters& io_rPayload )
-{
-  ResetKeeping( io_rPayload, &CoreMoxelTypes::VSceneMeshDynamicParameters::Bones );
+  T Fresh;
+  std::apply(
+      [&]( auto... i_pVectors )
+      {
+        ( ( ( io_rPayload.*i_pVectors ).clear(), std::swap( Fresh.*i_pVectors, io_rPayload.*i_pVectors ) ), ... );
+      },
+      KeptVectors< T > );
+  io_rPayload = std::move( Fresh );
 }
 
 template < typename T >

@@ -4,9 +4,10 @@
 
 #include <HostServices/VHost.h>
 
-#include <QtCore/QPointer>
 #include <QtQml/QQmlEngine>
 #include <QtQml/qqml.h>
+
+#include <mutex>
 
 namespace HostQml
 {
@@ -35,8 +36,8 @@ void RegisterTypes()
 
 void RegisterModules( HostServices::VHost& i_rHost )
 {
-  static const bool bRegistered = ( RegisterTypes(), true );
-  (void)bRegistered;
+  static std::once_flag Registered;
+  std::call_once( Registered, RegisterTypes );
   QQmlEngine* pEngine = i_rHost.Quick()->Engine();
   if ( !pEngine || VServices::Of( pEngine ) )
   {
@@ -60,23 +61,17 @@ VPlaybackQml::VPlaybackQml( VServices* i_pServices )
   {
     return;
   }
-  const QPointer< VPlaybackQml > pGuard( this );
+  // What is delivered after the connections went finds them gone, and both go and deliver on this thread.
   m_TickConnection = m_pClock->Changed().Connect(
-      [pGuard]
+      [this]
       {
-        if ( pGuard )
-        {
-          emit pGuard->tickChanged();
-        }
+        emit tickChanged();
       },
       i_pServices->pPostal );
   m_StateConnection = m_pClock->StateChanged().Connect(
-      [pGuard]
+      [this]
       {
-        if ( pGuard )
-        {
-          emit pGuard->stateChanged();
-        }
+        emit stateChanged();
       },
       i_pServices->pPostal );
 }
@@ -129,14 +124,10 @@ VSelectionQml::VSelectionQml( VServices* i_pServices )
   {
     return;
   }
-  const QPointer< VSelectionQml > pGuard( this );
   m_Connection = m_pSelection->ForKinds( {} )->Connect(
-      [pGuard]
+      [this]
       {
-        if ( pGuard )
-        {
-          emit pGuard->selectionChanged();
-        }
+        emit selectionChanged();
       },
       i_pServices->pPostal );
 }

@@ -33,6 +33,12 @@ std::filesystem::path Root( std::filesystem::path i_Given )
   // A separator at the end would make equal folders differ.
   return Normal.has_filename() || Normal == Normal.root_path() ? Normal : Normal.parent_path();
 }
+
+/// With a mark in the place of bytes that are no UTF-8, where the path's own conversion would throw.
+std::wstring Wide( const std::filesystem::path& i_rPath )
+{
+  return QString::fromStdString( i_rPath.string() ).toStdWString();
+}
 } // namespace
 
 VPaths::VPaths( std::filesystem::path i_ContentRoot, std::filesystem::path i_UserRoot )
@@ -45,21 +51,28 @@ std::vector< std::wstring >& VPaths::FoldersOfKind( std::vector< std::wstring >&
                                                     std::uint32_t i_KindMask ) const
 {
   o_rFolders.clear();
+  const auto Add = [&]( const std::filesystem::path& i_rFolder )
+  {
+    MakeFolder( i_rFolder );
+    o_rFolders.push_back( Wide( i_rFolder ) );
+  };
   for ( const VKindFolder& rKind : KindFolders )
   {
-    if ( !( i_KindMask & rKind.Kind ) )
+    if ( i_KindMask & rKind.Kind )
     {
-      continue;
-    }
-    MakeFolder( m_ContentRoot / rKind.pName );
-    o_rFolders.push_back( ( m_ContentRoot / rKind.pName ).wstring() );
-    if ( m_UserRoot != m_ContentRoot )
-    {
-      MakeFolder( m_UserRoot / rKind.pName );
-      o_rFolders.push_back( ( m_UserRoot / rKind.pName ).wstring() );
+      Add( m_ContentRoot / rKind.pName );
+      if ( m_UserRoot != m_ContentRoot )
+      {
+        Add( m_UserRoot / rKind.pName );
+      }
     }
   }
   return o_rFolders;
+}
+
+std::wstring VPaths::BaseFolder() const
+{
+  return Wide( m_ContentRoot );
 }
 
 void VPaths::MakeFolder( const std::filesystem::path& i_rFolder ) const

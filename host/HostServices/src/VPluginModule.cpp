@@ -157,7 +157,16 @@ ZEK::IResult VPluginModule::Load( const std::filesystem::path& i_rPath )
     ZEK::Log( Category(), ZEK::ELogWarning, "The plug-in module %1% has revision %2%, expected was %3%",
               rState.File.string(), Revision(), ExpectedPluginRevision );
   }
-  rState.pPlugin = rState.pCreate();
+  const ZEK::IResult Created = rState.Run( "CreatePlugin",
+                                           [&]
+                                           {
+                                             rState.pPlugin = rState.pCreate();
+                                             return true;
+                                           } );
+  if ( Created.IsError() )
+  {
+    return Created;
+  }
   if ( !rState.pPlugin )
   {
     return rState.Fail( ZEK::IResult::AllocationFailure,
@@ -234,8 +243,12 @@ ZEK::IResult VPluginModule::Destroy()
     return m_pState->OutOfTurn( "DestroyPlugin" );
   }
   m_pState->Stage = ENone;
-  m_pState->pDestroy( std::exchange( m_pState->pPlugin, nullptr ) );
-  return ZEK::IResult::Ok;
+  return m_pState->Run( "DestroyPlugin",
+                        [&]
+                        {
+                          m_pState->pDestroy( std::exchange( m_pState->pPlugin, nullptr ) );
+                          return true;
+                        } );
 }
 
 ZEK::IResult VPluginModule::UnloadCode()

@@ -97,23 +97,24 @@ struct VPostalService::VState
     std::function< void() > Function;
   };
 
-  bool TakeFront( std::uint64_t i_Last, std::function< void() >& o_rFunction )
+  /// Empty when no function up to that number is left.
+  std::function< void() > TakeFront( std::uint64_t i_Last )
   {
     const std::lock_guard Lock( Guard );
-    if ( Queue.empty() || Queue.front().Number > i_Last )
+    std::function< void() > Function;
+    if ( !Queue.empty() && Queue.front().Number <= i_Last )
     {
-      return false;
+      Function.swap( Queue.front().Function );
+      Queue.pop_front();
     }
-    o_rFunction = std::move( Queue.front().Function );
-    Queue.pop_front();
-    return true;
+    return Function;
   }
 
   /// Events of functions that `DrainForTest` has run find nothing to do; they must not run a later one early.
   void RunUpTo( std::uint64_t i_Last )
   {
-    std::function< void() > Function;
-    while ( TakeFront( i_Last, Function ) )
+    // Each is destroyed outside the lock: what it held may post.
+    while ( const std::function< void() > Function = TakeFront( i_Last ) )
     {
       Run( Function );
     }

@@ -43,7 +43,13 @@ void VPreferencesFile::Load()
   {
     return;
   }
-  if ( QFileInfo( File ).isDir() || !File.open( QIODevice::ReadOnly ) )
+  QByteArray Bytes;
+  const bool bOpen = !QFileInfo( File ).isDir() && File.open( QIODevice::ReadOnly );
+  if ( bOpen )
+  {
+    Bytes = File.readAll();
+  }
+  if ( !bOpen || File.error() != QFileDevice::NoError )
   {
     m_bUnreadable = true;
     ZEK::Log( Category(), ZEK::ELogWarning, "Cannot read preferences %1%: %2%; they are left alone, defaults hold",
@@ -51,7 +57,7 @@ void VPreferencesFile::Load()
     return;
   }
   QJsonParseError Error;
-  const QJsonDocument Document = QJsonDocument::fromJson( File.readAll(), &Error );
+  const QJsonDocument Document = QJsonDocument::fromJson( Bytes, &Error );
   File.close();
   if ( Error.error != QJsonParseError::NoError || !Document.isObject() )
   {
@@ -89,7 +95,14 @@ void VPreferencesFile::Put( const QString& i_rGroup, const QString& i_rName, con
   {
     return;
   }
-  i_rValue.isUndefined() ? Group.remove( i_rName ) : static_cast< void >( Group[i_rName] = i_rValue );
+  if ( i_rValue.isUndefined() )
+  {
+    Group.remove( i_rName );
+  }
+  else
+  {
+    Group[i_rName] = i_rValue;
+  }
   m_Root[i_rGroup] = Group;
   m_bChanged = true;
 }

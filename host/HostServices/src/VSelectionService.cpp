@@ -1,8 +1,10 @@
 #include <HostServices/VSelectionService.h>
 
+#include <algorithm>
 #include <charconv>
 #include <iterator>
 #include <set>
+#include <string_view>
 
 namespace HostServices
 {

@@ -102,8 +102,10 @@ QVariant FromJson( const QJsonValue& i_rValue, QMetaType i_Type )
   }
   if ( Type == QMetaType::Double || Type == QMetaType::Float )
   {
-    QVariant Value( i_rValue.toDouble() );
-    return i_rValue.isDouble() && Value.convert( i_Type ) ? Value : QVariant();
+    const double Number = i_rValue.toDouble();
+    const bool bFits = Type == QMetaType::Double || std::abs( Number ) <= std::numeric_limits< float >::max();
+    QVariant Value( Number );
+    return i_rValue.isDouble() && bFits && Value.convert( i_Type ) ? Value : QVariant();
   }
   if ( Type == QMetaType::QString )
   {

@@ -18,7 +18,7 @@ public:
 
   std::vector< std::wstring >& FoldersOfKind( std::vector< std::wstring >& o_rFolders,
                                               std::uint32_t i_KindMask ) const override;
-  std::wstring BaseFolder() const override { return m_ContentRoot.wstring(); }
+  std::wstring BaseFolder() const override;
 
   const std::filesystem::path& ContentRoot() const { return m_ContentRoot; }
   const std::filesystem::path& UserRoot() const { return m_UserRoot; }

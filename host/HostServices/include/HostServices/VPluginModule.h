@@ -50,7 +50,8 @@ public:
   static std::filesystem::path DefaultPath();
 
   /// `FileNotFound` for a missing file, `InvalidFormat` for one that is no library, `NotFound` when an export is
-  /// missing (`Error` names it), `AllocationFailure` when no object was made.
+  /// missing (`Error` names it), `AllocationFailure` when no object was made, `FailedWithException`
+  /// when making it threw.
   ZEK::IResult Load( const std::filesystem::path& i_rPath );
   ZEK::IResult RegisterTypes( VHost& i_rHost );
   ZEK::IResult CreateContent( VHost& i_rHost );
