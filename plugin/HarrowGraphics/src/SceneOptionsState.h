@@ -2,18 +2,21 @@
 
 #include <HarrowPluginInterface/IWorkspaceContent.h>
 
-class QQmlPropertyMap;
+namespace MoxelGraphics
+{
+struct VSceneOptions;
+}
 
 namespace HarrowGraphics
 {
 
 /// Writes every option; a key with a "-" goes into the group of what stands before it.
 void WriteOptions( HarrowPluginInterface::IStateWriter& io_rWriter, const QString& i_rGroup,
-                   const QQmlPropertyMap& i_rOptions );
+                   const MoxelGraphics::VSceneOptions& i_rOptions );
 
-/// Hands each option that is saved, and of its key's type, to `i_rSet`. One that is not is left out and logged.
+/// Reads the options that are saved over those given. A value of another type or out of its range is logged, and the
+/// option stays as it was given.
 void ReadOptions( const HarrowPluginInterface::IStateReader& i_rReader, const QString& i_rGroup,
-                  const QQmlPropertyMap& i_rOptions,
-                  const std::function< void( const QString&, const QVariant& ) >& i_rSet );
+                  MoxelGraphics::VSceneOptions& io_rOptions );
 
 } // namespace HarrowGraphics

@@ -2,7 +2,6 @@
 
 #include "SceneOptionsState.h"
 
-#include <QtQml/QQmlPropertyMap>
 #include <QtWidgets/QComboBox>
 #include <QtWidgets/QVBoxLayout>
 
@@ -51,7 +50,7 @@ void VSceneWindowContent::SaveState( HarrowPluginInterface::IStateWriter& io_rWr
 {
   if ( const auto* const pItem = m_pWidget->SceneItem() )
   {
-    WriteOptions( io_rWriter, i_rPrefix + "Options", pItem->OptionsMap() );
+    WriteOptions( io_rWriter, i_rPrefix + "Options", pItem->Options() );
   }
 }
 
@@ -62,13 +61,11 @@ void VSceneWindowContent::RestoreState( const HarrowPluginInterface::IStateReade
   {
     return;
   }
-  pItem->setOption( "CameraView", m_Kind == EWindowKindCameras );
-  pItem->setOption( "3D", m_Kind != EWindowKindCameras );
-  ReadOptions( i_rReader, i_rPrefix + "Options", pItem->OptionsMap(),
-               [pItem]( const QString& i_rKey, const QVariant& i_rValue )
-               {
-                 pItem->setOption( i_rKey, i_rValue );
-               } );
+  MoxelGraphics::VSceneOptions Options;
+  Options.CameraView = m_Kind == EWindowKindCameras;
+  Options.Show3DOverlay = m_Kind != EWindowKindCameras;
+  ReadOptions( i_rReader, i_rPrefix + "Options", Options );
+  pItem->SetOptions( Options );
 }
 
 bool VSceneWindowContent::ExecuteCommand( const std::string& i_rText )

@@ -150,16 +150,31 @@ TEST_F( SceneWindow, OptionsSurviveSavingAndOddOnesAreLeftOut )
   ASSERT_FALSE( Options.isEmpty() );
   EXPECT_EQ( Options["PropSubject"].toObject()["Axes"], true );
   Options["Cameras"] = "not a bool";
+  Options["ContributionsType"] = 99;
+  Options["FloorGridSize"] = QJsonValue();
   Options.remove( "GlobalAxis" );
+  Options.remove( "SolvingSubject" );
+  Options["Stranger"] = 5;
   Saved["ViewOptions"] = Options;
   const auto pContent = Open();
+  auto* const pItem = pContent->SceneWidget().SceneItem();
+  for ( const char* pKey : { "GlobalAxis", "Cameras" } )
+  {
+    pItem->setOption( pKey, false );
+  }
+  pItem->setOption( "SolvingSubject-Axes", true );
+  pItem->setOption( "ContributionsType", 2 );
+  pItem->setOption( "CameraView", true );
   pContent->RestoreState( HostServices::VStateJsonReader( Saved ), "View" );
-  const MoxelGraphics::VSceneOptions& rOptions = pContent->SceneWidget().SceneItem()->Options();
-  EXPECT_FALSE( rOptions.FloorGrid );
-  EXPECT_TRUE( rOptions.PropSubject.Axes );
-  EXPECT_FLOAT_EQ( rOptions.ReconstructionScale, 2.5F );
-  EXPECT_TRUE( rOptions.Cameras ) << "a value of the wrong type is left out";
-  EXPECT_TRUE( rOptions.GlobalAxis ) << "a missing value keeps its default";
+  MoxelGraphics::VSceneOptions Expected;
+  Expected.FloorGrid = false;
+  Expected.PropSubject.Axes = true;
+  Expected.ReconstructionScale = 2.5F;
+  Expected.BackgroundColorRGB = Options["BackgroundColorRGB"].toInt();
+  EXPECT_TRUE( pItem->Options() == Expected ) << "what the state lacks or spoils is as in a new view, whatever it was";
+  EXPECT_FALSE( pItem->OptionsMap().value( "CameraView" ).toBool() );
+  EXPECT_EQ( TestSupport::LogTexts( "HarrowGraphics", 3 ).size(), 3u );
+  EXPECT_FALSE( pItem->OptionsMap().contains( "Stranger" ) );
 }
 
 TEST( VQMLSceneWidget, OnlyASingleLocalMeshFileCanBeDropped )

@@ -60,11 +60,9 @@ std::unique_ptr< QOpenGLFramebufferObject > VSceneFrame::MakeTarget( QSize i_Siz
 }
 
 VSceneFrame::VSceneFrame( std::shared_ptr< VMoxelScene > i_pScene,
-                          std::shared_ptr< CoreGraphics::VCameraController > i_pController,
-                          std::shared_ptr< std::mutex > i_pCameraGuard )
+                          std::shared_ptr< CoreGraphics::VCameraController > i_pController )
   : m_pScene( std::move( i_pScene ) )
   , m_pController( std::move( i_pController ) )
-  , m_pCameraGuard( std::move( i_pCameraGuard ) )
   , m_pContext( std::make_unique< CoreGraphics::VRenderContext >() )
 {
 }
@@ -84,10 +82,7 @@ VSceneFrame::~VSceneFrame()
 
 void VSceneFrame::Resize( QSize i_Size )
 {
-  {
-    const auto Lock = LockCamera();
-    m_pController->SetSize( i_Size );
-  }
+  m_pController->SetSize( i_Size );
   m_Size = i_Size;
   m_pSelectionTarget.reset();
   m_pOutlineTarget.reset();
@@ -188,11 +183,6 @@ void VSceneFrame::Begin()
   m_pContext->SetPixelRatio( m_Input.PixelRatio );
 }
 
-std::unique_lock< std::mutex > VSceneFrame::LockCamera() const
-{
-  return m_pCameraGuard ? std::unique_lock( *m_pCameraGuard ) : std::unique_lock< std::mutex >();
-}
-
 void VSceneFrame::CollectPoints( const ZEK::VSelection& i_rSelection )
 {
   m_Points.clear();
@@ -219,7 +209,6 @@ void VSceneFrame::UpdateCamera()
   {
     CollectPoints( m_pScene->GetSelection() );
   }
-  const auto Lock = LockCamera();
   m_pController->SetYUp( m_pScene->YUp() );
   m_pController->SetFocusPoints( m_Points, bFit );
   if ( bPose )

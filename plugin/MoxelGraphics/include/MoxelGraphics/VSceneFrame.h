@@ -16,7 +16,6 @@
 
 #include <cstdint>
 #include <memory>
-#include <mutex>
 #include <string>
 #include <vector>
 
@@ -78,10 +77,8 @@ struct VFrameFigures
 class VSceneFrame
 {
 public:
-  /// `i_pCameraGuard` is held while the camera is stepped; null where its events come on the same thread.
   VSceneFrame( std::shared_ptr< VMoxelScene > i_pScene,
-               std::shared_ptr< CoreGraphics::VCameraController > i_pController,
-               std::shared_ptr< std::mutex > i_pCameraGuard = nullptr );
+               std::shared_ptr< CoreGraphics::VCameraController > i_pController );
   ~VSceneFrame();
 
   /// A target for `Render` as the views have it: with depth, multisampled in a free view on desktop OpenGL where
@@ -116,7 +113,6 @@ private:
   void ReadGl( const QOpenGLFramebufferObject& i_rTarget );
   void UpdateCamera();
   void CollectPoints( const ZEK::VSelection& i_rSelection );
-  std::unique_lock< std::mutex > LockCamera() const;
   void SelectAndHighlight();
   bool IsBand() const;
   void PickPoint();
@@ -130,7 +126,6 @@ private:
 
   std::shared_ptr< VMoxelScene > m_pScene;
   std::shared_ptr< CoreGraphics::VCameraController > m_pController;
-  std::shared_ptr< std::mutex > m_pCameraGuard;
   std::unique_ptr< CoreGraphics::VRenderContext > m_pContext;
   std::unique_ptr< QOpenGLFramebufferObject > m_pSelectionTarget;
   std::unique_ptr< QOpenGLFramebufferObject > m_pOutlineTarget;
