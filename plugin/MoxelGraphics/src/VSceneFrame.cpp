@@ -96,6 +96,13 @@ void VSceneFrame::Resize( QSize i_Size )
       std::make_unique< QOpenGLFramebufferObject >( i_Size, QOpenGLFramebufferObject::Depth, GL_TEXTURE_2D );
   m_pOutlineTarget =
       std::make_unique< QOpenGLFramebufferObject >( i_Size, QOpenGLFramebufferObject::NoAttachment, GL_TEXTURE_2D );
+  if ( !m_pSelectionTarget->isValid() || !m_pOutlineTarget->isValid() )
+  {
+    ZEK::Log(
+        LogCategory(), ZEK::ELogWarning,
+        "The device refuses a target of %1% by %2%: this view shows no selection, and nothing can be picked in it",
+        i_Size.width(), i_Size.height() );
+  }
 }
 
 bool VSceneFrame::Prepare()
@@ -153,7 +160,7 @@ bool VSceneFrame::Render( QOpenGLFramebufferObject& io_rTarget )
   m_Figures.UpdateMs = Lap();
   m_pScene->SetHighlighted( false );
   // A device that refuses the off-screen target costs the view its picks and highlights, not its picture.
-  if ( m_pSelectionTarget->isValid() )
+  if ( m_pSelectionTarget->isValid() && m_pOutlineTarget->isValid() )
   {
     SelectAndHighlight();
   }

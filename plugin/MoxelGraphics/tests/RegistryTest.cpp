@@ -1,5 +1,7 @@
 #include "TestScene.h"
 
+#include <TestSupport/LogGuard.h>
+
 namespace MoxelGraphics
 {
 
@@ -105,6 +107,36 @@ TEST( SelectionRegistry, WordsBearTheFlagsOfTheSetsAtReset )
   const std::uint64_t Quiet = Registry.MarksGeneration();
   Registry.Reset();
   EXPECT_EQ( Registry.MarksGeneration(), Quiet );
+}
+
+TEST( SelectionRegistry, AnIdThatLooksLikeTheCurrentItemIsToldOnce )
+{
+  const auto Told = []
+  {
+    return TestSupport::LogTexts( "MoxelGraphics", ZEK::ELogWarning ).size();
+  };
+  const auto pService = std::make_shared< VTestSelection >();
+  const ZEK::VSelectionItem Cell{ ZEK::ESelectMaskCell, "cam:1", 0, 5 };
+  pService->Set( ZEK::ISelectionService::EPrimary, { Recon( 3 ), Recon( 4 ), Cell } );
+  pService->Set( ZEK::ISelectionService::ESecondary, { Recon( 4 ), Cell } );
+  VSelectionRegistry Registry( pService );
+  VTestPoints Points;
+  Points.Points.resize( 10 );
+  const std::size_t Before = Told();
+  const auto Frame = [&]( std::uint32_t i_Others )
+  {
+    Registry.Reset();
+    EXPECT_EQ( Registry.Allocate( { ZEK::ESelectCamera, "cam:1", 0, 0 }, i_Others ), 1u );
+    return Registry.AllocateRange( 10, Points );
+  };
+  // The last of the ten stays below, and so does the one that bears both marks.
+  EXPECT_EQ( Frame( 0x3FFFF - 5 ) + 4, 0x3FFFFu );
+  Registry.Allocate( { ZEK::ESelectMaskCell, "cam:1", 0, 0 }, 100 );
+  EXPECT_EQ( Told(), Before );
+  EXPECT_EQ( Frame( 0x3FFFF - 4 ) + 4, 0x40000u );
+  EXPECT_EQ( Told(), Before + 1 );
+  Frame( 0x3FFFF );
+  EXPECT_EQ( Told(), Before + 1 );
 }
 
 TEST( SelectionRegistry, PlacesAreFoundByItem )

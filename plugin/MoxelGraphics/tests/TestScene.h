@@ -3,6 +3,7 @@
 #include <MoxelGraphics/VMoxelScene.h>
 #include <MoxelGraphics/VRenderAxis.h>
 #include <MoxelGraphics/VRenderFloorGrid.h>
+#include <MoxelGraphics/VRenderOutlines.h>
 #include <MoxelGraphics/VRenderReconstructions.h>
 #include <MoxelGraphics/VSceneFrame.h>
 #include <MoxelGraphics/VSceneOptions.h>
@@ -186,6 +187,8 @@ public:
       pFloor = std::make_shared< VRenderFloorGrid >( Resources() );
       pRecons = std::make_shared< VRenderReconstructions >( *this );
       m_RenderList = { pFloor, pRecons, pPixels, pCorner, std::make_shared< VRenderAxis >( Resources() ) };
+      pOutlines = std::make_shared< VRenderOutlines >( *this );
+      m_PostList.push_back( pOutlines );
     }
   }
   bool ProcessPending() override
@@ -231,7 +234,9 @@ public:
   std::shared_ptr< VTestPixels > pPixels;
   std::shared_ptr< VRenderFloorGrid > pFloor;
   std::shared_ptr< VRenderReconstructions > pRecons;
+  std::shared_ptr< VRenderOutlines > pOutlines;
   VTestPoints Resolver;
+  std::function< void() > BeforePoints; ///< runs after the registry's reset
   std::atomic< int > Initialised{ 0 };
 
 private:
@@ -244,6 +249,10 @@ private:
       pRecons->SetReconstructions( Resolver.Points );
     }
     Registry().Reset();
+    if ( BeforePoints )
+    {
+      BeforePoints();
+    }
     m_Flags.assign( Resolver.Points.size(), 0 );
     for ( const VSelectionRegistry::VMark& rMark : Registry().Marks() )
     {

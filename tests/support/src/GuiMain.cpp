@@ -1,7 +1,6 @@
+#include <HarrowPluginInterface/GraphicsSetUp.h>
 #include <TestSupport/LogGuard.h>
 
-#include <QtGui/QSurfaceFormat>
-#include <QtQuick/QQuickWindow>
 #include <QtWidgets/QApplication>
 
 #include <gtest/gtest.h>
@@ -10,14 +9,7 @@
 int main( int i_Count, char** i_ppArguments )
 {
   testing::InitGoogleTest( &i_Count, i_ppArguments );
-  QCoreApplication::setAttribute( Qt::AA_ShareOpenGLContexts );
-  QSurfaceFormat Format;
-  Format.setVersion( 4, 3 );
-  Format.setProfile( QSurfaceFormat::CoreProfile );
-  Format.setDepthBufferSize( 24 );
-  Format.setStencilBufferSize( 8 );
-  QSurfaceFormat::setDefaultFormat( Format );
-  QQuickWindow::setGraphicsApi( QSGRendererInterface::OpenGL );
+  HarrowPluginInterface::SetUpGraphics();
   QApplication Application( i_Count, i_ppArguments );
   TestSupport::InstallLogGuard();
   return RUN_ALL_TESTS();
