@@ -1,5 +1,7 @@
 #include "FlowTestItems.h"
 
+#include <TestSupport/Calls.h>
+
 #include <atomic>
 #include <thread>
 
@@ -56,13 +58,8 @@ TEST( FlowThreads, ReadersFetchAndWalkWhileOneWrites )
 {
   const auto pCache = MakeCache( 8 );
   std::atomic< bool > bDone{ false };
-  std::atomic< int > Torn{ 0 }, Backward{ 0 }, Notified{ 0 };
-  const VConnection Connection = pCache->StatesChanged().Connect(
-      [&]
-      {
-        ++Notified;
-      },
-      nullptr );
+  std::atomic< int > Torn{ 0 }, Backward{ 0 };
+  const TestSupport::VCalls Notified( pCache->StatesChanged() );
   std::vector< std::thread > Readers;
   for ( int Reader = 0; Reader < 3; ++Reader )
   {
@@ -108,7 +105,7 @@ TEST( FlowThreads, ReadersFetchAndWalkWhileOneWrites )
   }
   EXPECT_EQ( Torn, 0 );
   EXPECT_EQ( Backward, 0 );
-  EXPECT_EQ( Notified, Frames );
+  EXPECT_EQ( Notified.Count(), Frames );
   VFlowStateRef Newest;
   pCache->Fetch( Newest, 31, 2, 0 );
   EXPECT_EQ( Newest->GetKey().Frame, Frames - 1 );
@@ -117,33 +114,27 @@ TEST( FlowThreads, ReadersFetchAndWalkWhileOneWrites )
 
 TEST( FlowThreads, WritersOfTwoCachesShareThePools )
 {
-  std::vector< std::thread > Writers;
   std::atomic< int > Torn{ 0 };
-  for ( int Writer = 0; Writer < 2; ++Writer )
+  const auto WriteFrames = [&]
   {
-    Writers.emplace_back(
-        [&]
-        {
-          const auto pCache = MakeCache( 5 );
-          const VFlowStoreRef Store = MakeItemStore();
-          const VFlowItemRef Slow = NewItem< FlowVolumeProperties >();
-          VFlowStateRef State;
-          for ( std::int64_t Frame = 0; Frame < Frames / 2; ++Frame )
-          {
-            AddState( *pCache, MakeFrame( Frame, Store, Slow ) );
-            pCache->Fetch( State, 31, 0, 0 );
-            Torn += !IsWhole( *State );
-            if ( Frame % 100 == 0 )
-            {
-              pCache->Clear();
-            }
-          }
-        } );
-  }
-  for ( std::thread& rWriter : Writers )
-  {
-    rWriter.join();
-  }
+    const auto pCache = MakeCache( 5 );
+    const VFlowStoreRef Store = MakeItemStore();
+    const VFlowItemRef Slow = NewItem< FlowVolumeProperties >();
+    VFlowStateRef State;
+    for ( std::int64_t Frame = 0; Frame < Frames / 2; ++Frame )
+    {
+      AddState( *pCache, MakeFrame( Frame, Store, Slow ) );
+      pCache->Fetch( State, 31, 0, 0 );
+      Torn += !IsWhole( *State );
+      if ( Frame % 100 == 0 )
+      {
+        pCache->Clear();
+      }
+    }
+  };
+  std::thread Other( WriteFrames );
+  WriteFrames();
+  Other.join();
   EXPECT_EQ( Torn, 0 );
 }
 

@@ -1,6 +1,6 @@
 #include "FlowTestItems.h"
 
-#include <map>
+#include <TestSupport/Calls.h>
 
 using namespace ZEK;
 using namespace CoreMoxelTypes;
@@ -21,34 +21,24 @@ class VFired
 {
 public:
   explicit VFired( IFlowStateCache& i_rCache )
+    : m_Calls{ TestSupport::VCalls( i_rCache.StatesChanged() ), TestSupport::VCalls( i_rCache.Notifier2() ),
+               TestSupport::VCalls( i_rCache.Notifier3() ),     TestSupport::VCalls( i_rCache.Notifier4() ),
+               TestSupport::VCalls( i_rCache.Notifier5() ),     TestSupport::VCalls( i_rCache.Notifier6() ) }
   {
-    IMultiCallbackPostal< void() >* const Notifiers[] = { &i_rCache.StatesChanged(), &i_rCache.Notifier2(),
-                                                          &i_rCache.Notifier3(),     &i_rCache.Notifier4(),
-                                                          &i_rCache.Notifier5(),     &i_rCache.Notifier6() };
-    for ( std::size_t Index = 0; Index < std::size( Notifiers ); ++Index )
-    {
-      m_Connections.push_back( Notifiers[Index]->Connect(
-          [this, Index]
-          {
-            ++m_Log[Index];
-          },
-          nullptr ) );
-    }
   }
   /// The six counts since the last call, as text.
   std::string Take()
   {
     std::string Text;
-    for ( char& rCount : m_Log )
+    for ( TestSupport::VCalls& rCalls : m_Calls )
     {
-      Text += std::exchange( rCount, '0' );
+      Text += std::to_string( rCalls.Take() );
     }
     return Text;
   }
 
 private:
-  std::string m_Log = "000000";
-  std::vector< VConnection > m_Connections;
+  TestSupport::VCalls m_Calls[6];
 };
 
 } // namespace
