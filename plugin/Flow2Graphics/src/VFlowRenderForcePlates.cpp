@@ -15,7 +15,7 @@ using Flow2TypesUtils::ETagRequirement;
 using MoxelGraphics::VForcePlate;
 using MoxelGraphics::VPlateLoad;
 
-constexpr std::uint32_t PlateColour = 0xFF857D75;
+constexpr std::uint32_t PlateColour = 0xFF665F58;
 constexpr double UsualThickness = 50; // mm
 constexpr unsigned FlagShift = 21;
 /// Cameras and other devices share a kind: a device URN names either.

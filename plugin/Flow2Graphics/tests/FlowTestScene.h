@@ -107,6 +107,15 @@ public:
     return State;
   }
 
+  /// A device's item, named by its URN.
+  template < typename TFlow >
+  ZEK::VFlowItemRef Device( const typename ZEK::FlowValueType< TFlow >::type& i_rValue, const std::string& i_rURN )
+  {
+    const ZEK::VFlowItemRef Made = Item< TFlow >( i_rValue );
+    Made->MutableValue().SetName( ZEK::EFlowNameDevice, i_rURN );
+    return Made;
+  }
+
   template < typename TFlow >
   ZEK::VFlowItemRef Item( const typename ZEK::FlowValueType< TFlow >::type& i_rValue, const std::string& i_rName = {} )
   {
