@@ -141,6 +141,8 @@ TEST( Paths, GeneralFoldersComeFirstAndAreMade )
   EXPECT_TRUE( std::filesystem::is_directory( Folders[0] ) && std::filesystem::is_directory( Folders[1] ) );
   EXPECT_EQ( Paths.BaseFolder(), ( Folder.Path() / "content" ).wstring() );
   EXPECT_TRUE( Paths.FoldersOfKind( Folders, 0x1 ).empty() );
+  const VPaths Odd( Folder.Path() / "no\xFF\x20utf8", Folder.Path() );
+  EXPECT_EQ( Odd.FoldersOfKind( Folders, HarrowPluginInterface::EFolderProps ).size(), 2u );
   const VPaths Same( Folder.Path(), Folder.Path() / "user" / ".." );
   EXPECT_EQ( Same.FoldersOfKind( Folders, HarrowPluginInterface::EFolderSceneMeshes ).size(), 1u );
 }
@@ -148,16 +150,16 @@ TEST( Paths, GeneralFoldersComeFirstAndAreMade )
 TEST( Paths, AFolderThatCannotBeMadeIsStillListedAndReportedOnce )
 {
   const TestSupport::VTemporaryDir Folder;
-  Write( Folder.Path() / "file", "x" );
-  Write( Folder.Path() / "Props", "x" );
-  std::vector< std::wstring > Folders;
-  const VPaths Below( Folder.Path() / "file" / "content", Folder.Path() / "file" / "content" );
-  EXPECT_EQ( Below.FoldersOfKind( Folders, HarrowPluginInterface::EFolderSubjects ).size(), 1u );
-  EXPECT_EQ( Below.FoldersOfKind( Folders, HarrowPluginInterface::EFolderSubjects ).size(), 1u );
-  EXPECT_EQ( TestSupport::LogTexts( "Paths", ZEK::ELogWarning ).size(), 1u );
-  const VPaths InPlace( Folder.Path(), Folder.Path() );
-  EXPECT_EQ( InPlace.FoldersOfKind( Folders, HarrowPluginInterface::EFolderProps ).size(), 1u );
-  EXPECT_EQ( TestSupport::LogTexts( "Paths", ZEK::ELogWarning ).size(), 2u );
+  Write( Folder.Path() / "Props", "a file in the place of a folder" );
+  std::size_t Reports = 0;
+  for ( const auto& rRoot : { Folder.Path(), Folder.Path() / "Props" / "content" } )
+  {
+    const VPaths Paths( rRoot, rRoot );
+    std::vector< std::wstring > Folders;
+    EXPECT_EQ( Paths.FoldersOfKind( Folders, HarrowPluginInterface::EFolderProps ).size(), 1u );
+    EXPECT_EQ( Paths.FoldersOfKind( Folders, HarrowPluginInterface::EFolderProps ).size(), 1u );
+    EXPECT_EQ( TestSupport::LogTexts( "Paths", ZEK::ELogWarning ).size(), ++Reports );
+  }
 }
 
 TEST( WindowState, SurvivesTheFile )
@@ -200,24 +202,25 @@ TEST( WindowState, SurvivesTheFile )
 TEST( WindowState, AnotherTypeIsRefusedAndLeavesTheValue )
 {
   const auto Document = QJsonDocument::fromJson(
-      R"({ "Real": 1.5, "Negative": -1, "Big": 5000000000, "Text": "1", "Mixed": [ "a", 1 ], "Null": null, "Three": 3.0 })" );
+      R"({ "Real": 1.5, "Negative": -1, "Big": 5000000000, "Huge": 1e300, "Text": "1", "Mixed": [ "a", 1 ], "Null": null, "Three": 3.0 })" );
   const HostServices::VStateJsonReader Reader( Document.object() );
+  const std::tuple< const char*, QMetaType::Type, ZEK::IResult > Cases[] = {
+      { "Missing", QMetaType::Int, ZEK::IResult::NotFound },
+      { "Real", QMetaType::Int, ZEK::IResult::InvalidType },
+      { "Negative", QMetaType::UInt, ZEK::IResult::InvalidType },
+      { "Negative", QMetaType::ULongLong, ZEK::IResult::InvalidType },
+      { "Big", QMetaType::Int, ZEK::IResult::InvalidType },
+      { "Huge", QMetaType::Float, ZEK::IResult::InvalidType },
+      { "Text", QMetaType::Int, ZEK::IResult::InvalidType },
+      { "Real", QMetaType::Bool, ZEK::IResult::InvalidType },
+      { "Mixed", QMetaType::QStringList, ZEK::IResult::InvalidType },
+      { "Null", QMetaType::Double, ZEK::IResult::InvalidType },
+      { "Three", QMetaType::Int, ZEK::IResult::Ok } };
   QVariant Value( 17 );
-  const auto Result = [&]( const char* i_pName, QMetaType i_Type )
+  for ( const auto& [pName, Type, Result] : Cases )
   {
-    return Reader.Read( QString::fromLatin1( i_pName ), i_Type, Value );
-  };
-  constexpr auto InvalidType = ZEK::IResult::InvalidType;
-  EXPECT_EQ( Result( "Missing", QMetaType( QMetaType::Int ) ), ZEK::IResult::NotFound );
-  EXPECT_EQ( Result( "Real", QMetaType( QMetaType::Int ) ), InvalidType );
-  EXPECT_EQ( Result( "Negative", QMetaType( QMetaType::UInt ) ), InvalidType );
-  EXPECT_EQ( Result( "Negative", QMetaType( QMetaType::ULongLong ) ), InvalidType );
-  EXPECT_EQ( Result( "Big", QMetaType( QMetaType::Int ) ), InvalidType );
-  EXPECT_EQ( Result( "Text", QMetaType( QMetaType::Int ) ), InvalidType );
-  EXPECT_EQ( Result( "Real", QMetaType( QMetaType::Bool ) ), InvalidType );
-  EXPECT_EQ( Result( "Mixed", QMetaType( QMetaType::QStringList ) ), InvalidType );
-  EXPECT_EQ( Result( "Null", QMetaType( QMetaType::Double ) ), InvalidType );
-  EXPECT_EQ( Value, QVariant( 17 ) );
-  EXPECT_EQ( Result( "Three", QMetaType( QMetaType::Int ) ), ZEK::IResult::Ok );
+    EXPECT_EQ( Value, QVariant( 17 ) );
+    EXPECT_EQ( Reader.Read( QString::fromLatin1( pName ), QMetaType( Type ), Value ), Result ) << pName;
+  }
   EXPECT_EQ( Value, QVariant( 3 ) );
 }

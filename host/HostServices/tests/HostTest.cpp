@@ -1,6 +1,7 @@
 #include <HostServices/VHost.h>
 #include <HostServices/VPluginModule.h>
 
+#include <TestSupport/Calls.h>
 #include <TestSupport/LogGuard.h>
 #include <TestSupport/Paths.h>
 
@@ -77,22 +78,15 @@ TEST_F( Host, FeatureFlagsTakeProfilesAndWords )
   Each.Application().FeatureFlagSource()->GetFlags( Flags );
   EXPECT_EQ( Flags, 0x1004u );
   EXPECT_EQ( Each.Features()->ProfileName(), QStringLiteral( "custom" ) );
-  int Changes = 0;
-  const auto Connection = Each.Features()->FlagsChanged().Connect(
-      [&]
-      {
-        ++Changes;
-      },
-      nullptr );
+  TestSupport::VCalls Changes( Each.Features()->FlagsChanged() );
   EXPECT_TRUE( Each.Features()->SetFromText( QStringLiteral( "Objects" ) ).IsOk() );
   EXPECT_TRUE( Each.Features()->SetFromText( QStringLiteral( "objects" ) ).IsOk() );
   EXPECT_EQ( Each.Features()->Flags(), ( 1u << 0 ) | ( 1u << 1 ) | ( 1u << 4 ) | ( 1u << 12 ) );
-  EXPECT_EQ( Changes, 1 );
   for ( const char* pBad : { "", "0x", "0x1ffffffff", "-1", "1.5", "subject" } )
   {
     EXPECT_EQ( Each.Features()->SetFromText( QString::fromLatin1( pBad ) ), ZEK::IResult::InvalidValue ) << pBad;
   }
-  EXPECT_EQ( Changes, 1 );
+  EXPECT_EQ( Changes.Count(), 1 );
   WithFlags.FeatureFlags = QStringLiteral( "nonsense" );
   const VHost Bad( WithFlags );
   EXPECT_EQ( Bad.Features()->Flags(),
@@ -104,13 +98,7 @@ TEST_F( Host, CommandsAreFoundByTextAndReplacedByName )
 {
   VHost Each( Options() );
   auto pCommands = Each.Workspace().Commands();
-  int Changes = 0;
-  const auto Connection = Each.Commands()->Changed().Connect(
-      [&]
-      {
-        ++Changes;
-      },
-      nullptr );
+  TestSupport::VCalls Changes( Each.Commands()->Changed() );
   std::string Ran;
   const auto Run = [&]( const char* i_pText )
   {
@@ -125,7 +113,7 @@ TEST_F( Host, CommandsAreFoundByTextAndReplacedByName )
   pCommands->AddAction( { "Developer", "&Reload Shaders" }, Run( "d" ), {}, "again" );
   pCommands->AddAction( {}, Run( "x" ), {}, "" );
   pCommands->AddAction( { "Developer", "Empty" }, {}, {}, "" );
-  EXPECT_EQ( Changes, 4 );
+  EXPECT_EQ( Changes.Count(), 4 );
   EXPECT_EQ( Each.Commands()->Names(), ( QStringList{ "Workspace3d:Toggle Object Manipulator",
                                                       "Developer/Reload Shaders", "Developer/Salt & Pepper" } ) );
   EXPECT_TRUE( Each.Commands()->Execute( QStringLiteral( "Developer/Reload Shaders" ) ) );
@@ -197,8 +185,10 @@ TEST_F( Host, ServicesThatOutliveItAreHarmless )
 TEST_F( PluginModule, IsTakenThroughItsLifeInOrder )
 {
   VHost Each( Options() );
+  std::vector< std::string > Expected;
   for ( int Round = 0; Round < 3; ++Round )
   {
+    Expected.insert( Expected.end(), { "types", "content", "released", "factory gone", "destroyed" } );
     VPluginModule Plugin;
     ASSERT_TRUE( Plugin.Start( Module( "TestPlugin" ), Each ).IsOk() ) << Plugin.Error();
     EXPECT_EQ( Plugin.Revision(), HostServices::ExpectedPluginRevision );
@@ -206,11 +196,6 @@ TEST_F( PluginModule, IsTakenThroughItsLifeInOrder )
     EXPECT_EQ( Each.Factories()->Names(), std::vector< std::string >{ "Test View" } );
   }
   EXPECT_TRUE( Each.Factories()->Names().empty() );
-  std::vector< std::string > Expected;
-  for ( int Round = 0; Round < 3; ++Round )
-  {
-    Expected.insert( Expected.end(), { "types", "content", "released", "factory gone", "destroyed" } );
-  }
   EXPECT_EQ( Said(), Expected ) << "the factories go before the plug-in";
   EXPECT_TRUE( TestSupport::LogTexts( "PluginModule", ZEK::ELogWarning ).empty() );
 }
@@ -240,43 +225,59 @@ TEST_F( PluginModule, StepsOutOfTurnDoNothing )
 
 TEST_F( PluginModule, WhatIsNoPluginIsRefusedWithItsReason )
 {
-  VPluginModule Missing;
-  EXPECT_EQ( Missing.Load( m_Folder.Path() / "absent.mpm" ), ZEK::IResult::FileNotFound );
-  EXPECT_NE( Missing.Error().find( "absent.mpm" ), std::string::npos );
-  EXPECT_EQ( Missing.Load( m_Folder.Path() ), ZEK::IResult::FileNotFound ) << "a folder";
-
   const auto Text = m_Folder.Path() / "text.mpm";
   std::ofstream( Text ) << "no library at all";
-  VPluginModule NoLibrary;
-  EXPECT_EQ( NoLibrary.Load( Text ), ZEK::IResult::InvalidFormat );
-  EXPECT_NE( NoLibrary.Error().find( "text.mpm" ), std::string::npos );
-
-  VPluginModule Bare;
-  EXPECT_EQ( Bare.Load( Module( "TestPluginBare" ) ), ZEK::IResult::NotFound );
-  EXPECT_NE( Bare.Error().find( "no export CreatePlugin" ), std::string::npos ) << Bare.Error();
-  VPluginModule Partial;
-  EXPECT_EQ( Partial.Load( Module( "TestPluginNoDestroy" ) ), ZEK::IResult::NotFound );
-  EXPECT_NE( Partial.Error().find( "no export DestroyPlugin" ), std::string::npos ) << Partial.Error();
-  EXPECT_EQ( Partial.Stage(), VPluginModule::ENone );
+  struct VCase
+  {
+    std::filesystem::path File;
+    ZEK::IResult Result;
+    const char* pReason;
+  };
+  for ( const VCase& rCase :
+        { VCase{ m_Folder.Path() / "absent.mpm", ZEK::IResult::FileNotFound, "absent.mpm" },
+          { m_Folder.Path(), ZEK::IResult::FileNotFound, "There is no plug-in module" },
+          { Text, ZEK::IResult::InvalidFormat, "text.mpm" },
+          { Module( "TestPluginBare" ), ZEK::IResult::NotFound, "no export CreatePlugin" },
+          { Module( "TestPluginNoDestroy" ), ZEK::IResult::NotFound, "no export DestroyPlugin" } } )
+  {
+    VPluginModule Plugin;
+    EXPECT_EQ( Plugin.Load( rCase.File ), rCase.Result );
+    EXPECT_NE( Plugin.Error().find( rCase.pReason ), std::string::npos ) << Plugin.Error();
+    EXPECT_EQ( Plugin.Stage(), VPluginModule::ENone );
+  }
   EXPECT_TRUE( Said().empty() ) << "no plug-in was made that could not be destroyed";
 }
 
 TEST_F( PluginModule, AFaultyPluginIsReportedAndStillReleased )
 {
   VHost Each( Options() );
+  struct VCase
   {
-    VPluginModule Fails;
-    EXPECT_EQ( Fails.Start( Module( "TestPluginFails" ), Each ), ZEK::IResult::Failed );
-    EXPECT_NE( Fails.Error().find( "RegisterGraphicsTypes" ), std::string::npos );
-  }
-  EXPECT_EQ( Said(), ( std::vector< std::string >{ "types", "released", "destroyed" } ) );
+    const char* pModule;
+    ZEK::IResult Result;
+    const char* pReason;
+    std::vector< std::string > Said;
+  };
+  std::vector< std::string > All;
+  for ( const VCase& rCase :
+        { VCase{
+              "TestPluginFails", ZEK::IResult::Failed, "RegisterGraphicsTypes", { "types", "released", "destroyed" } },
+          { "TestPluginThrows",
+            ZEK::IResult::FailedWithException,
+            "CreateWorkspaceContent: no folder",
+            { "types", "content", "released", "factory gone", "destroyed" } },
+          { "TestPluginUnmade", ZEK::IResult::FailedWithException, "CreatePlugin: no memory", {} } } )
   {
-    VPluginModule Throws;
-    EXPECT_EQ( Throws.Start( Module( "TestPluginThrows" ), Each ), ZEK::IResult::FailedWithException );
-    EXPECT_NE( Throws.Error().find( "CreateWorkspaceContent: no folder" ), std::string::npos ) << Throws.Error();
+    {
+      VPluginModule Plugin;
+      EXPECT_EQ( Plugin.Start( Module( rCase.pModule ), Each ), rCase.Result );
+      EXPECT_NE( Plugin.Error().find( rCase.pReason ), std::string::npos ) << Plugin.Error();
+    }
+    All.insert( All.end(), rCase.Said.begin(), rCase.Said.end() );
+    EXPECT_EQ( Said(), All );
   }
   EXPECT_TRUE( Each.Factories()->Names().empty() );
-  // That module also has another revision, which alone is no reason to refuse it.
+  // One of them also has another revision, which alone is no reason to refuse it.
   const auto Warnings = TestSupport::LogTexts( "PluginModule", ZEK::ELogWarning );
   ASSERT_EQ( Warnings.size(), 1u );
   EXPECT_NE( Warnings[0].find( "revision 7, expected was 155050" ), std::string::npos );

@@ -1,5 +1,7 @@
 #include <HostServices/VPlaybackClock.h>
 
+#include <TestSupport/Calls.h>
+
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -11,32 +13,14 @@ namespace
 {
 constexpr std::int64_t Period = 2'700'000; ///< of 100 frames a second
 constexpr std::int64_t FrameNs = 10'000'000;
+constexpr auto Low = std::numeric_limits< std::int64_t >::min();
+constexpr auto High = std::numeric_limits< std::int64_t >::max();
 
 /// A recording of ten frames at 100 Hz, under a clock that the test turns.
 class PlaybackClock : public testing::Test
 {
 protected:
-  PlaybackClock()
-    : m_Clock(
-          [this]
-          {
-            return m_Now;
-          } )
-  {
-    EXPECT_TRUE( m_Clock.Open( 10, Period ).IsOk() );
-    m_Frames = m_Clock.FrameChanged().Connect(
-        [this]
-        {
-          ++m_FrameChanges;
-        },
-        nullptr );
-    m_States = m_Clock.StateChanged().Connect(
-        [this]
-        {
-          ++m_StateChanges;
-        },
-        nullptr );
-  }
+  PlaybackClock() { EXPECT_TRUE( m_Clock.Open( 10, Period ).IsOk() ); }
 
   /// The frame after so many frame times, of parts of which the position must not depend.
   std::int64_t After( double i_Frames, int i_Parts = 1 )
@@ -51,11 +35,12 @@ protected:
   }
 
   std::int64_t m_Now = 1'000'000'007;
-  VPlaybackClock m_Clock;
-  int m_FrameChanges = 0;
-  int m_StateChanges = 0;
-  ZEK::VConnection m_Frames;
-  ZEK::VConnection m_States;
+  VPlaybackClock m_Clock{ [this]
+                          {
+                            return m_Now;
+                          } };
+  TestSupport::VCalls m_Frames{ m_Clock.FrameChanged() };
+  TestSupport::VCalls m_States{ m_Clock.StateChanged() };
 };
 } // namespace
 
@@ -68,7 +53,7 @@ TEST_F( PlaybackClock, PlaysInTimeHoweverOftenItIsAsked )
   EXPECT_EQ( After( 0.01 ), 2 );
   EXPECT_EQ( m_Clock.CurrentTick(), 2 * Period );
   EXPECT_EQ( After( 4, 1000 ), 6 );
-  EXPECT_EQ( m_FrameChanges, 6 );
+  EXPECT_EQ( m_Frames.Take(), 6 + 1 ) << "the opening too";
   m_Now -= FrameNs * 50;
   m_Clock.Advance();
   EXPECT_EQ( m_Clock.CurrentFrame(), 0 ) << "a clock that falls back counts as standing";
@@ -77,11 +62,12 @@ TEST_F( PlaybackClock, PlaysInTimeHoweverOftenItIsAsked )
 
 TEST_F( PlaybackClock, StopsAtItsEndsAndStartsOver )
 {
+  m_States.Take();
   m_Clock.Play();
   EXPECT_EQ( After( 9.5 ), 9 );
   EXPECT_FALSE( m_Clock.IsPlaying() );
   EXPECT_EQ( m_Clock.CurrentTick(), m_Clock.RangeEnd() );
-  EXPECT_EQ( m_StateChanges, 2 );
+  EXPECT_EQ( m_States.Take(), 2 );
   m_Clock.Play();
   EXPECT_EQ( m_Clock.CurrentFrame(), 0 );
   EXPECT_EQ( After( 2 ), 2 );
@@ -120,7 +106,7 @@ TEST_F( PlaybackClock, LoopsInsideANarrowedRange )
   EXPECT_EQ( After( 4 ), 6 );
   m_Clock.Seek( 0 );
   EXPECT_EQ( m_Clock.CurrentFrame(), 5 );
-  m_Clock.SetRange( -5, std::numeric_limits< std::int64_t >::max() );
+  m_Clock.SetRange( -5, High );
   EXPECT_EQ( m_Clock.RangeEnd(), 9 * Period );
   m_Clock.SetRange( 3, 4 );
   m_Clock.ClearRange();
@@ -130,18 +116,17 @@ TEST_F( PlaybackClock, LoopsInsideANarrowedRange )
 
 TEST_F( PlaybackClock, SeeksClampToTheRange )
 {
-  constexpr auto Low = std::numeric_limits< std::int64_t >::min();
-  constexpr auto High = std::numeric_limits< std::int64_t >::max();
   for ( const auto& [Tick, Expected] :
         { std::pair{ Low, std::int64_t{ 0 } }, { High, 9 * Period }, { 3 * Period + 1, 3 * Period + 1 } } )
   {
     m_Clock.Seek( Tick );
     EXPECT_EQ( m_Clock.CurrentTick(), Expected );
   }
-  m_Clock.SeekFrame( High );
-  EXPECT_EQ( m_Clock.CurrentFrame(), 9 );
-  m_Clock.SeekFrame( Low );
-  EXPECT_EQ( m_Clock.CurrentFrame(), 0 );
+  for ( const auto& [Asked, Frame] : { std::pair{ High, 9 }, { Low, 0 } } )
+  {
+    m_Clock.SeekFrame( Asked );
+    EXPECT_EQ( m_Clock.CurrentFrame(), Frame );
+  }
   for ( const auto& [Seconds, Frame] : { std::pair{ 0.0449, 4 }, { 0.0451, 5 }, { 1e300, 9 }, { -1e300, 0 } } )
   {
     m_Clock.SeekSeconds( Seconds );
@@ -154,28 +139,22 @@ TEST_F( PlaybackClock, SeeksClampToTheRange )
 
 TEST_F( PlaybackClock, StepsStopAtTheEndsOrGoRound )
 {
-  constexpr auto Low = std::numeric_limits< std::int64_t >::min();
-  constexpr auto High = std::numeric_limits< std::int64_t >::max();
   m_Clock.Play();
   After( 3.5 );
   m_Clock.Step( 1 );
   EXPECT_FALSE( m_Clock.IsPlaying() );
   EXPECT_EQ( m_Clock.CurrentTick(), 4 * Period );
-  m_Clock.Step( 100 );
-  EXPECT_EQ( m_Clock.CurrentFrame(), 9 );
-  m_FrameChanges = 0;
-  m_Clock.Step( 1 );
-  m_Clock.Step( High );
-  EXPECT_EQ( m_FrameChanges, 0 );
-  m_Clock.Step( Low );
-  EXPECT_EQ( m_Clock.CurrentFrame(), 0 );
+  const auto Steps = [&]( const std::vector< std::pair< std::int64_t, std::int64_t > >& i_rSteps )
+  {
+    for ( const auto& [Frames, Expected] : i_rSteps )
+    {
+      m_Clock.Step( Frames );
+      EXPECT_EQ( m_Clock.CurrentFrame(), Expected ) << Frames;
+    }
+  };
+  Steps( { { 100, 9 }, { 1, 9 }, { High, 9 }, { Low, 0 } } );
   m_Clock.SetLoop( true );
-  m_Clock.Step( -1 );
-  EXPECT_EQ( m_Clock.CurrentFrame(), 9 );
-  m_Clock.Step( 12 );
-  EXPECT_EQ( m_Clock.CurrentFrame(), 1 );
-  m_Clock.Step( Low );
-  EXPECT_EQ( m_Clock.CurrentFrame(), 3 ) << "1 - 2^63, modulo 10";
+  Steps( { { -1, 9 }, { 12, 1 }, { Low, 3 } } ); // 1 - 2^63, modulo 10
   m_Clock.Close();
   m_Clock.Step( 1 );
   EXPECT_EQ( m_Clock.CurrentTick(), 0 );
@@ -191,7 +170,7 @@ TEST_F( PlaybackClock, TakesAnyFiniteRate )
   EXPECT_EQ( m_Clock.SetRate( 1e300 ), ZEK::IResult::OkButModified );
   m_Clock.SetLoop( true );
   m_Clock.Play();
-  m_Now = std::numeric_limits< std::int64_t >::max();
+  m_Now = High;
   m_Clock.Advance();
   EXPECT_GE( m_Clock.CurrentTick(), 0 );
   EXPECT_LE( m_Clock.CurrentTick(), m_Clock.RangeEnd() );
@@ -218,18 +197,16 @@ TEST_F( PlaybackClock, AChangeOfRateKeepsThePosition )
 
 TEST_F( PlaybackClock, OpensOnlyWhatCanBeCounted )
 {
-  m_FrameChanges = 0;
-  for ( const auto& [Frames, Ticks] : { std::pair< std::int64_t, std::int64_t >{ 0, 1 },
-                                        { 1, 0 },
-                                        { -1, Period },
-                                        { std::numeric_limits< std::int64_t >::max(), 2 } } )
+  m_Frames.Take();
+  for ( const auto& [Frames, Ticks] :
+        { std::pair< std::int64_t, std::int64_t >{ 0, 1 }, { 1, 0 }, { -1, Period }, { High, 2 } } )
   {
     EXPECT_EQ( m_Clock.Open( Frames, Ticks ), ZEK::IResult::InvalidArgument );
   }
   EXPECT_EQ( m_Clock.FrameCount(), 10 );
-  EXPECT_EQ( m_FrameChanges, 0 );
+  EXPECT_EQ( m_Frames.Take(), 0 );
   ASSERT_TRUE( m_Clock.Open( 1, Period ).IsOk() );
-  EXPECT_EQ( m_FrameChanges, 1 ) << "frame 0 of another recording is another frame";
+  EXPECT_EQ( m_Frames.Take(), 1 ) << "frame 0 of another recording is another frame";
   m_Clock.Play();
   EXPECT_EQ( After( 5 ), 0 );
   EXPECT_FALSE( m_Clock.IsPlaying() );

@@ -104,6 +104,17 @@ TEST_F( PostalService, DrainsWhatPostsPostAndLeavesNothingEarlyForTheLoop )
   QCoreApplication::sendPostedEvents();
   EXPECT_EQ( m_Order, ( std::vector{ 1, 2 } ) );
 
+  // What a function held may post as it goes.
+  std::shared_ptr< void > pHeld( nullptr,
+                                 [this]( void* )
+                                 {
+                                   Note( 3 );
+                                 } );
+  m_pPostal->Post( [pKept = std::move( pHeld )] {} );
+  m_pPostal->Post( [] {} );
+  EXPECT_TRUE( m_pPostal->DrainForTest() );
+  EXPECT_EQ( m_Order, ( std::vector{ 1, 2, 3 } ) );
+
   std::function< void() > Again = [&]
   {
     m_pPostal->Post( Again );
@@ -143,45 +154,33 @@ TEST_F( PostalService, MayBeDestroyedByAFunctionItRuns )
 
 TEST_F( PostalService, KeepsTheOrderOfEachPostingThread )
 {
-  constexpr int Threads = 4;
+  constexpr int Threads = 3;
   constexpr int Posts = 2000;
-  std::vector< std::vector< int > > Seen( Threads );
+  std::vector< int > Seen[Threads];
   std::vector< std::thread > Pool;
-  for ( int Thread = 0; Thread < Threads; ++Thread )
+  for ( auto& rSeen : Seen )
   {
     Pool.emplace_back(
-        [&, Thread]
+        [&]
         {
           for ( int Number = 0; Number < Posts; ++Number )
           {
             m_pPostal->Post(
-                [&rSeen = Seen[Thread], Number]
+                [&rSeen, Number]
                 {
                   rSeen.push_back( Number );
                 } );
           }
         } );
   }
-  const auto AllSeen = [&]
-  {
-    std::size_t Count = 0;
-    for ( const auto& rSeen : Seen )
-    {
-      Count += rSeen.size();
-    }
-    return Count == Threads * Posts;
-  };
-  while ( !AllSeen() )
+  while ( Seen[0].size() + Seen[1].size() + Seen[2].size() < Threads * Posts )
   {
     QCoreApplication::processEvents();
   }
-  for ( std::thread& rThread : Pool )
+  for ( int Thread = 0; Thread < Threads; ++Thread )
   {
-    rThread.join();
-  }
-  for ( const auto& rSeen : Seen )
-  {
-    EXPECT_TRUE( std::is_sorted( rSeen.begin(), rSeen.end() ) );
+    Pool[static_cast< std::size_t >( Thread )].join();
+    EXPECT_TRUE( std::is_sorted( std::begin( Seen[Thread] ), std::end( Seen[Thread] ) ) );
   }
 }
 
@@ -190,17 +189,16 @@ TEST_F( PostalService, TakesPostsWhileTheApplicationEndsAndAfter )
   std::atomic< bool > bStop = false;
   std::atomic< int > Posted = 0;
   const auto pAlive = std::make_shared< int >( 0 );
-  const auto PostUntilStopped = [&, pPostal = m_pPostal]
-  {
-    while ( !bStop )
-    {
-      pPostal->Post( [pAlive] {} );
-      ++Posted;
-      std::this_thread::yield();
-    }
-  };
-  std::thread A( PostUntilStopped );
-  std::thread B( PostUntilStopped );
+  std::thread Poster(
+      [&]
+      {
+        while ( !bStop )
+        {
+          m_pPostal->Post( [pAlive] {} );
+          ++Posted;
+          std::this_thread::yield();
+        }
+      } );
   while ( Posted < 200 )
   {
     QCoreApplication::processEvents();
@@ -212,9 +210,8 @@ TEST_F( PostalService, TakesPostsWhileTheApplicationEndsAndAfter )
     std::this_thread::yield();
   }
   bStop = true;
-  A.join();
-  B.join();
-  // What was not run is dropped, with all that it held. This test and the threads' lambda hold the rest.
+  Poster.join();
+  // What was not run is dropped, with all that it held. This test holds the rest.
   EXPECT_EQ( pAlive.use_count(), 1 );
   EXPECT_TRUE( m_pPostal->DrainForTest() );
 }

@@ -1,7 +1,10 @@
 #include <HostServices/VSelectionService.h>
 
+#include <TestSupport/Calls.h>
+
 #include <gtest/gtest.h>
 
+#include <array>
 #include <thread>
 
 using HostServices::VSelectionService;
@@ -16,64 +19,41 @@ VSelectionItem Item( std::uint32_t i_Kind, const std::string& i_rDevice, std::ui
 {
   return { .Kind = i_Kind, .Device = i_rDevice, .Sub = i_Sub };
 }
-
-struct VCounter
-{
-  VCounter( VSelectionService& io_rService, const std::vector< std::uint32_t >& i_rKinds )
-    : Connection( io_rService.ForKinds( i_rKinds )
-                      ->Connect(
-                          [this]
-                          {
-                            ++Count;
-                          },
-                          nullptr ) )
-  {
-  }
-  /// The signals since the last question.
-  int Take() { return std::exchange( Count, 0 ); }
-
-  int Count = 0;
-  ZEK::VConnection Connection;
-};
 } // namespace
 
 TEST( SelectionService, SignalsOnceADistinctChangeOfItsKinds )
 {
   VSelectionService Service;
-  VCounter Cameras( Service, { ZEK::ESelectCamera } );
-  VCounter Both( Service, { ZEK::ESelectMarker, ZEK::ESelectCamera, ZEK::ESelectMarker } );
-  VCounter Points( Service, { ZEK::ESelectReconstruction } );
-  VCounter All( Service, {} );
-  const auto Expect = [&]( int i_Cameras, int i_Both, int i_Points, int i_All, const char* i_pStep )
-  {
-    SCOPED_TRACE( i_pStep );
-    EXPECT_EQ( Cameras.Take(), i_Cameras );
-    EXPECT_EQ( Both.Take(), i_Both );
-    EXPECT_EQ( Points.Take(), i_Points );
-    EXPECT_EQ( All.Take(), i_All );
-  };
+  TestSupport::VCalls Cameras( *Service.ForKinds( { ZEK::ESelectCamera } ) );
+  TestSupport::VCalls Both( *Service.ForKinds( { ZEK::ESelectMarker, ZEK::ESelectCamera, ZEK::ESelectMarker } ) );
+  TestSupport::VCalls Points( *Service.ForKinds( { ZEK::ESelectReconstruction } ) );
+  TestSupport::VCalls All( *Service.ForKinds( {} ) );
   const VSelectionItem A = Item( ZEK::ESelectCamera, "A" );
   const VSelectionItem B = Item( ZEK::ESelectCamera, "B" );
   const VSelectionItem M = Item( ZEK::ESelectMarker, "S:M" );
 
-  Service.Set( Primary, { A, B } );
-  Expect( 1, 1, 0, 1, "two items at once are one change" );
-  Service.Set( Primary, { A, B } );
-  Expect( 0, 0, 0, 0, "an equal set" );
-  Service.Set( Primary, { A, B, M } );
-  Expect( 0, 1, 0, 1, "an item of another kind comes" );
-  Service.Set( Primary, { A, M } );
-  Expect( 1, 1, 0, 1, "one goes" );
-  Service.Set( Secondary, { A } );
-  Expect( 1, 1, 0, 1, "the other set" );
-  Service.Set( Primary, { M, A } );
-  Expect( 0, 1, 0, 1, "another order, hence another current item" );
-  Service.Set( Primary, {} );
-  Expect( 1, 1, 0, 1, "cleared" );
-  Service.Set( Primary, { Item( ZEK::ESelectReconstruction, "", 4 ) } );
-  Expect( 0, 0, 1, 1, "a point" );
-  Service.Set( Primary, { Item( ZEK::ESelectReconstruction, "", 5 ) } );
-  Expect( 0, 0, 1, 1, "another point of the same set" );
+  const VSelectionItem P = Item( ZEK::ESelectReconstruction, "", 4 );
+  const VSelectionItem Q = Item( ZEK::ESelectReconstruction, "", 5 );
+  struct VStep
+  {
+    ZEK::ISelectionService::ESet Set;
+    VSelection Items;
+    std::array< int, 4 > Calls; ///< of Cameras, Both, Points, All
+    const char* pWhat;
+  };
+  for ( const VStep& rStep : { VStep{ Primary, { A, B }, { 1, 1, 0, 1 }, "two items at once are one change" },
+                               { Primary, { A, B }, { 0, 0, 0, 0 }, "an equal set" },
+                               { Primary, { A, B, M }, { 0, 1, 0, 1 }, "an item of another kind comes" },
+                               { Primary, { A, M }, { 1, 1, 0, 1 }, "one goes" },
+                               { Secondary, { A }, { 1, 1, 0, 1 }, "the other set" },
+                               { Primary, { M, A }, { 0, 1, 0, 1 }, "another order, hence another current item" },
+                               { Primary, {}, { 1, 1, 0, 1 }, "cleared" },
+                               { Primary, { P }, { 0, 0, 1, 1 }, "a point" },
+                               { Primary, { Q }, { 0, 0, 1, 1 }, "another point of the same set" } } )
+  {
+    Service.Set( rStep.Set, rStep.Items );
+    EXPECT_EQ( ( std::array{ Cameras.Take(), Both.Take(), Points.Take(), All.Take() } ), rStep.Calls ) << rStep.pWhat;
+  }
 }
 
 TEST( SelectionService, KeepsWhatIsSelectedWithoutDoublesAndTheLastAddedCurrent )
@@ -176,33 +156,25 @@ TEST( SelectionService, IsReadByOtherThreadsWhileItChanges )
   VSelectionService Service;
   std::atomic< bool > bStop = false;
   std::atomic< bool > bTorn = false;
-  std::vector< std::thread > Readers;
-  for ( int Reader = 0; Reader < 2; ++Reader )
-  {
-    Readers.emplace_back(
-        [&]
+  std::thread Reader(
+      [&]
+      {
+        std::uint64_t Last = 0;
+        while ( !bStop )
         {
-          std::uint64_t Last = 0;
-          while ( !bStop )
-          {
-            const std::uint64_t Now = Service.Generation();
-            const VSelection Seen = Service.Get( Primary );
-            // The writer sets pairs of equal devices only.
-            bTorn =
-                bTorn || Now < Last || Seen.size() % 2 != 0 || ( !Seen.empty() && Seen[0].Device != Seen[1].Device );
-            Last = Now;
-          }
-        } );
-  }
+          const std::uint64_t Now = Service.Generation();
+          const VSelection Seen = Service.Get( Primary );
+          // The writer sets pairs of equal devices only.
+          bTorn = bTorn || Now < Last || Seen.size() % 2 != 0 || ( !Seen.empty() && Seen[0].Device != Seen[1].Device );
+          Last = Now;
+        }
+      } );
   for ( int Round = 0; Round < 2000; ++Round )
   {
     const std::string Name = std::to_string( Round );
     Service.Set( Primary, { Item( ZEK::ESelectCamera, Name ), Item( ZEK::ESelectCentroid, Name ) } );
   }
   bStop = true;
-  for ( std::thread& rReader : Readers )
-  {
-    rReader.join();
-  }
+  Reader.join();
   EXPECT_FALSE( bTorn );
 }

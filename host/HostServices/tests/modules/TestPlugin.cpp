@@ -7,9 +7,17 @@
 #include <ZEK/Log.h>
 
 #include <stdexcept>
+#include <string_view>
 
 namespace
 {
+#if defined( HARROW_TEST_FAULT )
+constexpr std::string_view Fault = HARROW_TEST_FAULT;
+#else
+constexpr std::string_view Fault;
+#endif
+constexpr bool bFails = Fault == "fails", bThrows = Fault == "throws", bUnmade = Fault == "unmade";
+
 void Say( const char* i_pText )
 {
   static ZEK::VLogCategory& rCategory = ZEK::GlobalLog().Category( "TestPlugin" );
@@ -35,11 +43,7 @@ public:
   bool RegisterGraphicsTypes( HarrowPluginInterface::IHarrowApplication& ) override
   {
     Say( "types" );
-#if defined( HARROW_TEST_FAILS )
-    return false;
-#else
-    return true;
-#endif
+    return !bFails;
   }
 
   bool CreateWorkspaceContent( HarrowPluginInterface::IHarrowApplication&,
@@ -47,16 +51,10 @@ public:
   {
     Say( "content" );
     i_rWorkspace.ContentFactories()->AddFactory( "Test View", std::make_shared< VTestFactory >() );
-#if defined( HARROW_TEST_THROWS )
-    throw std::runtime_error( "no folder" );
-#endif
-    return true;
+    return bThrows ? throw std::runtime_error( "no folder" ) : true;
   }
 
-  void ReleaseGraphics() override
-  {
-    Say( "released" );
-  }
+  void ReleaseGraphics() override { Say( "released" ); }
 };
 } // namespace
 
@@ -65,7 +63,7 @@ public:
 #if !defined( HARROW_TEST_BARE )
 HARROW_TEST_EXPORT HarrowPluginInterface::IPlugin* CreatePlugin()
 {
-  return new VTestPlugin;
+  return bUnmade ? throw std::runtime_error( "no memory" ) : new VTestPlugin;
 }
 
 HARROW_TEST_EXPORT std::uint64_t PluginBuildRevision()
