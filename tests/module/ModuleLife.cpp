@@ -1,5 +1,6 @@
 // Lives through one story of the plug-in module: ModuleLife <module> <story> [count]. Exit code 0 when it ended well.
 
+#include <HarrowPluginInterface/GraphicsSetUp.h>
 #include <HostFlow/VFlowFramework.h>
 #include <HostServices/VHost.h>
 #include <HostServices/VPluginModule.h>
@@ -9,8 +10,6 @@
 #include <QtCore/QElapsedTimer>
 #include <QtCore/QLibrary>
 #include <QtCore/QPointer>
-#include <QtGui/QSurfaceFormat>
-#include <QtQuick/QQuickWindow>
 #include <QtQuickWidgets/QQuickWidget>
 #include <QtWidgets/QApplication>
 #include <QtWidgets/QVBoxLayout>
@@ -261,14 +260,7 @@ int main( int i_Count, char** i_ppArguments )
   {
     return 2;
   }
-  QCoreApplication::setAttribute( Qt::AA_ShareOpenGLContexts );
-  QSurfaceFormat Format;
-  Format.setVersion( 4, 3 );
-  Format.setProfile( QSurfaceFormat::CoreProfile );
-  Format.setDepthBufferSize( 24 );
-  Format.setStencilBufferSize( 8 );
-  QSurfaceFormat::setDefaultFormat( Format );
-  QQuickWindow::setGraphicsApi( QSGRendererInterface::OpenGL );
+  HarrowPluginInterface::SetUpGraphics();
   QApplication Application( i_Count, i_ppArguments );
   const std::string Module = i_ppArguments[1];
   const std::string Story = i_ppArguments[2];

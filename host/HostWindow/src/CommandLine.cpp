@@ -131,7 +131,10 @@ void AddActions( CLI::App& io_rApp, VRenderOptions& o_rRender )
       { "--hover", "Move the pointer there", "X,Y" },
       { "--drag", "Drag with buttons down: left orbits, right zooms, left+right pans", "X0,Y0,X1,Y1[,BUTTONS]" },
       { "--wheel", "Turn the wheel; one notch is 120", "X,Y,DELTA" },
-      { "--key", "Press a key, such as Home", "NAME" } };
+      { "--key", "Press a key, such as Home", "NAME" },
+      { "--select", "Select an item by its text in the report; nothing for an empty one", "ITEM" },
+      { "--tracking", "Let the camera follow: none, selection, objects, or lock it to the selected object", "WHAT" },
+      { "--command", "Run a command of the window, such as Workspace3d:FrameSelected", "TEXT" } };
   for ( const VRow& rRow : Rows )
   {
     const std::string Name = rRow.pName;

@@ -1,5 +1,6 @@
 #include <HostWindow/Display.h>
 
+#include <HarrowPluginInterface/GraphicsSetUp.h>
 #include <ZEK/Log.h>
 
 #include <QtCore/QByteArray>
@@ -9,8 +10,6 @@
 #include <QtCore/QStandardPaths>
 #include <QtCore/QThread>
 #include <QtGui/QGuiApplication>
-#include <QtGui/QSurfaceFormat>
-#include <QtQuick/QQuickWindow>
 
 #include <array>
 #include <cerrno>
@@ -188,17 +187,7 @@ void SetUpGraphics( bool i_bCoreProfile, double i_Ratio )
     QGuiApplication::setHighDpiScaleFactorRoundingPolicy( Qt::HighDpiScaleFactorRoundingPolicy::PassThrough );
   }
   qputenv( "QT_QUICK_CONTROLS_STYLE", "Basic" );
-  QCoreApplication::setAttribute( Qt::AA_ShareOpenGLContexts );
-  QSurfaceFormat Format;
-  if ( i_bCoreProfile )
-  {
-    Format.setVersion( 4, 3 );
-    Format.setProfile( QSurfaceFormat::CoreProfile );
-  }
-  Format.setDepthBufferSize( 24 );
-  Format.setStencilBufferSize( 8 );
-  QSurfaceFormat::setDefaultFormat( Format );
-  QQuickWindow::setGraphicsApi( QSGRendererInterface::OpenGL );
+  HarrowPluginInterface::SetUpGraphics( i_bCoreProfile );
 }
 
 } // namespace HostWindow

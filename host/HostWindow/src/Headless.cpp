@@ -136,7 +136,7 @@ VRunResult RenderOne( VSession& io_rSession, const VRenderOptions& i_rRender, co
                       const QString& i_rOutput, const std::optional< QString >& i_rReport )
 {
   VStandAloneView Window( io_rSession, i_rWindow, { i_rRender.Width, i_rRender.Height } );
-  VViewDriver Driver( Window.View() );
+  VViewDriver Driver( Window.View(), io_rSession.Host().Selection() );
   if ( !Driver.View().Item() )
   {
     return Fail( EExitPlugin,

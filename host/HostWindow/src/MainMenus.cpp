@@ -6,6 +6,7 @@
 #include <QtWidgets/QMenu>
 #include <QtWidgets/QMenuBar>
 #include <QtWidgets/QMessageBox>
+#include <QtWidgets/QStatusBar>
 
 namespace HostWindow
 {
@@ -135,37 +136,20 @@ void VMainWindow::MakePlaybackMenu()
 
 void VMainWindow::MakeViewMenu()
 {
-  QMenu* pMenu = menuBar()->addMenu( tr( "&View" ) );
-  for ( int i = 0; i < ViewTypeNames().size(); ++i )
-  {
-    QAction* pAction = pMenu->addAction( ViewTypeNames()[i], this,
-                                         [this, i]
-                                         {
-                                           if ( VWorkspaceDock* pDock = ActiveDock() )
-                                           {
-                                             pDock->SetViewType( i );
-                                           }
-                                         } );
-    pAction->setShortcut( QKeySequence( Qt::Key_1 + i ) );
-  }
-  pMenu->addSeparator();
-  pMenu
-      ->addAction( tr( "&Frame Selected" ), this,
-                   [this]
-                   {
-                     if ( VWorkspaceDock* pDock = ActiveDock() )
-                     {
-                       pDock->View().FocusSelected();
-                     }
-                   } )
-      ->setShortcut( Qt::Key_F );
-  pMenu
-      ->addAction( tr( "&Reset View" ), this,
-                   [this]
-                   {
-                     PressInView( Qt::Key_Home );
-                   } )
-      ->setShortcut( Qt::Key_Home );
+  m_pViewMenu = new VViewMenu(
+      tr( "&View" ),
+      [this]
+      {
+        return ActiveDock();
+      },
+      this );
+  connect( m_pViewMenu, &VViewMenu::Refused, this,
+           [this]( const QString& i_rWhy )
+           {
+             statusBar()->showMessage( i_rWhy, 4000 );
+           } );
+  menuBar()->addMenu( m_pViewMenu );
+  QMenu* const pMenu = m_pViewMenu;
   pMenu->addSeparator();
   MakeUpAxisMenu( *pMenu->addMenu( tr( "&Up Axis" ) ) );
   m_pAltAction = pMenu->addAction( tr( "&Alt to Select" ), this, &VMainWindow::SetAltToSelect );

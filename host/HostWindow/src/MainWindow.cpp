@@ -9,7 +9,6 @@
 #include <QtGui/QCloseEvent>
 #include <QtGui/QDragEnterEvent>
 #include <QtGui/QDropEvent>
-#include <QtGui/QKeyEvent>
 #include <QtWidgets/QApplication>
 #include <QtWidgets/QCompleter>
 #include <QtWidgets/QFileDialog>
@@ -191,15 +190,11 @@ VWorkspaceDock* VMainWindow::AddWindow( const std::string& i_rKind )
   auto* pDock = new VWorkspaceDock( m_rSession, i_rKind, this );
   pDock->setObjectName( QString( "Window-%1" ).arg( m_NextWindow++ ) );
   connect( pDock, &VWorkspaceDock::Closed, this, &VMainWindow::OnDockClosed );
-  connect( pDock, &VWorkspaceDock::Activated, this,
-           [this]( VWorkspaceDock* i_pDock )
-           {
-             m_pActive = i_pDock;
-           } );
+  connect( pDock, &VWorkspaceDock::Activated, this, &VMainWindow::SetActive );
   addDockWidget( Qt::TopDockWidgetArea, pDock );
   m_Docks.push_back( pDock );
-  m_pActive = pDock;
   ApplyAltToSelect( *pDock );
+  SetActive( pDock );
   return pDock;
 }
 
@@ -207,6 +202,13 @@ void VMainWindow::OnDockClosed( VWorkspaceDock* i_pDock )
 {
   std::erase( m_Docks, i_pDock );
   i_pDock->deleteLater();
+  m_pViewMenu->Refresh();
+}
+
+void VMainWindow::SetActive( VWorkspaceDock* i_pDock )
+{
+  m_pActive = i_pDock;
+  m_pViewMenu->Refresh();
 }
 
 VWorkspaceDock* VMainWindow::ActiveDock() const
@@ -216,21 +218,6 @@ VWorkspaceDock* VMainWindow::ActiveDock() const
     return m_pActive;
   }
   return m_Docks.empty() ? nullptr : m_Docks.front();
-}
-
-void VMainWindow::PressInView( Qt::Key i_Key )
-{
-  VWorkspaceDock* pDock = ActiveDock();
-  QQuickItem* pItem = pDock ? pDock->View().Item() : nullptr;
-  if ( !pItem )
-  {
-    return;
-  }
-  for ( const QEvent::Type Type : { QEvent::KeyPress, QEvent::KeyRelease } )
-  {
-    QKeyEvent Event( Type, i_Key, Qt::NoModifier );
-    QCoreApplication::sendEvent( pItem, &Event );
-  }
 }
 
 bool VMainWindow::ExecuteCommand( const QString& i_rText )
@@ -327,6 +314,7 @@ void VMainWindow::OnSourceChanged()
       ApplyAltToSelect( *pDock );
     }
   }
+  m_pViewMenu->Refresh();
   const HostSources::IFrameSource* pSource = m_rSession.Source();
   setWindowTitle( pSource ? QString::fromStdString( pSource->Name() ) : QString() );
 }

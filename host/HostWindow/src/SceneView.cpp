@@ -132,6 +132,28 @@ void VSceneView::SetViewType( int i_Index )
   }
 }
 
+int VSceneView::ViewType() const
+{
+  return Item() ? Item()->property( "cameraType" ).toInt() : -1;
+}
+
+int VSceneView::Tracking() const
+{
+  return Item() ? Item()->property( "tracking" ).toInt() : -1;
+}
+
+bool VSceneView::SelectionHasBounds() const
+{
+  bool bHas = false;
+  return Widget() && QMetaObject::invokeMethod( Widget(), "selectionHasBounds", Q_RETURN_ARG( bool, bHas ) ) && bHas;
+}
+
+bool VSceneView::SelectionHasPose() const
+{
+  bool bHas = false;
+  return Widget() && QMetaObject::invokeMethod( Widget(), "selectionHasPose", Q_RETURN_ARG( bool, bHas ) ) && bHas;
+}
+
 void VSceneView::FocusSelected()
 {
   if ( Widget() )

@@ -128,6 +128,28 @@ std::string ParseView( const QString& i_rText, VViewAction::VWhat& o_rWhat )
   return "the views are " + ViewTypeNames().join( ", " ).toStdString();
 }
 
+std::string ParseTracking( const QString& i_rText, VViewAction::VWhat& o_rWhat )
+{
+  struct VRow
+  {
+    const char* pName;
+    const char* pCommand;
+  };
+  static constexpr VRow Rows[] = { { "none", "Workspace3d:NoTracking" },
+                                   { "selection", "Workspace3d:TrackSelection" },
+                                   { "objects", "Workspace3d:TrackObjects" },
+                                   { "lock", "Workspace3d:TrackingLock" } };
+  for ( const VRow& rRow : Rows )
+  {
+    if ( i_rText.compare( QLatin1String( rRow.pName ), Qt::CaseInsensitive ) == 0 )
+    {
+      o_rWhat = VCommandAction{ rRow.pCommand };
+      return {};
+    }
+  }
+  return "a view tracks none, selection or objects, or is locked: lock";
+}
+
 std::string ParsePoints( const std::string& i_rOption, const QStringList& i_rParts, VViewAction::VWhat& o_rWhat )
 {
   if ( i_rOption == "--band" )
@@ -189,6 +211,20 @@ std::string ParseViewAction( const std::string& i_rOption, const std::string& i_
   if ( i_rOption == "--set" )
   {
     return ParseSetting( Text, o_rAction.What );
+  }
+  if ( i_rOption == "--tracking" )
+  {
+    return ParseTracking( Text, o_rAction.What );
+  }
+  if ( i_rOption == "--select" )
+  {
+    o_rAction.What = VSelectAction{ i_rText };
+    return {};
+  }
+  if ( i_rOption == "--command" )
+  {
+    o_rAction.What = VCommandAction{ i_rText };
+    return {};
   }
   if ( i_rOption == "--drag" )
   {

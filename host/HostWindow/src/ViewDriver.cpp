@@ -189,4 +189,36 @@ QString VViewDriver::Do( const VSetAction& i_rSet )
   return WaitFrames( FramesForChange ) ? QString() : "the view does not draw";
 }
 
+QString VViewDriver::Do( const VSelectAction& i_rSelect )
+{
+  using ZEK::ESelectionEdit;
+  const bool bShift = m_Modifiers.testFlag( Qt::ShiftModifier );
+  const bool bControl = m_Modifiers.testFlag( Qt::ControlModifier );
+  const ESelectionEdit Edit = bShift && bControl ? ESelectionEdit::Remove
+                              : bShift           ? ESelectionEdit::Add
+                              : bControl         ? ESelectionEdit::Toggle
+                                                 : ESelectionEdit::Replace;
+  ZEK::VSelection Picked;
+  if ( !i_rSelect.Item.empty() )
+  {
+    Picked.push_back( m_pSelection->FromName( i_rSelect.Item ) );
+    if ( Picked.back().Kind == ZEK::ESelectNone )
+    {
+      return "this is no text of an item; one is \"@marker/1/4/Walker:LFHD\", and a camera's is its URN";
+    }
+  }
+  m_pSelection->Set( ZEK::ISelectionService::EPrimary,
+                     ZEK::EditSelection( m_pSelection->Get( ZEK::ISelectionService::EPrimary ), Picked, Edit ) );
+  return WaitFrames( FramesForChange ) ? QString() : "the view does not draw";
+}
+
+QString VViewDriver::Do( const VCommandAction& i_rCommand )
+{
+  if ( !m_View.ExecuteCommand( i_rCommand.Text ) )
+  {
+    return "the view knows no such command, or what the command is about is not selected";
+  }
+  return WaitFrames( FramesForChange ) ? QString() : "the view does not draw";
+}
+
 } // namespace HostWindow

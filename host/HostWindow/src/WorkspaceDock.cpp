@@ -48,6 +48,7 @@ void VWorkspaceDock::DropContent()
 void VWorkspaceDock::Rebuild()
 {
   const QJsonObject State = SaveState();
+  const int ViewType = View().ViewType();
   DropContent();
   const auto pContext = m_rSession.Context();
   const auto pFactory = m_rSession.Host().Factories()->Find( m_Kind );
@@ -76,6 +77,10 @@ void VWorkspaceDock::Rebuild()
     pWidget->installEventFilter( this );
   }
   RestoreState( State );
+  if ( ViewType > 0 )
+  {
+    SetViewType( ViewType );
+  }
 }
 
 void VWorkspaceDock::SetViewType( int i_Index )

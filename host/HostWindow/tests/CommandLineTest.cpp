@@ -131,6 +131,7 @@ INSTANTIATE_TEST_SUITE_P(
                      VBadCase{ { "render", "--drag", "1,2,3,4,thumb" }, "left, right and middle" },
                      VBadCase{ { "render", "--key", "Hame" }, "no key has that name" },
                      VBadCase{ { "render", "--view", "Sideways" }, "Perspective, Front, Back" },
+                     VBadCase{ { "render", "--tracking", "everything" }, "none, selection or objects" },
                      VBadCase{ { "render", "--set", "Floor" }, "expected KEY=VALUE" },
                      VBadCase{ { "render", "--set", "=1" }, "expected KEY=VALUE" },
                      VBadCase{ { "render", "--modifiers", "shift,hyper" }, "the modifiers are" },
@@ -175,8 +176,9 @@ TEST( CommandLine, HelpListsEverySubcommandAndEveryAction )
   const VParsed Render = Parse( { "render", "--help" } );
   EXPECT_EQ( Render.Result.Exit, EExitOk );
   for ( const char* pWord :
-        { "--window", "--source", "--time", "--size", "--set", "--view", "--click", "--band", "--hover", "--drag",
-          "--wheel", "--key", "--modifiers", "--ratio", "--output", "--report", "--all", "--output-dir" } )
+        { "--window",  "--source",    "--time",  "--size",   "--set",    "--view",   "--click",
+          "--band",    "--hover",     "--drag",  "--wheel",  "--key",    "--select", "--tracking",
+          "--command", "--modifiers", "--ratio", "--output", "--report", "--all",    "--output-dir" } )
   {
     EXPECT_THAT( Render.Result.Output, HasSubstr( pWord ) );
   }

@@ -5,6 +5,7 @@
 #include <HarrowGraphics/VSceneWindowContentFactory.h>
 #include <HarrowPluginInterface/IHarrowApplication.h>
 #include <HarrowPluginInterface/IHarrowWorkspace.h>
+#include <MoxelGraphics/VOverlayObjects.h>
 #include <MoxelGraphics/VSceneFramebufferObject.h>
 #include <ZEK/ResultQml.h>
 
@@ -20,6 +21,9 @@ bool VHarrowPluginGraphics::RegisterGraphicsTypes( HarrowPluginInterface::IHarro
   // A QML type cannot be taken back, so a module that stays loaded registers it once.
   [[maybe_unused]] static const int Registered =
       qmlRegisterType< MoxelGraphics::VSceneFramebufferObject >( "Flow2Graphics", 1, 0, "SceneFramebufferObject" );
+  [[maybe_unused]] static const int Lists[] = {
+      qmlRegisterAnonymousType< MoxelGraphics::VCameraObject >( "Flow2Graphics", 1 ),
+      qmlRegisterAnonymousType< MoxelGraphics::VSubjectObject >( "Flow2Graphics", 1 ) };
   ZEK::IO::RegisterResultQml();
   return true;
 }

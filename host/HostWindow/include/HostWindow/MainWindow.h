@@ -5,6 +5,7 @@
 #include <HostWindow/RecordingLoader.h>
 #include <HostWindow/Session.h>
 #include <HostWindow/TransportBar.h>
+#include <HostWindow/ViewMenu.h>
 #include <HostWindow/WorkspaceDock.h>
 
 #include <QtGui/QActionGroup>
@@ -76,8 +77,8 @@ private:
   void ApplyAltToSelect( VWorkspaceDock& io_rDock );
   void ShowSelection();
   void ShowSeen( bool i_bSeen );
+  void SetActive( VWorkspaceDock* i_pDock );
   VWorkspaceDock* ActiveDock() const;
-  void PressInView( Qt::Key i_Key );
 
   // Layout.cpp
   void SaveLayout();
@@ -103,6 +104,7 @@ private:
   QMenu* m_pRecentMenu = nullptr;
   QMenu* m_pOpenedMenu = nullptr;
   QMenu* m_pWindowMenu = nullptr;
+  VViewMenu* m_pViewMenu = nullptr;
   QAction* m_pAltAction = nullptr;
   QList< QAction* > m_PluginActions;
   QList< QMenu* > m_PluginMenus;

@@ -33,6 +33,13 @@ public:
   bool SetOption( const QString& i_rKey, const QVariant& i_rValue );
 
   void SetViewType( int i_Index );
+  /// The index of the view type; -1 without a view.
+  int ViewType() const;
+  /// What the camera follows: 0 nothing, 1 what was selected, 2 the selection, 3 rides on an object; -1 without a view.
+  int Tracking() const;
+  /// Whether what is selected has a place in the view, or a pose.
+  bool SelectionHasBounds() const;
+  bool SelectionHasPose() const;
   void FocusSelected();
   /// Runs a command of the window; false when it knows none of that text.
   bool ExecuteCommand( const std::string& i_rText );

@@ -62,11 +62,23 @@ struct VSetAction
   QVariant Value;
 };
 
+/// Something is selected by the text that the report writes for it; the modifiers say what that does to the selection.
+struct VSelectAction
+{
+  std::string Item; ///< empty: nothing stays selected
+};
+
+/// A command of the window.
+struct VCommandAction
+{
+  std::string Text;
+};
+
 /// One thing done to a view. Points are item pixels from the top left.
 struct VViewAction
 {
   using VWhat = std::variant< VClickAction, VBandAction, VHoverAction, VDragAction, VWheelAction, VKeyAction,
-                              VViewTypeAction, VSetAction >;
+                              VViewTypeAction, VSetAction, VSelectAction, VCommandAction >;
   VWhat What;
   Qt::KeyboardModifiers Modifiers = Qt::NoModifier;
   std::string Option; ///< such as "--click"
@@ -76,8 +88,9 @@ struct VViewAction
 /// The names of the view types, by their index.
 const QStringList& ViewTypeNames();
 
-/// Reads the value of one of the options "--click", "--band", "--hover", "--drag", "--wheel", "--key", "--view" and
-/// "--set". An empty text means success, anything else says what is wrong with the value.
+/// Reads the value of one of the options "--click", "--band", "--hover", "--drag", "--wheel", "--key", "--view",
+/// "--set", "--select", "--tracking" and "--command". An empty text means success, anything else says what is wrong
+/// with the value.
 std::string ParseViewAction( const std::string& i_rOption, const std::string& i_rText, VViewAction& o_rAction );
 
 /// Reads a list such as "shift,ctrl"; "none" is the empty set. An empty text means success.

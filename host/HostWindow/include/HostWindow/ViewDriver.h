@@ -3,6 +3,8 @@
 #include <HostWindow/SceneView.h>
 #include <HostWindow/ViewAction.h>
 
+#include <ZEK/Selection.h>
+
 namespace HostWindow
 {
 
@@ -11,8 +13,9 @@ namespace HostWindow
 class VViewDriver
 {
 public:
-  explicit VViewDriver( VSceneView i_View )
+  VViewDriver( VSceneView i_View, std::shared_ptr< ZEK::ISelectionService > i_pSelection )
     : m_View( std::move( i_View ) )
+    , m_pSelection( std::move( i_pSelection ) )
   {
   }
 
@@ -31,6 +34,8 @@ private:
   QString Do( const VKeyAction& i_rKey );
   QString Do( const VViewTypeAction& i_rType );
   QString Do( const VSetAction& i_rSet );
+  QString Do( const VSelectAction& i_rSelect );
+  QString Do( const VCommandAction& i_rCommand );
 
   QString CheckInside( QPointF i_At ) const;
   void Send( QEvent::Type i_Type, QPointF i_At, Qt::MouseButton i_Button, Qt::MouseButtons i_Buttons );
@@ -38,6 +43,7 @@ private:
   void DragBetween( QPointF i_From, QPointF i_To, Qt::MouseButtons i_Buttons );
 
   VSceneView m_View;
+  std::shared_ptr< ZEK::ISelectionService > m_pSelection;
   Qt::KeyboardModifiers m_Modifiers = Qt::NoModifier;
 };
 

@@ -1,0 +1,56 @@
+#pragma once
+
+#include <QtGui/QActionGroup>
+#include <QtWidgets/QMenu>
+
+#include <functional>
+
+namespace HostWindow
+{
+class VWorkspaceDock;
+
+/// The part of the View menu that is about the active view: from where it looks, what its camera follows and what it
+/// shows. The checks tell the true state of that view; without a view everything is disabled. Thread: GUI.
+class VViewMenu : public QMenu
+{
+  Q_OBJECT
+
+public:
+  VViewMenu( const QString& i_rTitle, std::function< VWorkspaceDock*() > i_ActiveDock, QWidget* i_pParent );
+
+  /// To be called when the active view is another one: shortcuts work without the menu being opened.
+  void Refresh();
+
+signals:
+  /// What was chosen could not be done; a sentence says why.
+  void Refused( const QString& i_rWhy );
+
+private:
+  struct VToggle
+  {
+    QAction* pAction;
+    QString Key;
+    QVariant On;
+    QVariant Off;
+  };
+
+  void AddViewTypes();
+  void AddCamera();
+  void AddTracking();
+  void AddToggles();
+  QAction* AddCommand( const QString& i_rText, const QKeySequence& i_rKey, const char* i_pCommand,
+                       const QString& i_rRefusal );
+  void Run( const char* i_pCommand, const QString& i_rRefusal );
+  void Toggle( const VToggle& i_rToggle );
+  void ShowConditions( bool i_bExact );
+
+  std::function< VWorkspaceDock*() > m_ActiveDock;
+  QActionGroup m_ViewTypes;
+  QActionGroup m_Tracking;
+  QList< QAction* > m_ForView; ///< need a view
+  QList< VToggle > m_Toggles;
+  QList< QAction* > m_ForBounds; ///< need something selected that has a place
+  QAction* m_pLock = nullptr;
+};
+
+} // namespace HostWindow

@@ -1,0 +1,218 @@
+#include <HostWindow/ViewMenu.h>
+
+#include <HostWindow/ViewAction.h>
+#include <HostWindow/WorkspaceDock.h>
+
+#include <QtCore/QCoreApplication>
+#include <QtGui/QKeyEvent>
+
+namespace HostWindow
+{
+namespace
+{
+constexpr int AllContributions = 3;
+
+bool IsOn( const QVariant& i_rValue )
+{
+  return i_rValue.toDouble() != 0;
+}
+} // namespace
+
+VViewMenu::VViewMenu( const QString& i_rTitle, std::function< VWorkspaceDock*() > i_ActiveDock, QWidget* i_pParent )
+  : QMenu( i_rTitle, i_pParent )
+  , m_ActiveDock( std::move( i_ActiveDock ) )
+  , m_ViewTypes( this )
+  , m_Tracking( this )
+{
+  setToolTipsVisible( true );
+  AddViewTypes();
+  addSeparator();
+  AddCamera();
+  addSeparator();
+  AddTracking();
+  addSeparator();
+  AddToggles();
+  connect( this, &QMenu::aboutToShow, this,
+           [this]
+           {
+             Refresh();
+             ShowConditions( true );
+           } );
+  connect( this, &QMenu::aboutToHide, this,
+           [this]
+           {
+             ShowConditions( false );
+           } );
+  Refresh();
+}
+
+void VViewMenu::AddViewTypes()
+{
+  for ( int Index = 0; Index < ViewTypeNames().size(); ++Index )
+  {
+    QAction* const pAction = addAction( ViewTypeNames()[Index], this,
+                                        [this, Index]
+                                        {
+                                          if ( VWorkspaceDock* const pDock = m_ActiveDock() )
+                                          {
+                                            pDock->SetViewType( Index );
+                                          }
+                                          Refresh();
+                                        } );
+    pAction->setShortcut( QKeySequence( Qt::Key_1 + Index ) );
+    pAction->setCheckable( true );
+    m_ViewTypes.addAction( pAction );
+    m_ForView << pAction;
+  }
+}
+
+void VViewMenu::AddCamera()
+{
+  m_ForBounds << AddCommand( tr( "&Frame Selected" ), Qt::Key_F, "Workspace3d:FrameSelected",
+                             tr( "Nothing is selected that could fill the view, or the view is locked" ) );
+  QAction* const pHome = addAction( tr( "&Home" ), this,
+                                    [this]
+                                    {
+                                      VWorkspaceDock* const pDock = m_ActiveDock();
+                                      if ( QQuickItem* const pItem = pDock ? pDock->View().Item() : nullptr )
+                                      {
+                                        for ( const QEvent::Type Type : { QEvent::KeyPress, QEvent::KeyRelease } )
+                                        {
+                                          QKeyEvent Event( Type, Qt::Key_Home, Qt::NoModifier );
+                                          QCoreApplication::sendEvent( pItem, &Event );
+                                        }
+                                      }
+                                    } );
+  pHome->setShortcut( Qt::Key_Home );
+  pHome->setToolTip( tr( "Return to the view of the start" ) );
+  m_ForView << pHome;
+}
+
+void VViewMenu::AddTracking()
+{
+  // In the order of what a view answers for its tracking.
+  struct VRow
+  {
+    QString Text;
+    QKeySequence Key;
+    const char* pCommand;
+    QString ToolTip;
+  };
+  const VRow Rows[] = {
+      { tr( "&No Tracking" ), Qt::SHIFT | Qt::Key_N, "Workspace3d:NoTracking", tr( "The camera stays where it is" ) },
+      { tr( "Track &Objects" ), Qt::SHIFT | Qt::Key_T, "Workspace3d:TrackObjects",
+        tr( "The camera follows what is selected now, whatever is selected later" ) },
+      { tr( "Track &Selection" ), Qt::Key_T, "Workspace3d:TrackSelection",
+        tr( "The camera follows whatever is selected" ) },
+      { tr( "&Lock to Current" ), Qt::SHIFT | Qt::Key_L, "Workspace3d:TrackingLock",
+        tr( "The camera rides on the selected object" ) } };
+  for ( const VRow& rRow : Rows )
+  {
+    QAction* const pAction =
+        AddCommand( rRow.Text, rRow.Key, rRow.pCommand, tr( "Nothing is selected that a camera could follow" ) );
+    pAction->setToolTip( rRow.ToolTip );
+    pAction->setCheckable( true );
+    m_Tracking.addAction( pAction );
+  }
+  m_ForBounds << m_Tracking.actions()[1];
+  m_pLock = m_Tracking.actions()[3];
+}
+
+void VViewMenu::AddToggles()
+{
+  const auto Add = [this]( const QString& i_rText, const QKeySequence& i_rKey, const QString& i_rOption, QVariant i_On,
+                           QVariant i_Off )
+  {
+    const qsizetype Index = m_Toggles.size();
+    QAction* const pAction = addAction( i_rText, this,
+                                        [this, Index]
+                                        {
+                                          Toggle( m_Toggles[Index] );
+                                        } );
+    pAction->setCheckable( true );
+    pAction->setShortcut( i_rKey );
+    m_Toggles.push_back( { pAction, i_rOption, std::move( i_On ), std::move( i_Off ) } );
+  };
+  Add( tr( "Floor &Grid" ), Qt::Key_G, "FloorGrid", true, false );
+  Add( tr( "Translucent Floor" ), {}, "FloorGridIsTranslucent", true, false );
+  Add( tr( "Global A&xis" ), Qt::Key_X, "GlobalAxis", true, false );
+  Add( tr( "Reconstruction &Volume" ), Qt::Key_V, "ReconstructionVolume", true, false );
+  Add( tr( "&Recorded Radius" ), Qt::Key_R, "ReconstructedRadius", true, false );
+  Add( tr( "Residual &Colours" ), Qt::Key_C, "ReconstructionResiduals", true, false );
+  Add( tr( "Camera Contri&butions" ), Qt::Key_B, "ContributionsType", AllContributions, 0 );
+}
+
+QAction* VViewMenu::AddCommand( const QString& i_rText, const QKeySequence& i_rKey, const char* i_pCommand,
+                                const QString& i_rRefusal )
+{
+  QAction* const pAction = addAction( i_rText, this,
+                                      [this, i_pCommand, i_rRefusal]
+                                      {
+                                        Run( i_pCommand, i_rRefusal );
+                                      } );
+  pAction->setShortcut( i_rKey );
+  m_ForView << pAction;
+  return pAction;
+}
+
+void VViewMenu::Run( const char* i_pCommand, const QString& i_rRefusal )
+{
+  VWorkspaceDock* const pDock = m_ActiveDock();
+  if ( pDock && !pDock->View().ExecuteCommand( i_pCommand ) )
+  {
+    emit Refused( i_rRefusal );
+  }
+  Refresh();
+}
+
+void VViewMenu::Toggle( const VToggle& i_rToggle )
+{
+  if ( VWorkspaceDock* const pDock = m_ActiveDock() )
+  {
+    VSceneView View = pDock->View();
+    View.SetOption( i_rToggle.Key, IsOn( View.Option( i_rToggle.Key ) ) ? i_rToggle.Off : i_rToggle.On );
+  }
+  Refresh();
+}
+
+void VViewMenu::Refresh()
+{
+  VWorkspaceDock* const pDock = m_ActiveDock();
+  const VSceneView View = pDock ? pDock->View() : VSceneView();
+  for ( QAction* const pAction : m_ForView )
+  {
+    pAction->setEnabled( View.Item() != nullptr );
+  }
+  const auto Check = []( const QActionGroup& i_rGroup, int i_Index )
+  {
+    for ( int Index = 0; Index < i_rGroup.actions().size(); ++Index )
+    {
+      i_rGroup.actions()[Index]->setChecked( Index == i_Index );
+    }
+  };
+  Check( m_ViewTypes, View.ViewType() );
+  Check( m_Tracking, View.Tracking() );
+  const QStringList Keys = View.OptionKeys();
+  for ( const VToggle& rToggle : m_Toggles )
+  {
+    const bool bKnown = Keys.contains( rToggle.Key );
+    rToggle.pAction->setEnabled( bKnown );
+    rToggle.pAction->setChecked( bKnown && IsOn( View.Option( rToggle.Key ) ) );
+  }
+}
+
+void VViewMenu::ShowConditions( bool i_bExact )
+{
+  // While the menu is closed its shortcuts try, because nobody tells it when the selection changes.
+  VWorkspaceDock* const pDock = m_ActiveDock();
+  const VSceneView View = pDock ? pDock->View() : VSceneView();
+  const bool bView = View.Item() != nullptr;
+  const bool bBounds = bView && ( !i_bExact || View.SelectionHasBounds() );
+  for ( QAction* const pAction : m_ForBounds )
+  {
+    pAction->setEnabled( bBounds );
+  }
+  m_pLock->setEnabled( bView && ( !i_bExact || View.SelectionHasPose() ) );
+}
+
+} // namespace HostWindow
