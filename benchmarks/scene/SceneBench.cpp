@@ -25,7 +25,7 @@ VOffscreen& Offscreen()
 struct VView
 {
   explicit VView( std::size_t i_Count )
-    : pScene( std::make_shared< VReconstructionScene >( i_Count ) )
+    : pScene( std::make_shared< VReconstructionScene >( VPopulation{ i_Count, 0 } ) )
     , Frame( pScene, std::make_shared< CoreGraphics::VCameraController >() )
   {
     Frame.Controller().SetSize( { Width, Height } );

@@ -90,7 +90,7 @@ VSphereFloor::VSphereFloor( std::size_t i_Count )
     std::vector< float >& rFrame = rGl.Frames.emplace_back();
     for ( std::size_t Index = 0; Index < i_Count; ++Index )
     {
-      const MoxelGraphics::VScenePoint Point = PointAt( Index, i_Count, Frame );
+      const MoxelGraphics::VScenePoint Point = PointAt( Index, { i_Count, 0 }, Frame );
       rFrame.insert( rFrame.end(), { Point.X, Point.Y, Point.Z, Point.Radius } );
     }
   }

@@ -32,14 +32,22 @@ private:
   std::unique_ptr< QOpenGLFramebufferObject > m_pTarget;
 };
 
-/// Where reconstruction `i_Index` is in frame `i_Frame`, mm: on circles through the volume.
-MoxelGraphics::VScenePoint PointAt( std::size_t i_Index, std::size_t i_Count, int i_Frame );
+/// So many reconstructions, of radius 7 mm, and behind them so many of radius 9.
+struct VPopulation
+{
+  std::size_t Small = 0;
+  std::size_t Large = 0;
+  std::size_t Count() const { return Small + Large; }
+};
+
+/// Reconstruction `i_Index` in frame `i_Frame`, mm: on circles through the volume.
+MoxelGraphics::VScenePoint PointAt( std::size_t i_Index, const VPopulation& i_rPopulation, int i_Frame );
 
 /// Frames of state that hold only moving reconstructions, and the scene that draws them through its real path.
 class VReconstructionScene : public Flow2Graphics::VFlowScene
 {
 public:
-  explicit VReconstructionScene( std::size_t i_Count );
+  explicit VReconstructionScene( const VPopulation& i_rPopulation );
 
   void Show( int i_Frame )
   {

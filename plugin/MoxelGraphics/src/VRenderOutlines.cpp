@@ -1,5 +1,7 @@
 #include <MoxelGraphics/VRenderOutlines.h>
 
+#include "HighlightUnit.h"
+
 #include <MoxelGraphics/VMoxelScene.h>
 
 #include <CoreGraphics/VRenderContext.h>
@@ -10,8 +12,6 @@ namespace MoxelGraphics
 namespace
 {
 using namespace CoreGraphics;
-
-constexpr int MaskUnit = 7;
 
 // A strip over the whole frame.
 constexpr float Corners[] = { -1, -1, 0, 1, -1, 0, -1, 1, 0, 1, 1, 0 };
@@ -85,7 +85,7 @@ bool VRenderOutlines::DrawEdges( CoreGraphics::VRenderContext& io_rContext )
   {
     return false;
   }
-  rGl.Mask.Set( *rGl.pOutlines, MaskUnit );
+  rGl.Mask.Set( *rGl.pOutlines, HighlightUnit );
   rGl.Primary.Set( *rGl.pOutlines, m_PrimaryColour );
   rGl.Preselect.Set( *rGl.pOutlines, PreselectColour( io_rContext.PreselectColourIndex() ) );
   io_rContext.SetRenderState( rGl.EdgeState );

@@ -1,9 +1,9 @@
 #include <MoxelGraphics/VSceneFrame.h>
 
+#include "HighlightUnit.h"
 #include "Log.h"
 
 #include <MoxelGraphics/VMoxelScene.h>
-#include <MoxelGraphics/VSphereHelper.h>
 
 #include <CoreGraphics/VCameraController.h>
 #include <CoreGraphics/VRenderContext.h>
@@ -23,7 +23,6 @@ namespace MoxelGraphics
 {
 namespace
 {
-constexpr int HighlightUnit = 7;
 const QString NotShared = QStringLiteral( "This window's OpenGL context does not share with the scene's first one" );
 
 QVector3D LightDirection( bool i_bYUp )
@@ -225,200 +224,6 @@ void VSceneFrame::UpdateCamera()
   }
   m_pController->Step();
   m_pController->Apply( *m_pContext );
-}
-
-bool VSceneFrame::IsBand() const
-{
-  const bool bBand = m_Input.PickMode == EPickBand || m_Input.PickMode == EPickBandDone;
-  return bBand && m_Input.BandStart != m_Input.Pointer;
-}
-
-void VSceneFrame::SelectAndHighlight()
-{
-  m_pContext->BindTexture( HighlightUnit, 0 );
-  m_pContext->SetRenderMode( ERenderModeSelection );
-  m_pContext->BindFramebuffer( m_pSelectionTarget.get() );
-  if ( m_Input.PickMode != EPickNone )
-  {
-    m_Found.clear();
-    m_Result.Layers = IsBand() ? PickBand() : 0;
-    const bool bBand = m_Result.Layers > 0;
-    if ( !bBand )
-    {
-      PickPoint();
-      m_Result.Layers = 1;
-    }
-    ++m_Result.Serial;
-    m_Result.Mode = m_Input.PickMode;
-    m_Result.Edit = m_Input.Edit;
-    m_Result.Ids = m_Found;
-    m_Result.Labels.clear();
-    m_Result.Selection = m_pScene->ResolveIds( m_Found, m_Result.Labels );
-    if ( bBand )
-    {
-      std::erase_if( m_Result.Selection,
-                     []( const ZEK::VSelectionItem& i_rItem )
-                     {
-                       return i_rItem.Kind == ZEK::ESelectObjectManipulator;
-                     } );
-    }
-  }
-  m_Figures.SelectMs = Lap();
-  Highlight();
-  m_Figures.HighlightMs = Lap();
-}
-
-void VSceneFrame::Highlight()
-{
-  m_pContext->SetRenderMode( ERenderModeHighlight );
-  bool bDrawn = false;
-  if ( !m_pScene->Registry().Marks().empty() )
-  {
-    const std::uint64_t Draws = m_pContext->DrawCalls();
-    DrawView();
-    bDrawn = m_pContext->DrawCalls() != Draws;
-    m_DirtyMask = bDrawn ? QRect( QPoint( 0, 0 ), m_Size ) : QRect();
-  }
-  else if ( !m_DirtyMask.isEmpty() )
-  {
-    // Nothing has a flag, so nothing would draw: only what a pick or an older frame left has to go.
-    m_pScene->Clear( *m_pContext, m_Input.Options, m_DirtyMask );
-    m_DirtyMask = QRect();
-  }
-  m_pScene->SetHighlighted( bDrawn );
-}
-
-void VSceneFrame::Draw( const QRect& i_rScissor )
-{
-  m_DirtyMask |= i_rScissor;
-  m_pScene->Clear( *m_pContext, m_Input.Options, i_rScissor );
-  // What is not to be seen is not to be picked either.
-  if ( !m_Input.Options.CameraView )
-  {
-    m_pScene->DrawScene( *m_pContext, m_Input.Options );
-  }
-}
-
-void VSceneFrame::PickPoint()
-{
-  const QRect Frame( QPoint( 0, 0 ), m_Size );
-  const QRect Window =
-      QRect( m_Input.Pointer.x() - 5, m_Size.height() - m_Input.Pointer.y() - 5, 11, 11 ).intersected( Frame );
-  if ( Window.isEmpty() )
-  {
-    return;
-  }
-  m_Pixels.assign( static_cast< std::size_t >( Window.width() ) * static_cast< std::size_t >( Window.height() ), 0 );
-  m_pScene->SetIgnoredIds( {} );
-  Draw( Window );
-  m_pContext->ReadPixels( Window, m_Pixels.data(), GL_RGBA );
-
-  float Nearest = std::numeric_limits< float >::max();
-  std::uint32_t Winner = 0;
-  for ( int Row = 0; Row < Window.height(); ++Row )
-  {
-    for ( int Column = 0; Column < Window.width(); ++Column )
-    {
-      const std::uint32_t Id = m_Pixels[static_cast< std::size_t >( Row * Window.width() + Column )] & EIdPixelMask;
-      const float Distance = std::hypot( static_cast< float >( Column ) - static_cast< float >( Window.width() ) * 0.5f,
-                                         static_cast< float >( Row ) - static_cast< float >( Window.height() ) * 0.5f );
-      if ( Id != 0 && Distance < Nearest )
-      {
-        Nearest = Distance;
-        Winner = Id & EIdMask;
-      }
-    }
-  }
-  if ( Winner != 0 )
-  {
-    m_Found.push_back( Winner );
-  }
-}
-
-int VSceneFrame::PickBand()
-{
-  constexpr double Scale = 0.5;
-  const auto Scaled = [&]( QPoint i_Point )
-  {
-    return QPoint( static_cast< int >( std::round( i_Point.x() * Scale ) ),
-                   static_cast< int >( std::round( ( m_Size.height() - i_Point.y() ) * Scale ) ) );
-  };
-  const QRect Frame( 0, 0, static_cast< int >( std::round( m_Size.width() * Scale ) ),
-                     static_cast< int >( std::round( m_Size.height() * Scale ) ) );
-  const QPoint Start = Scaled( m_Input.BandStart );
-  const QPoint End = Scaled( m_Input.Pointer );
-  const QRect Band = QRect( std::min( Start.x(), End.x() ), std::min( Start.y(), End.y() ),
-                            std::abs( Start.x() - End.x() ), std::abs( Start.y() - End.y() ) )
-                         .intersected( Frame );
-  if ( Band.isEmpty() )
-  {
-    return 0;
-  }
-  const QRect Viewport = m_pContext->Viewport();
-  const QRect Scissor = m_pContext->Scissor();
-  m_pContext->SetViewport( Frame );
-  m_pContext->SetFrameSize( Frame.size() );
-  const auto Remember = [this]( bool i_bOn )
-  {
-    if ( VSphereHelper* const pHelper = m_pScene->SphereHelper() )
-    {
-      pHelper->Remember( i_bOn );
-    }
-  };
-  Remember( true );
-  const int Layers = PickLayers( Band );
-  Remember( false );
-  m_pContext->SetFrameSize( m_Size );
-  m_pContext->SetViewport( Viewport );
-  m_pContext->SetScissor( Scissor );
-  return Layers;
-}
-
-int VSceneFrame::PickLayers( const QRect& i_rBand )
-{
-  constexpr int MaximumLayers = 16;
-  m_Pixels.resize( static_cast< std::size_t >( i_rBand.width() ) * static_cast< std::size_t >( i_rBand.height() ) );
-  m_pScene->SetIgnoredIds( {} );
-  int Layers = 0;
-  bool bNew = true;
-  while ( bNew && Layers < MaximumLayers )
-  {
-    ++Layers;
-    Draw( i_rBand );
-    m_pContext->ReadPixels( i_rBand, m_Pixels.data(), GL_RGBA );
-    m_Layer.clear();
-    std::uint32_t Last = 0;
-    for ( const std::uint32_t Pixel : m_Pixels )
-    {
-      const std::uint32_t Id = Pixel & EIdMask;
-      if ( Id != Last && Id != 0 )
-      {
-        m_Layer.push_back( Id );
-      }
-      Last = Id;
-    }
-    // What was found no longer draws, so that the next layer shows what it hid.
-    bNew = TakeNew();
-  }
-  m_Layer.clear();
-  m_pScene->PickInRect( *m_pContext, m_Input.Options, i_rBand, m_Layer );
-  TakeNew();
-  m_pScene->SetIgnoredIds( {} );
-  return Layers;
-}
-
-bool VSceneFrame::TakeNew()
-{
-  std::sort( m_Layer.begin(), m_Layer.end() );
-  m_Layer.erase( std::unique( m_Layer.begin(), m_Layer.end() ), m_Layer.end() );
-  std::erase_if( m_Layer,
-                 [&]( std::uint32_t i_Id )
-                 {
-                   return i_Id == 0 || m_pScene->IgnoredIds().contains( i_Id );
-                 } );
-  m_Found.insert( m_Found.end(), m_Layer.begin(), m_Layer.end() );
-  m_pScene->IgnoreIds( m_Layer );
-  return !m_Layer.empty();
 }
 
 void VSceneFrame::DrawView()
