@@ -10,10 +10,7 @@ namespace ZEK::IO
 
 bool VJsonCursor::FailAt( std::size_t i_Position, std::string i_Message )
 {
-  if ( m_Error.m_Message.empty() )
-  {
-    m_Error = { i_Position, std::move( i_Message ) };
-  }
+  m_Error = { i_Position, std::move( i_Message ) };
   return false;
 }
 
@@ -82,7 +79,7 @@ bool VJsonCursor::HexDigits( std::uint32_t& o_rUnit )
 {
   const std::string_view Token = m_Text.substr( m_Position, 4 );
   const auto [pEnd, Code] = std::from_chars( Token.data(), Token.data() + Token.size(), o_rUnit, 16 );
-  if ( Token.size() != 4 || Code != std::errc() || pEnd != Token.data() + 4 )
+  if ( Code != std::errc() || pEnd != Token.data() + 4 )
   {
     return FailAt( m_Position, "expected four hexadecimal digits" );
   }

@@ -14,7 +14,7 @@ namespace ZEK::IO
 {
 
 /// Walks a JSON text token by token for readers that know what must come. Every operation passes over white space
-/// first, is false after the first failure, and then leaves `Error` telling what was expected where.
+/// first; one that is false leaves `Error` telling what was expected where, and then the reader gives up.
 class VJsonCursor
 {
 public:
@@ -52,12 +52,12 @@ public:
     {
       return false;
     }
-    const auto [pEnd, Code] = std::from_chars( Token.data(), Token.data() + Token.size(), o_rValue );
+    const std::errc Code = std::from_chars( Token.data(), Token.data() + Token.size(), o_rValue ).ec;
     if ( Token.find_first_of( ".eE" ) != std::string_view::npos )
     {
       return FailAt( Start, "expected a whole number" );
     }
-    return ( Code == std::errc() && pEnd == Token.data() + Token.size() ) || FailAt( Start, "number out of range" );
+    return Code == std::errc() || FailAt( Start, "number out of range" );
   }
   template < std::floating_point T >
   bool Float( T& o_rValue )

@@ -40,7 +40,6 @@ public:
     ZEK::IO::ISchema Description;
     const std::uint64_t Kind = Below( i_Depth > 0 ? 19 : 15 );
     Description.m_Type = static_cast< EType >( Kind < 12 ? Kind + 1 : Kind < 15 ? Kind + 5 : Kind - 2 );
-    Description.m_Docs = Text( 8 );
     if ( Kind >= 12 && Kind < 15 )
     {
       for ( std::uint64_t Index = 0; Index <= Below( 4 ); ++Index )

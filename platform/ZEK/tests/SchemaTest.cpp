@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <barrier>
 #include <cstring>
 #include <functional>
 #include <set>
@@ -149,15 +150,17 @@ TEST( Schema, WhatIsNotWellFormedIsNotKept )
 
 TEST( Schema, OneInstanceForAllThreadsAndModules )
 {
-  constexpr int Threads = 4, Rounds = 200;
+  constexpr int Threads = 4, Rounds = 2000;
   std::vector< std::vector< const ISchema* > > Made( Threads );
+  std::barrier Start( Threads );
   {
     std::vector< std::jthread > Workers;
     for ( auto& rMade : Made )
     {
       Workers.emplace_back(
-          [&rMade]
+          [&rMade, &Start]
           {
+            Start.arrive_and_wait();
             for ( int Round = 0; Round < Rounds; ++Round )
             {
               rMade.push_back( VRandomValues( 7000 + static_cast< unsigned >( Round ) ).Schema( 4 ) );

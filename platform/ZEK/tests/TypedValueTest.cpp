@@ -161,7 +161,9 @@ TEST( TypedValue, BadBytesAreRefused )
   EXPECT_FALSE( ReadTyped( BadCount, Presets ) || IsWellFormed( BadCount ) );
   const ZEK::VTypedValue BadLength = Damaged( std::vector< VPreset >( 1 ), 7, 0xff );
   EXPECT_FALSE( ReadTyped( BadLength, Presets ) || IsWellFormed( BadLength ) );
-  // Two elements are a List, but no optional.
+  // Two elements are a List, but no optional, whatever follows.
+  std::pair< std::optional< bool >, bool > Pair;
+  EXPECT_FALSE( ReadTyped( Damaged( std::pair( std::vector< bool >{ true }, true ), 0, 2 ), Pair ) );
   EXPECT_FALSE( ReadTyped( MakeValue( std::vector< bool >{ true, true } ), Maybe ) );
 }
 
@@ -184,6 +186,7 @@ TEST( TypedValue, WideTextsReplaceWhatHasNoForm )
   {
     EXPECT_EQ( Utf8ToWide( pBytes ), rWide ) << pBytes;
   }
+  EXPECT_EQ( Utf8ToWide( std::string_view( "\xc3\xa9", 1 ) ), L"\ufffd" );
   EXPECT_EQ( WideToUtf8( std::wstring{ static_cast< wchar_t >( 0xd800 ), L'a' } ), "\xef\xbf\xbd"
                                                                                    "a" );
   for ( std::uint32_t Character = 1; Character <= 0x10ffff; Character += 97 )

@@ -78,7 +78,7 @@ TEST( ValueText, EveryKindHasItsText )
       { MakeValue( -0.0 ), "0" },
       { MakeValue( 5e-324 ), "5e-324" },
       { MakeValue( "" ), R"("")" },
-      { MakeValue( "a\"\\/\n\t\x01\x1f\xc3\xa9\xff" ), "\"a\\\"\\\\/\\n\\t\\u0001\\u001f\xc3\xa9\xff\"" },
+      { MakeValue( "a\"\\/\n\t\x01\x10\x1f\xc3\xa9\xff" ), "\"a\\\"\\\\/\\n\\t\\u0001\\u0010\\u001f\xc3\xa9\xff\"" },
       { MakeValue( std::vector< int >{} ), "[]" },
       { MakeValue( std::vector< int >{ 1, -2 } ), "[1,-2]" },
       { MakeValue( std::array< bool, 2 >{ true, false } ), "[true,false]" },

@@ -58,7 +58,8 @@ public:
   virtual ::Store::VStoreEntry* FindEntry( const VEntryPath& i_rPath ) const = 0;
 };
 
-/// A read scope as long as the object lives. Thread: the one that made it.
+/// A read scope as long as the object lives. Thread: the one that made it. As its destructor may throw, it stands on
+/// its own in a block, never in a container or `std::optional`.
 class VStoreReadScope
 {
 public:
@@ -80,7 +81,7 @@ private:
   IStoreReader* m_pReader;
 };
 
-/// A write scope as long as the object lives; empty inside a read scope. Thread: the one that made it.
+/// A write scope as long as the object lives; empty inside a read scope. Otherwise as the read scope.
 class VStoreWriteScope
 {
 public:
