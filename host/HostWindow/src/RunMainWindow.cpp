@@ -12,7 +12,8 @@ constexpr const char* pStyleSheet =
     "QMainWindow::separator { background: #14161a; width: 3px; height: 3px; }"
     "QDockWidget::title { padding: 4px; background: #22262b; }"
     "QToolBar { border: none; spacing: 2px; }"
-    "QStatusBar::item { border: none; }";
+    "QStatusBar::item { border: none; }"
+    "QMenu { etch-disabled-text: 0; }";
 
 void ApplyTheme( const HostServices::VHost& i_rHost )
 {
