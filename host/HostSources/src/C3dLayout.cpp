@@ -1,5 +1,7 @@
 #include "C3dLayout.h"
 
+#include <HostSources/VC3dReader.h>
+
 #include <algorithm>
 #include <cmath>
 
@@ -17,7 +19,7 @@ std::string At( std::uint64_t i_Offset )
 ZEK::IResult ReadHeader( IByteSource& io_rSource, VHeader& o_rHeader, std::string& o_rMessage )
 {
   const auto Bytes = io_rSource.Read( 0, BlockSize );
-  if ( Bytes.size() < 2 || Bytes[1] != std::byte{ 0x50 } || Bytes[0] == std::byte{ 0 } )
+  if ( !LooksLikeC3d( Bytes ) )
   {
     o_rMessage = Bytes.empty()
                      ? At( 0 ) + "expected a C3D file, found no bytes"

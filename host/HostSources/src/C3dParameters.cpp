@@ -3,16 +3,28 @@
 #include "Units.h"
 
 #include <algorithm>
-#include <cctype>
 #include <cmath>
 
 namespace HostSources::C3d
 {
 namespace
 {
+/// Of groups, parameters and texts: a word counts no further.
+constexpr std::size_t Most = 0xFFFF;
+
 char Upper( char i_Character )
 {
   return i_Character >= 'a' && i_Character <= 'z' ? static_cast< char >( i_Character - 'a' + 'A' ) : i_Character;
+}
+
+std::string Upper( std::string_view i_Text )
+{
+  std::string Text( i_Text );
+  for ( char& rCharacter : Text )
+  {
+    rCharacter = Upper( rCharacter );
+  }
+  return Text;
 }
 
 std::size_t SignedMagnitude( std::byte i_Byte )
@@ -74,7 +86,7 @@ void VParameters::Parse( EForm i_Form, std::vector< std::byte > i_Section, std::
     io_rNotes.push_back( "byte offset " + std::to_string( i_FileOffset + Position ) + ": " + i_rWhat +
                          "; the parameters from there on are left out" );
   };
-  while ( Position + 2 <= m_Section.size() )
+  for ( std::size_t Count = 0; Position + 2 <= m_Section.size(); ++Count )
   {
     const std::size_t NameSize = SignedMagnitude( m_Section[Position] );
     const auto Id = static_cast< std::int8_t >( m_Section[Position + 1] );
@@ -82,25 +94,34 @@ void VParameters::Parse( EForm i_Form, std::vector< std::byte > i_Section, std::
     {
       return;
     }
+    if ( Count >= Most )
+    {
+      return Odd( "expected no more than 65535 parameters" );
+    }
     const std::size_t LinkOffset = Position + 2 + NameSize;
     if ( LinkOffset + 2 > m_Section.size() )
     {
       return Odd( "expected a parameter, found the end of the section" );
     }
-    const std::string_view Name( pText + Position + 2, NameSize );
+    std::string Name = Upper( { pText + Position + 2, NameSize } );
     const std::size_t Link = LoadU16( m_Form, m_Section.data() + LinkOffset );
     if ( Id > 0 )
     {
-      VParameter Parameter{ Name, Id, 0, {}, {} };
+      VParameter Parameter;
       if ( ParseParameter( LinkOffset + 2, Parameter ) == 0 )
       {
         return Odd( "expected a parameter whose data lie within the section" );
       }
-      m_Parameters.push_back( Parameter );
+      m_Parameters.try_emplace( { Id, std::move( Name ) }, Parameter );
     }
     else
     {
-      m_Groups.push_back( { Name, static_cast< std::int8_t >( Id == -128 ? 127 : -Id ) } );
+      auto& rIds = m_Groups[std::move( Name )];
+      const auto GroupId = static_cast< std::int8_t >( Id == -128 ? 127 : -Id );
+      if ( std::find( rIds.begin(), rIds.end(), GroupId ) == rIds.end() )
+      {
+        rIds.push_back( GroupId );
+      }
     }
     if ( Link == 0 )
     {
@@ -114,29 +135,20 @@ void VParameters::Parse( EForm i_Form, std::vector< std::byte > i_Section, std::
   }
 }
 
-bool VParameters::HasGroup( std::string_view i_Group ) const
-{
-  return std::any_of( m_Groups.begin(), m_Groups.end(),
-                      [&]( const VGroup& i_rGroup )
-                      {
-                        return SameName( i_rGroup.Name, i_Group );
-                      } );
-}
-
 const VParameters::VParameter* VParameters::Find( std::string_view i_Group, std::string_view i_Name ) const
 {
-  for ( const VGroup& rGroup : m_Groups )
+  const auto Group = m_Groups.find( Upper( i_Group ) );
+  if ( Group == m_Groups.end() )
   {
-    if ( !SameName( rGroup.Name, i_Group ) )
+    return nullptr;
+  }
+  const std::string Name = Upper( i_Name );
+  for ( const std::int8_t Id : Group->second )
+  {
+    const auto Found = m_Parameters.find( { Id, Name } );
+    if ( Found != m_Parameters.end() )
     {
-      continue;
-    }
-    for ( const VParameter& rParameter : m_Parameters )
-    {
-      if ( rParameter.Group == rGroup.Id && SameName( rParameter.Name, i_Name ) )
-      {
-        return &rParameter;
-      }
+      return &Found->second;
     }
   }
   return nullptr;
@@ -189,7 +201,7 @@ std::size_t VParameters::TextCount( const VParameter& i_rParameter )
   std::size_t Count = 1;
   for ( std::size_t Index = 1; Index < i_rParameter.Dimensions.size(); ++Index )
   {
-    Count = std::min< std::size_t >( Count * i_rParameter.Dimension( Index ), 0xFFFF );
+    Count = std::min( Count * i_rParameter.Dimension( Index ), Most );
   }
   return i_rParameter.Data.empty() ? std::min< std::size_t >( Count, 255 ) : Count;
 }
@@ -223,7 +235,7 @@ std::vector< std::string > VParameters::Texts( std::string_view i_Group, const s
   const VParameter* pParameter = Find( i_Group, i_rName );
   for ( int Part = 2; pParameter; ++Part )
   {
-    for ( std::size_t Index = 0, Count = TextCount( *pParameter ); Index < Count; ++Index )
+    for ( std::size_t Index = 0, Count = TextCount( *pParameter ); Index < Count && All.size() < Most; ++Index )
     {
       All.push_back( TextAt( *pParameter, Index ) );
     }

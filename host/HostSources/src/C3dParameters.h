@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <map>
 #include <span>
 #include <string>
 #include <string_view>
@@ -12,14 +13,13 @@
 namespace HostSources::C3d
 {
 
-/// The parameter section of a C3D file. Values are looked up by group and name, case ignored.
+/// The parameter section of a C3D file. Values are looked up by group and name, case ignored; of two by the same name
+/// the first counts.
 class VParameters
 {
 public:
   struct VParameter
   {
-    std::string_view Name;
-    std::int8_t Group = 0;
     std::int8_t Type = 0; ///< -1 text, 1 byte, 2 integer, 4 float
     std::span< const std::byte > Dimensions;
     std::span< const std::byte > Data;
@@ -35,12 +35,12 @@ public:
     }
   };
 
-  /// Takes the section, without its first four bytes. What cannot be read ends the walk and is told in the notes.
+  /// Takes the section, without its first four bytes. What cannot be read, or is more than any file needs, ends the
+  /// walk and is told in the notes.
   void Parse( EForm i_Form, std::vector< std::byte > i_Section, std::uint64_t i_FileOffset,
               std::vector< std::string >& io_rNotes );
 
   const VParameter* Find( std::string_view i_Group, std::string_view i_Name ) const;
-  bool HasGroup( std::string_view i_Group ) const;
 
   /// An integer or float value; `i_Default` where there is none. `i_bUnsigned`: integers are 0 to 65535.
   double Number( std::string_view i_Group, std::string_view i_Name, double i_Default, std::size_t i_Index = 0,
@@ -51,18 +51,12 @@ public:
                      std::size_t i_Index = 0 ) const;
   /// The text of a parameter, or of one of its entries; blanks and zeros at the end are dropped.
   std::string Text( std::string_view i_Group, std::string_view i_Name, std::size_t i_Index = 0 ) const;
-  /// All texts of NAME, NAME2, NAME3 … in a row: one parameter holds 255 at most.
+  /// All texts of NAME, NAME2, NAME3 … in a row, as one parameter holds 255 at most; no more than there can be points.
   std::vector< std::string > Texts( std::string_view i_Group, const std::string& i_rName ) const;
   /// All numbers of NAME, NAME2, …
   std::vector< double > Numbers( std::string_view i_Group, const std::string& i_rName, bool i_bUnsigned = false ) const;
 
 private:
-  struct VGroup
-  {
-    std::string_view Name;
-    std::int8_t Id = 0;
-  };
-
   /// The number of texts in a parameter: the product of all dimensions but the first.
   static std::size_t TextCount( const VParameter& i_rParameter );
   static std::string TextAt( const VParameter& i_rParameter, std::size_t i_Index );
@@ -70,8 +64,9 @@ private:
 
   EForm m_Form = EForm::Intel;
   std::vector< std::byte > m_Section;
-  std::vector< VGroup > m_Groups;
-  std::vector< VParameter > m_Parameters;
+  // Names in upper case; several groups may bear one name.
+  std::map< std::string, std::vector< std::int8_t >, std::less<> > m_Groups;
+  std::map< std::pair< std::int8_t, std::string >, VParameter > m_Parameters;
 };
 
 /// Equal but for the case of ASCII letters.

@@ -1,5 +1,7 @@
 #include "ForcePlates.h"
 
+#include "VectorMath.h"
+
 #include <algorithm>
 #include <cmath>
 
@@ -7,36 +9,20 @@ namespace HostSources::C3d
 {
 namespace
 {
-using CoreMoxelTypes::D3;
 using VSix = std::array< double, 6 >;
 
 /// Below this load a centre of pressure is noise.
 constexpr double LeastLoad = 5; // N
 
-D3 operator+( const D3& i_rA, const D3& i_rB )
-{
-  return { i_rA.x + i_rB.x, i_rA.y + i_rB.y, i_rA.z + i_rB.z };
-}
-D3 operator-( const D3& i_rA, const D3& i_rB )
-{
-  return { i_rA.x - i_rB.x, i_rA.y - i_rB.y, i_rA.z - i_rB.z };
-}
-D3 operator*( const D3& i_rA, double i_Factor )
-{
-  return { i_rA.x * i_Factor, i_rA.y * i_Factor, i_rA.z * i_Factor };
-}
-D3 Cross( const D3& i_rA, const D3& i_rB )
-{
-  return { i_rA.y * i_rB.z - i_rA.z * i_rB.y, i_rA.z * i_rB.x - i_rA.x * i_rB.z, i_rA.x * i_rB.y - i_rA.y * i_rB.x };
-}
+/// False for a vector that has no direction.
 bool Normalise( D3& io_rA )
 {
-  const double Length = std::sqrt( io_rA.x * io_rA.x + io_rA.y * io_rA.y + io_rA.z * io_rA.z );
-  if ( !( Length > 1e-6 ) || !std::isfinite( Length ) )
+  const double Size = Length( io_rA );
+  if ( !( Size > 1e-6 ) || !std::isfinite( Size ) )
   {
     return false;
   }
-  io_rA = io_rA * ( 1 / Length );
+  io_rA = io_rA * ( 1 / Size );
   return true;
 }
 D3 Rotate( const CoreMoxelTypes::Rigid& i_rPose, const D3& i_rV )
@@ -298,14 +284,13 @@ std::vector< std::uint32_t > ReadChannels( const VParameters& i_rParameters, std
   return Channels;
 }
 
-bool ReadCalibration( const VParameters& i_rParameters, std::size_t i_Plate, VPlateMaker& io_rMaker )
+bool TakeCalibration( const std::vector< double >& i_rMatrices, std::size_t i_Plate, VPlateMaker& io_rMaker )
 {
-  const std::vector< double > Matrix = i_rParameters.Numbers( "FORCE_PLATFORM", "CAL_MATRIX" );
-  if ( Matrix.size() < ( i_Plate + 1 ) * 36 )
+  if ( i_rMatrices.size() < ( i_Plate + 1 ) * 36 )
   {
     return false;
   }
-  std::copy_n( Matrix.begin() + static_cast< std::ptrdiff_t >( i_Plate * 36 ), 36, io_rMaker.Calibration.begin() );
+  std::copy_n( i_rMatrices.begin() + static_cast< std::ptrdiff_t >( i_Plate * 36 ), 36, io_rMaker.Calibration.begin() );
   return std::all_of( io_rMaker.Calibration.begin(), io_rMaker.Calibration.end(),
                       []( double i_Value )
                       {
@@ -313,13 +298,21 @@ bool ReadCalibration( const VParameters& i_rParameters, std::size_t i_Plate, VPl
                       } );
 }
 
-void ReadSamples( const VParameters& i_rParameters, std::size_t i_Plate, VForcePlate& io_rPlate,
-                  VRecording& io_rRecording )
+void ReadSamples( const VParameters& i_rParameters, const std::vector< double >& i_rMatrices, std::size_t i_Plate,
+                  VForcePlate& io_rPlate, VRecording& io_rRecording )
 {
   if ( io_rPlate.Type < 1 || io_rPlate.Type > 4 )
   {
     io_rRecording.Notes.push_back( io_rPlate.Name + ": expected a plate of type 1 to 4, found type " +
                                    std::to_string( io_rPlate.Type ) + "; the plate has no samples." );
+    return;
+  }
+  // Channels may be shared, yet no file needs as many plates as channels; a damaged one could ask for any memory.
+  if ( i_Plate > 0 && i_Plate >= io_rRecording.AnalogChannels.size() )
+  {
+    io_rRecording.Notes.push_back( io_rPlate.Name + ": expected more analog channels than force plates, found " +
+                                   std::to_string( io_rRecording.AnalogChannels.size() ) +
+                                   "; the plate has no samples." );
     return;
   }
   io_rPlate.Channels = ReadChannels( i_rParameters, i_Plate, io_rPlate, io_rRecording );
@@ -328,7 +321,7 @@ void ReadSamples( const VParameters& i_rParameters, std::size_t i_Plate, VForceP
     return;
   }
   VPlateMaker Maker{ io_rRecording, io_rPlate };
-  if ( io_rPlate.Type == 4 && !ReadCalibration( i_rParameters, i_Plate, Maker ) )
+  if ( io_rPlate.Type == 4 && !TakeCalibration( i_rMatrices, i_Plate, Maker ) )
   {
     io_rRecording.Notes.push_back( io_rPlate.Name +
                                    ": expected a matrix in FORCE_PLATFORM:CAL_MATRIX; the plate has no samples." );
@@ -346,6 +339,7 @@ void ReadForcePlates( const VParameters& i_rParameters, VRecording& io_rRecordin
   const std::vector< double > Types = i_rParameters.Numbers( "FORCE_PLATFORM", "TYPE" );
   const std::vector< double > Corners = i_rParameters.Numbers( "FORCE_PLATFORM", "CORNERS" );
   const std::vector< double > Origins = i_rParameters.Numbers( "FORCE_PLATFORM", "ORIGIN" );
+  const std::vector< double > Matrices = i_rParameters.Numbers( "FORCE_PLATFORM", "CAL_MATRIX" );
   // USED is missing from some files that do have plates.
   const std::size_t Used = i_rParameters.Count( "FORCE_PLATFORM", "USED", Types.size() );
   const std::size_t Count = std::min( { Used, Types.size(), Corners.size() / 12 } );
@@ -367,7 +361,7 @@ void ReadForcePlates( const VParameters& i_rParameters, VRecording& io_rRecordin
                                      "rectangle; the plate is left out." );
       continue;
     }
-    ReadSamples( i_rParameters, Index, Plate, io_rRecording );
+    ReadSamples( i_rParameters, Matrices, Index, Plate, io_rRecording );
     io_rRecording.ForcePlates.push_back( std::move( Plate ) );
   }
 }

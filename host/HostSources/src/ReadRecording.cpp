@@ -3,9 +3,10 @@
 #include <HostSources/VC3dReader.h>
 #include <HostSources/VTrcReader.h>
 
+#include "Units.h"
+
 #include <algorithm>
 #include <cctype>
-#include <new>
 
 namespace HostSources
 {
@@ -20,6 +21,33 @@ bool HasSuffix( const std::filesystem::path& i_rPath, const char* i_pSuffix )
                     return static_cast< char >( std::tolower( i_Character ) );
                   } );
   return Suffix == i_pSuffix;
+}
+
+/// A text is read as a whole before its lines are.
+ZEK::IResult ReadTrcFile( VFileSource& io_rSource, const std::string& i_rName, VRecording& o_rRecording,
+                          std::string& o_rMessage, const VProgress& i_rProgress )
+{
+  std::span< const std::byte > Bytes;
+  const ZEK::IResult Loaded = ReadGuarded( ERecordingFormat::Trc, i_rName, o_rRecording, o_rMessage,
+                                           [&]
+                                           {
+                                             if ( i_rProgress && !i_rProgress( 0 ) )
+                                             {
+                                               o_rMessage = "the reading was stopped";
+                                               return ZEK::IResult( ZEK::IResult::Canceled );
+                                             }
+                                             const auto Size = static_cast< std::size_t >( io_rSource.Size() );
+                                             Bytes = io_rSource.Read( 0, Size );
+                                             if ( Bytes.size() < Size )
+                                             {
+                                               o_rMessage = "byte offset " + std::to_string( Bytes.size() ) +
+                                                            ": expected " + std::to_string( Size ) +
+                                                            " bytes, and they could not be read";
+                                               return ZEK::IResult( ZEK::IResult::FileIOFailure );
+                                             }
+                                             return ZEK::IResult();
+                                           } );
+  return Loaded.IsOk() ? ReadTrc( Bytes, i_rName, o_rRecording, o_rMessage, i_rProgress ) : Loaded;
 }
 } // namespace
 
@@ -50,28 +78,7 @@ ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_
   // With damaged first bytes the reader of the file's suffix can still say best what is wrong.
   if ( bTrc || ( !bC3d && HasSuffix( i_rPath, ".trc" ) ) )
   {
-    if ( i_rProgress && !i_rProgress( 0 ) )
-    {
-      o_rMessage = Name + ": the reading was stopped";
-      return ZEK::IResult::Canceled;
-    }
-    try
-    {
-      const auto Size = static_cast< std::size_t >( Source.Size() );
-      const auto Bytes = Source.Read( 0, Size );
-      if ( Bytes.size() == Size )
-      {
-        return ReadTrc( Bytes, Name, o_rRecording, o_rMessage, i_rProgress );
-      }
-      o_rMessage = Name + ": byte offset " + std::to_string( Bytes.size() ) + ": expected " + std::to_string( Size ) +
-                   " bytes, and they could not be read";
-      return ZEK::IResult::FileIOFailure;
-    }
-    catch ( const std::bad_alloc& )
-    {
-      o_rMessage = Name + ": expected memory for what the file holds, and there is not enough";
-      return ZEK::IResult::AllocationFailure;
-    }
+    return ReadTrcFile( Source, Name, o_rRecording, o_rMessage, i_rProgress );
   }
   if ( bC3d || HasSuffix( i_rPath, ".c3d" ) )
   {

@@ -83,8 +83,9 @@ bool IsUsableRate( double i_RateHz )
 
 void TakeRate( double i_RateHz, VRecording& io_rRecording )
 {
+  constexpr double Year = 365.0 * 86400; // s
   io_rRecording.RateHz = i_RateHz;
-  if ( !IsUsableRate( i_RateHz ) )
+  if ( !IsUsableRate( i_RateHz ) || io_rRecording.DurationSeconds() > Year )
   {
     io_rRecording.RateHz = 100;
     io_rRecording.Notes.emplace_back( "The file gives no usable frame rate; 100 Hz was taken." );

@@ -17,7 +17,8 @@ namespace HostSources
 /// A rate that gives a frame at least one tick and a day at least one frame.
 bool IsUsableRate( double i_RateHz );
 
-/// Takes the rate, or 100 Hz with a note where it is of no use.
+/// Takes the rate, or 100 Hz with a note where it is of no use or would make the frames known so far last longer than
+/// ticks can be counted.
 void TakeRate( double i_RateHz, VRecording& io_rRecording );
 
 /// Takes a unit of length: mm, cm, m or in; any other counts as mm, with a note.
@@ -33,7 +34,7 @@ ZEK::IResult ReadGuarded( ERecordingFormat i_Format, const std::string& i_rName,
 {
   o_rRecording = {};
   o_rRecording.Format = i_Format;
-  o_rRecording.Name = std::filesystem::path( i_rName ).filename().string();
+  o_rRecording.Name = ToUtf8( std::filesystem::path( i_rName ).filename().string() );
   o_rMessage.clear();
   ZEK::IResult Result;
   try

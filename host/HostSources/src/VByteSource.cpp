@@ -22,14 +22,22 @@ std::span< const std::byte > VMemorySource::Read( std::uint64_t i_Offset, std::s
 
 VFileSource::~VFileSource()
 {
+  Close();
+}
+
+void VFileSource::Close()
+{
   if ( m_File >= 0 )
   {
     close( m_File );
   }
+  m_File = -1;
+  m_Size = 0;
 }
 
 ZEK::IResult VFileSource::Open( const std::filesystem::path& i_rPath, std::string& o_rMessage )
 {
+  Close();
   const std::string Name = i_rPath.string();
   // A pipe without a writer would make a plain open wait for ever.
   m_File = open( Name.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK );

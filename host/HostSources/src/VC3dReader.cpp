@@ -8,8 +8,7 @@
 
 #include <algorithm>
 #include <cmath>
-#include <filesystem>
-#include <new>
+#include <limits>
 
 namespace HostSources
 {

@@ -6,6 +6,7 @@
 #include <chrono>
 #include <condition_variable>
 #include <mutex>
+#include <new>
 #include <thread>
 
 using namespace ZEK;
@@ -33,6 +34,7 @@ struct VSourcePump::VImpl
   void Stop();
   void RunLive();
   void RunFollow();
+  IResult TryMakeAndAdd( std::int64_t i_Index, bool i_bClear );
   bool MakeAndAdd( std::int64_t i_Index, bool i_bClear );
 
   std::shared_ptr< IFrameSource > pSource;
@@ -74,22 +76,36 @@ VSourcePump::~VSourcePump()
   Stop();
 }
 
-bool VSourcePump::VImpl::MakeAndAdd( std::int64_t i_Index, bool i_bClear )
+/// What a source or a listener of the cache throws, a lack of memory above all, must not end the process.
+IResult VSourcePump::VImpl::TryMakeAndAdd( std::int64_t i_Index, bool i_bClear )
 {
-  VFlowStateRef State;
-  IResult Result;
+  try
   {
-    const std::lock_guard Lock( SourceGuard );
-    Result = pSource->MakeState( i_Index, Maker, State );
-  }
-  if ( Result.IsOk() )
-  {
-    if ( i_bClear )
+    VFlowStateRef State;
+    IResult Result;
+    {
+      const std::lock_guard Lock( SourceGuard );
+      Result = pSource->MakeState( i_Index, Maker, State );
+    }
+    if ( Result.IsOk() && i_bClear )
     {
       pCache->Clear();
     }
-    Result = pCache->Add( State );
+    return Result.IsOk() ? pCache->Add( State ) : Result;
   }
+  catch ( const std::bad_alloc& )
+  {
+    return IResult::AllocationFailure;
+  }
+  catch ( ... )
+  {
+    return IResult::FailedWithException;
+  }
+}
+
+bool VSourcePump::VImpl::MakeAndAdd( std::int64_t i_Index, bool i_bClear )
+{
+  const IResult Result = TryMakeAndAdd( i_Index, i_bClear );
   bool bFirstFailure = false;
   {
     const std::lock_guard Lock( Guard );
@@ -181,16 +197,14 @@ void VSourcePump::VImpl::Start( bool i_bLive, std::int64_t i_First )
 {
   const std::lock_guard Control( ControlGuard );
   Stop();
-  {
-    const std::lock_guard Lock( Guard );
-    First = std::max< std::int64_t >( i_First, 0 );
-    bStop = false;
-    bRunning = true;
-    bLive = i_bLive;
-    bFailing = false;
-    Shown = -1;
-  }
+  const std::lock_guard Lock( Guard );
+  First = std::max< std::int64_t >( i_First, 0 );
+  bStop = false;
+  bLive = i_bLive;
+  bFailing = false;
+  Shown = -1;
   Thread = std::thread( i_bLive ? &VImpl::RunLive : &VImpl::RunFollow, this );
+  bRunning = true; // only now: nobody may wait for a thread that could not be made
 }
 
 void VSourcePump::VImpl::Stop()

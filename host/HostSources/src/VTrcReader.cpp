@@ -375,6 +375,7 @@ ZEK::IResult VReader::Finish()
                                                                return !i_rPoint.IsValid();
                                                              } ) );
   rR.Form = "text";
+  TakeRate( rR.RateHz, rR ); // again, as the frames are known only now
   ChooseUpAxisByData( rR, "the format does not tell" );
   if ( m_PartBlank > 0 )
   {

@@ -9,8 +9,6 @@ namespace
 using C3dWriter::EForm;
 using C3dWriter::VFile;
 
-constexpr double Inch = 25.4;
-
 /// Two points and two channels of two samples, three frames; the second point is a gap in the second frame.
 VFile SmallFile( EForm i_Form, bool i_bFloat )
 {
@@ -93,35 +91,24 @@ INSTANTIATE_TEST_SUITE_P( All, C3dForms,
                           testing::Combine( testing::Values( EForm::Intel, EForm::Dec, EForm::Mips ),
                                             testing::Bool() ) );
 
-TEST( C3dNumberForms, SmallAndLargeFloatsOfTheDecForm )
-{
-  VFile File = SmallFile( EForm::Dec, true );
-  File.Frames[0][0] = 3.0e37;
-  File.Frames[0][1] = -1.5e-30;
-  File.Frames[0][2] = 0;
-  const VRecording R = MustReadC3d( File );
-  EXPECT_FLOAT_EQ( R.Points[0].x, 3.0e37f );
-  EXPECT_FLOAT_EQ( R.Points[0].y, -1.5e-30f );
-  EXPECT_EQ( R.Points[0].z, 0 );
-}
-
 TEST( C3dUnits, LengthsBecomeMillimetres )
 {
-  const std::vector< std::pair< std::string, double > > Units{
-      { "mm", 1 }, { "cm", 10 }, { "m", 1000 }, { "in", Inch } };
-  for ( const auto& [Name, Scale] : Units )
+  VFile File = SmallFile( EForm::Dec, true );
+  // The first point is of very large and very small numbers, which the DEC form holds as well.
+  std::copy_n( std::array{ 3.0e34, -1.5e-30, 0.0 }.begin(), 3, File.Frames[0].begin() );
+  for ( const auto& [Name, Scale] :
+        { std::pair{ "mm", 1.0 }, { "cm", 10.0 }, { "M", 1000.0 }, { "in", 25.4 }, { "furlong", 1.0 } } )
   {
     SCOPED_TRACE( Name );
-    VFile File = SmallFile( EForm::Intel, true );
     File.Unit = Name;
     const VRecording R = MustReadC3d( File );
+    EXPECT_FLOAT_EQ( R.Points[0].x, static_cast< float >( 3.0e34 * Scale ) );
+    EXPECT_FLOAT_EQ( R.Points[0].y, static_cast< float >( -1.5e-30 * Scale ) );
+    EXPECT_EQ( R.Points[0].z, 0 );
     ExpectPoint( R, 0, "FOOT", Scale, 2 * Scale, 3 * Scale );
     EXPECT_FLOAT_EQ( R.Frame( 0 )[0].Residual, static_cast< float >( 2 * Scale ) );
-    EXPECT_EQ( R.Unit, Name );
+    EXPECT_EQ( R.Notes.empty(), R.Unit == Name ) << "only what is not known is noted";
   }
-  VFile Odd = SmallFile( EForm::Intel, true );
-  Odd.Unit = "furlong";
-  EXPECT_THAT( MustReadC3d( Odd ).Notes, testing::Contains( testing::HasSubstr( "\"furlong\" is not known" ) ) );
 }
 
 TEST( C3dGaps, PositionsThatAreNoNumbersAreMissing )
@@ -192,21 +179,14 @@ TEST( C3dLabels, MoreThan255 )
 
 TEST( C3dLongFiles, EveryWayOfSayingTheLength )
 {
-  const std::size_t Frames = 70000;
-  VFile Trial = LongFile( Frames );
-  Trial.HeaderLast = 65535;
-  SetLongTrial( Trial, 1, 70000 );
-  VFile Wrapped = LongFile( Frames );
-  Wrapped.HeaderLast = 70000 & 0xFFFF;
-  SetLongTrial( Wrapped, 1, 70000 );
-  VFile LongFrames = LongFile( Frames );
-  LongFrames.HeaderLast = 65535;
-  LongFrames.SetParameter( { "POINT", "LONG_FRAMES", 4, {}, { 70000 }, {} } );
-  VFile FloatFrames = LongFile( Frames );
-  FloatFrames.HeaderLast = 65535;
-  FloatFrames.SetParameter( { "POINT", "FRAMES", 4, {}, { 70000 }, {} } );
-  VFile Unsaid = LongFile( Frames );
+  VFile Unsaid = LongFile( 70000 );
   Unsaid.HeaderLast = 65535;
+  VFile Trial = Unsaid, LongFrames = Unsaid, FloatFrames = Unsaid;
+  SetLongTrial( Trial, 1, 70000 );
+  VFile Wrapped = Trial;
+  Wrapped.HeaderLast = 70000 & 0xFFFF;
+  LongFrames.SetParameter( { "POINT", "LONG_FRAMES", 4, {}, { 70000 }, {} } );
+  FloatFrames.SetParameter( { "POINT", "FRAMES", 4, {}, { 70000 }, {} } );
   for ( const VFile& rFile : { Trial, Wrapped, LongFrames, FloatFrames, Unsaid } )
   {
     const VRecording R = MustReadC3d( rFile );
@@ -215,15 +195,9 @@ TEST( C3dLongFiles, EveryWayOfSayingTheLength )
     EXPECT_EQ( R.Frame( 69999 )[0].x, 69999 );
     EXPECT_EQ( R.FirstFrame, 1 );
   }
-}
-
-TEST( C3dLongFiles, NumbersAbove32767And65535 )
-{
-  VFile Unsigned = LongFile( 40000 );
-  EXPECT_EQ( MustReadC3d( Unsigned ).FrameCount, 40000 );
+  EXPECT_EQ( MustReadC3d( LongFile( 40000 ) ).FrameCount, 40000 ) << "a word has no sign";
   VFile Late = LongFile( 5 );
-  Late.HeaderFirst = 65535;
-  Late.HeaderLast = 65535;
+  Late.HeaderFirst = Late.HeaderLast = 65535;
   SetLongTrial( Late, 200000, 200004 );
   const VRecording R = MustReadC3d( Late );
   EXPECT_EQ( R.FirstFrame, 200000 );
@@ -253,29 +227,24 @@ TEST( C3dEvents, FromTheGroupAndFromTheHeader )
 
 TEST( C3dUpAxis, IsReadFromTheScreenAxesOrTheData )
 {
-  const auto Axis = []( const char* i_pX, const char* i_pY )
+  const std::tuple< const char*, const char*, EUpAxis, const char* > Cases[] = {
+      { "+X", "+Z", EUpAxis::Z, "z is up: POINT:Y_SCREEN is \"+Z\"" },
+      { "+X", "+Y", EUpAxis::Y, "y is up: POINT:Y_SCREEN" },
+      { "-X", "-Z", EUpAxis::Z, "z is up: POINT:Y_SCREEN" },
+      { "+Y", "", EUpAxis::Z, "z is up: POINT:X_SCREEN" },
+      { "+Z", "", EUpAxis::Y, "y is up: POINT:X_SCREEN" },
+      { "", "", EUpAxis::Y, "y is up: POINT:X_SCREEN and Y_SCREEN do not tell" } };
+  for ( const auto& [pX, pY, Expected, pReason] : Cases )
   {
     VFile File = SmallFile( EForm::Intel, true );
-    if ( i_pX )
-    {
-      File.SetParameter( { "POINT", "X_SCREEN", -1, { 2 }, {}, { i_pX } } );
-    }
-    if ( i_pY )
-    {
-      File.SetParameter( { "POINT", "Y_SCREEN", -1, { 2 }, {}, { i_pY } } );
-    }
+    File.SetParameter( { "POINT", "X_SCREEN", -1, { 2 }, {}, { pX } } );
+    File.SetParameter( { "POINT", "Y_SCREEN", -1, { 2 }, {}, { pY } } );
     // A body 1.7 m tall along y.
     File.Frames = { { 400, 10, 300, 0, 500, 1700, 350, 0, 0, 0, 0, 0 } };
-    return MustReadC3d( File );
-  };
-  EXPECT_EQ( Axis( "+X", "+Z" ).UpAxis, EUpAxis::Z );
-  EXPECT_EQ( Axis( "+X", "+Y" ).UpAxis, EUpAxis::Y );
-  EXPECT_EQ( Axis( "-X", "-Z" ).UpAxis, EUpAxis::Z );
-  EXPECT_EQ( Axis( "+Y", nullptr ).UpAxis, EUpAxis::Z );
-  EXPECT_EQ( Axis( "+Z", nullptr ).UpAxis, EUpAxis::Y );
-  const VRecording ByData = Axis( nullptr, nullptr );
-  EXPECT_EQ( ByData.UpAxis, EUpAxis::Y );
-  EXPECT_THAT( ByData.UpAxisReason, testing::StartsWith( "y is up: POINT:X_SCREEN and Y_SCREEN do not tell" ) );
+    const VRecording R = MustReadC3d( File );
+    EXPECT_EQ( R.UpAxis, Expected );
+    EXPECT_THAT( R.UpAxisReason, testing::StartsWith( pReason ) );
+  }
 }
 
 } // namespace HostSources

@@ -145,32 +145,24 @@ TEST_P( ForcePlateTypes, ForceOnThePlateIsTurnedIntoForceOnTheBody )
 
 INSTANTIATE_TEST_SUITE_P( Types, ForcePlateTypes, testing::Values( 1, 2, 3 ) );
 
-TEST( ForcePlates, AnOriginThatPointsTheOtherWayMeansTheSame )
+TEST( ForcePlates, AnOriginOrCornersTheOtherWayRound )
 {
-  VFile File = PlateFile( 2, { SensorsOf( 2, Walking ) } );
-  for ( C3dWriter::VParameter& rParameter : File.Extra )
+  const auto With = []( const char* i_pName, std::vector< double > i_Numbers )
   {
-    if ( rParameter.Name == "ORIGIN" )
+    VFile File = PlateFile( 2, { SensorsOf( 2, Walking ) } );
+    for ( C3dWriter::VParameter& rParameter : File.Extra )
     {
-      rParameter.Numbers = { -SensorX, -SensorY, Depth };
+      if ( rParameter.Name == i_pName )
+      {
+        rParameter.Numbers = i_Numbers;
+      }
     }
-  }
-  ExpectLoad( MustReadC3d( File ), 0, Walking );
-}
-
-TEST( ForcePlates, CornersInTheWrongOrderStillGiveAForceThatPointsUp )
-{
-  VFile File = PlateFile( 2, { SensorsOf( 2, Walking ) } );
-  for ( C3dWriter::VParameter& rParameter : File.Extra )
-  {
-    if ( rParameter.Name == "CORNERS" )
-    {
-      rParameter.Numbers = { 1200, 2300, 0, 800, 2300, 0, 800, 1700, 0, 1200, 1700, 0 };
-    }
-  }
-  const VRecording R = MustReadC3d( File );
+    return MustReadC3d( File );
+  };
+  ExpectLoad( With( "ORIGIN", { -SensorX, -SensorY, Depth } ), 0, Walking );
+  const VRecording R = With( "CORNERS", { 1200, 2300, 0, 800, 2300, 0, 800, 1700, 0, 1200, 1700, 0 } );
   ASSERT_EQ( R.ForcePlates.size(), 1u );
-  EXPECT_NEAR( static_cast< double >( R.ForcePlates[0].Wrench[0][2] ), 800, 0.01 );
+  EXPECT_NEAR( static_cast< double >( R.ForcePlates[0].Wrench[0][2] ), 800, 0.01 ) << "the force still points up";
 }
 
 TEST( ForcePlates, Type4GoesThroughItsMatrixAndBaseline )
@@ -227,18 +219,49 @@ TEST( ForcePlates, WhatDoesNotFitIsNotedAndLeftOut )
     File.SetParameter( std::move( i_Parameter ) );
     return MustReadC3d( File );
   };
-  VRecording R = With( { "FORCE_PLATFORM", "CHANNEL", 2, { 6, 1 }, { 1, 2, 3, 4, 5, 99 }, {} } );
-  ASSERT_EQ( R.ForcePlates.size(), 1u );
-  EXPECT_TRUE( R.ForcePlates[0].Wrench.empty() );
-  EXPECT_THAT( R.Notes, testing::Contains( testing::HasSubstr( "FORCE_PLATFORM:CHANNEL" ) ) );
-  R = With( { "FORCE_PLATFORM", "TYPE", 2, { 1 }, { 21 }, {} } );
-  ASSERT_EQ( R.ForcePlates.size(), 1u );
-  EXPECT_THAT( R.Notes, testing::Contains( testing::HasSubstr( "found type 21" ) ) );
-  R = With( { "FORCE_PLATFORM", "CORNERS", 4, { 3, 4, 1 }, std::vector< double >( 12, 1.0 ), {} } );
-  EXPECT_TRUE( R.ForcePlates.empty() );
-  EXPECT_THAT( R.Notes, testing::Contains( testing::HasSubstr( "FORCE_PLATFORM:CORNERS" ) ) );
-  R = With( { "FORCE_PLATFORM", "USED", 2, {}, { 40 }, {} } );
-  EXPECT_EQ( R.ForcePlates.size(), 1u );
+  struct VCase
+  {
+    C3dWriter::VParameter Parameter;
+    std::size_t Plates;
+    const char* pNote; ///< null where the plate has its samples
+  };
+  for ( const VCase& rCase :
+        { VCase{ { "FORCE_PLATFORM", "CHANNEL", 2, { 6, 1 }, { 1, 2, 3, 4, 5, 99 }, {} }, 1, "FORCE_PLATFORM:CHANNEL" },
+          { { "FORCE_PLATFORM", "TYPE", 2, { 1 }, { 21 }, {} }, 1, "found type 21" },
+          { { "FORCE_PLATFORM", "TYPE", 2, { 1 }, { 4 }, {} }, 1, "FORCE_PLATFORM:CAL_MATRIX" },
+          { { "FORCE_PLATFORM", "CORNERS", 4, { 3, 4, 1 }, std::vector< double >( 12, 1.0 ), {} },
+            0,
+            "FORCE_PLATFORM:CORNERS" },
+          { { "FORCE_PLATFORM", "USED", 2, {}, { 40 }, {} }, 1, nullptr } } )
+  {
+    const VRecording R = With( rCase.Parameter );
+    ASSERT_EQ( R.ForcePlates.size(), rCase.Plates );
+    EXPECT_EQ( R.Notes.size(), rCase.pNote ? 1u : 0u );
+    EXPECT_TRUE( !rCase.pNote || R.Notes.at( 0 ).find( rCase.pNote ) != std::string::npos ) << rCase.pNote;
+    EXPECT_TRUE( R.ForcePlates.empty() || R.ForcePlates[0].Wrench.empty() == ( rCase.pNote != nullptr ) );
+  }
+}
+
+TEST( ForcePlates, AreNoMoreThanTheirChannels )
+{
+  VFile File;
+  File.Channels = 6;
+  File.PerFrame = 1;
+  File.Frames = { SensorsOf( 2, Walking ) };
+  std::vector< double > Corners, Channels;
+  for ( int Plate = 0; Plate < 8; ++Plate )
+  {
+    Corners.insert( Corners.end(), { 1, 1, 0, 1, 0, 0, 0, 0, 0, 0, 1, 0 } );
+    Channels.insert( Channels.end(), { 1, 2, 3, 4, 5, 6 } );
+  }
+  File.SetParameter( { "FORCE_PLATFORM", "TYPE", 2, { 8 }, std::vector< double >( 8, 2.0 ), {} } );
+  File.SetParameter( { "FORCE_PLATFORM", "CORNERS", 4, { 3, 4, 8 }, Corners, {} } );
+  File.SetParameter( { "FORCE_PLATFORM", "CHANNEL", 2, { 6, 8 }, Channels, {} } );
+  const VRecording R = MustReadC3d( File );
+  ASSERT_EQ( R.ForcePlates.size(), 8u );
+  EXPECT_EQ( R.ForcePlates[5].Wrench.size(), 1u );
+  EXPECT_TRUE( R.ForcePlates[6].Wrench.empty() && R.ForcePlates[7].Wrench.empty() );
+  EXPECT_THAT( R.Notes, testing::Each( testing::HasSubstr( "expected more analog channels than force plates" ) ) );
 }
 
 } // namespace HostSources

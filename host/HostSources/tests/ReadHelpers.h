@@ -17,6 +17,14 @@
 namespace HostSources
 {
 
+/// What a reader gave, failures included.
+struct VOutcome
+{
+  ZEK::IResult Result;
+  std::string Message;
+  VRecording Recording;
+};
+
 inline VRecording MustRead( const std::filesystem::path& i_rPath, ZEK::IResult i_Expected = ZEK::IResult::Ok )
 {
   VRecording Recording;
@@ -39,12 +47,18 @@ inline std::span< const std::byte > Bytes( std::string_view i_Text )
   return std::as_bytes( std::span( i_Text ) );
 }
 
-inline VRecording MustReadTrc( std::string_view i_Text, ZEK::IResult i_Expected = ZEK::IResult::Ok )
+inline VOutcome ReadText( std::string_view i_Text )
 {
-  VRecording Recording;
-  std::string Message;
-  EXPECT_EQ( ReadTrc( Bytes( i_Text ), "made.trc", Recording, Message ), i_Expected ) << Message;
-  return Recording;
+  VOutcome Outcome;
+  Outcome.Result = ReadTrc( Bytes( i_Text ), "made.trc", Outcome.Recording, Outcome.Message );
+  return Outcome;
+}
+
+inline VRecording MustReadTrc( std::string_view i_Text )
+{
+  VOutcome Outcome = ReadText( i_Text );
+  EXPECT_EQ( Outcome.Result, ZEK::IResult( ZEK::IResult::Ok ) ) << Outcome.Message;
+  return Outcome.Recording;
 }
 
 inline std::size_t LabelIndex( const VRecording& i_rRecording, const std::string& i_rLabel )

@@ -69,10 +69,10 @@ TEST_F( ReadFile, WhatCannotBeReadIsNamed )
 
 TEST_F( ReadFile, ContentCountsNotTheSuffix )
 {
-  const auto Path = Save( "really_c3d.trc", C3dWriter::Write( LongFile() ) );
-  const VRecording R = MustRead( Path );
+  // The name has a byte that no UTF-8 has, and a control character.
+  const VRecording R = MustRead( Save( "really\xE9\n.trc", C3dWriter::Write( LongFile() ) ) );
   EXPECT_EQ( R.Format, ERecordingFormat::C3d );
-  EXPECT_EQ( R.Name, "really_c3d.trc" );
+  EXPECT_EQ( R.Name, "really\xC3\xA9 .trc" );
   EXPECT_EQ( R.FrameCount, 20000 );
 }
 

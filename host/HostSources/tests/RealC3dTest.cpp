@@ -2,6 +2,7 @@
 
 #include "ReadHelpers.h"
 
+#include <cmath>
 #include <set>
 
 namespace HostSources
@@ -34,23 +35,85 @@ void ExpectCorners( const VForcePlate& i_rPlate, std::array< double, 12 > i_Corn
     EXPECT_NEAR( i_rPlate.Corners[Corner].z, i_Corners[3 * Corner + 2], 1e-3 );
   }
 }
+
+VRecording Real( const char* i_pFile, ZEK::IResult i_Expected = ZEK::IResult::Ok )
+{
+  return MustRead( TestSupport::RecordingsDir() / i_pFile, i_Expected );
+}
 } // namespace
 
-TEST( RealC3d, GaitHoldsItsPointsAndNames )
+TEST( RealC3d, FilesHoldTheirFramesPointsAndChannels )
 {
   HARROW_NEEDS_RECORDINGS();
-  const VRecording Gait = MustRead( TestSupport::RecordingsDir() / "c3d-trc/Gait.c3d" );
-  EXPECT_EQ( Gait.Form, "integer, DEC" );
-  EXPECT_EQ( Gait.PointCount(), 33u );
-  EXPECT_EQ( Gait.FirstFrame, 1 );
-  EXPECT_EQ( Gait.FrameCount, 487 );
-  EXPECT_EQ( Gait.RateHz, 100 );
-  EXPECT_EQ( Gait.Unit, "mm" );
-  EXPECT_EQ( Gait.GapCount, 9682u );
-  EXPECT_EQ( Gait.Points.size(), 16071u );
-  ExpectPoint( Gait, 243, "RSHO", 640.4994, 155.2884, 1381.1512 );
-  ExpectPoint( Gait, 243, "ROFF", 775.4001, 117.7126, 1296.1035 );
+  struct VCase
+  {
+    const char* pFile;
+    const char* pForm;
+    std::size_t Points;
+    std::int64_t First, Frames;
+    double Rate;
+    std::uint64_t Gaps;
+    std::size_t Channels;
+    double AnalogRate;
+    std::size_t Plates;
+  };
+  for ( const VCase& rCase : { VCase{ "c3d-trc/Gait.c3d", "integer, DEC", 33, 1, 487, 100, 9682, 28, 1000, 2 },
+                               { "c3d-trc/mocap36.c3d", "float, Intel", 36, 1, 1380, 100, 8244, 0, 0, 0 },
+                               { "c3d-trc/emg-only.c3d", "float, Intel", 0, 1, 4564, 1000, 0, 8, 1000, 0 },
+                               { "c3d-gpl/Qualisys.c3d", "float, Intel", 55, 705, 340, 200, 0, 69, 2000, 2 },
+                               { "c3d-gpl/FP_Type3.c3d", "float, Intel", 34, 1166, 2, 250, 0, 16, 1000, 2 } } )
+  {
+    SCOPED_TRACE( rCase.pFile );
+    const VRecording R = Real( rCase.pFile );
+    EXPECT_EQ( R.Form, rCase.pForm );
+    EXPECT_EQ( R.PointCount(), rCase.Points );
+    EXPECT_EQ( R.FirstFrame, rCase.First );
+    EXPECT_EQ( R.FrameCount, rCase.Frames );
+    EXPECT_EQ( R.RateHz, rCase.Rate );
+    EXPECT_EQ( R.GapCount, rCase.Gaps );
+    EXPECT_EQ( R.Points.size(), rCase.Points * static_cast< std::size_t >( rCase.Frames ) );
+    EXPECT_EQ( R.AnalogChannels.size(), rCase.Channels );
+    EXPECT_EQ( R.AnalogRateHz(), rCase.AnalogRate );
+    EXPECT_EQ( R.ForcePlates.size(), rCase.Plates );
+    EXPECT_EQ( R.Bounds.IsEmpty(), rCase.Points == 0 );
+  }
+}
 
+TEST( RealC3d, PointsLieWhereTheyLie )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const std::tuple< const char*, std::int64_t, const char*, double, double, double > Cases[] = {
+      { "c3d-trc/Gait.c3d", 243, "RSHO", 640.4994, 155.2884, 1381.1512 },
+      { "c3d-trc/Gait.c3d", 243, "ROFF", 775.4001, 117.7126, 1296.1035 },
+      { "c3d-trc/mocap36.c3d", 0, "Skeleton_Hip1", 198.9177, 24.8411, 981.4937 },
+      { "c3d-trc/mocap36.c3d", 0, "Skeleton_Hip2", -138.3683, 24.7229, 973.5464 },
+      { "c3d-trc/mocap36.c3d", 690, "Skeleton_Hip2", -149.4506, 1544.8630, 954.0317 },
+      { "c3d-gpl/Qualisys.c3d", 0, "L_IAS", -220.1226, 306.4248, 846.3361 },
+      { "c3d-gpl/Qualisys.c3d", 0, "L_IPS", -398.1731, 237.0688, 872.8574 },
+      { "c3d-gpl/Qualisys.c3d", 339, "L_IAS", 2266.2837, 315.5139, 856.4126 },
+      { "c3d-gpl/FP_Type3.c3d", 0, "LPSIS", 397.6465, 177.6959, 1175.8829 },
+      { "c3d-gpl/FP_Type3.c3d", 0, "RPSIS", 493.9481, 183.7718, 1179.5167 } };
+  for ( const auto& [pFile, Frame, pLabel, X, Y, Z] : Cases )
+  {
+    ExpectPoint( Real( pFile ), Frame, pLabel, X, Y, Z );
+  }
+  const VRecording Mocap = Real( "c3d-trc/mocap36.c3d" );
+  ExpectBounds( Mocap.Bounds, { -723, 766, -2222, 1815, 42, 1820 }, 0.6 );
+  for ( std::int64_t Frame = 0; Frame < Mocap.FrameCount; ++Frame )
+  {
+    for ( const VRecordingPoint& rPoint : Mocap.Frame( Frame ) )
+    {
+      ASSERT_EQ( rPoint.IsValid(), Frame < 1380 - 229 ) << Frame;
+    }
+  }
+  ExpectBounds( Real( "c3d-gpl/Qualisys.c3d" ).Bounds, { -606, 2439, -125, 527, 8, 1496 }, 0.6 );
+}
+
+TEST( RealC3d, NamesAnalogValuesAndTheUpAxis )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Gait = Real( "c3d-trc/Gait.c3d" );
+  EXPECT_EQ( Gait.Unit, "mm" );
   EXPECT_EQ( std::set( Gait.FileLabels.begin(), Gait.FileLabels.end() ).size(), 27u );
   EXPECT_EQ( std::set( Gait.Labels.begin(), Gait.Labels.end() ).size(), 33u );
   EXPECT_THAT( Gait.Labels, testing::IsSupersetOf( { "R.Ankle", "R.Ankle.Medial", "L.Foot.Lateral", "C7" } ) );
@@ -58,15 +121,6 @@ TEST( RealC3d, GaitHoldsItsPointsAndNames )
   EXPECT_TRUE( Gait.Events.empty() );
   EXPECT_EQ( Gait.UpAxis, EUpAxis::Z );
   EXPECT_THAT( Gait.UpAxisReason, testing::HasSubstr( "POINT:Y_SCREEN is \"+Z\"" ) );
-}
-
-TEST( RealC3d, GaitHoldsItsAnalogChannelsAndForcePlatesOfType4 )
-{
-  HARROW_NEEDS_RECORDINGS();
-  const VRecording Gait = MustRead( TestSupport::RecordingsDir() / "c3d-trc/Gait.c3d" );
-  ASSERT_EQ( Gait.AnalogChannels.size(), 28u );
-  EXPECT_EQ( Gait.AnalogPerFrame, 10u );
-  EXPECT_EQ( Gait.AnalogRateHz(), 1000 );
   EXPECT_EQ( Gait.AnalogChannels[0].Name, "F1X" );
   EXPECT_EQ( Gait.AnalogChannels[3].Unit, "Nmm" );
   const std::array< double, 4 > Raw{ 30, 8, 0, -11 };
@@ -74,7 +128,19 @@ TEST( RealC3d, GaitHoldsItsAnalogChannelsAndForcePlatesOfType4 )
   {
     EXPECT_NEAR( static_cast< double >( Gait.Analog[Channel] ), Raw[Channel] * -0.1221001, 1e-5 );
   }
-  ASSERT_EQ( Gait.ForcePlates.size(), 2u );
+  const VRecording Emg = Real( "c3d-trc/emg-only.c3d" );
+  EXPECT_EQ( Emg.AnalogChannels[0].Name, "Right Rectus Femoris" );
+  EXPECT_EQ( Emg.AnalogChannels[7].Unit, "mV" );
+  EXPECT_THAT( Emg.Analog, testing::Each( testing::AllOf( testing::Gt( -100.f ), testing::Lt( 100.f ) ) ) );
+}
+
+TEST( RealC3d, ForcePlatesFeelWhatTheyFelt )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Gait = Real( "c3d-trc/Gait.c3d" );
+  const VRecording Walk = Real( "c3d-gpl/Qualisys.c3d" );
+  const VRecording Stand = Real( "c3d-gpl/FP_Type3.c3d" );
+  ASSERT_TRUE( Gait.ForcePlates.size() == 2 && Walk.ForcePlates.size() == 2 && Stand.ForcePlates.size() == 2 );
   EXPECT_EQ( Gait.ForcePlates[0].Type, 4u );
   ExpectCorners( Gait.ForcePlates[0], { -306.4, -620.7, 0, -306.4, -11.1, 0, 608, -11.1, 0, 608, -620.7, 0 } );
   ExpectCorners( Gait.ForcePlates[1], { -9.3, -10.1, 0, -9.3, 599.5, 0, 905.1, 599.5, 0, 905.1, -10.1, 0 } );
@@ -84,77 +150,7 @@ TEST( RealC3d, GaitHoldsItsAnalogChannelsAndForcePlatesOfType4 )
   EXPECT_NEAR( Gait.ForcePlates[1].Origin.z, -52.979, 1e-5 );
   ExpectPeak( Plate( Gait, 0 ), 798.41, 3007, 300, -50, -90 );
   ExpectPeak( Plate( Gait, 1 ), 871.17, 2529, 252, 675, 74 );
-  // The force on the body points up, out of the floor.
-  EXPECT_GT( Gait.ForcePlates[0].Wrench[3007][2], 700.0f );
-  EXPECT_GT( Gait.ForcePlates[1].Wrench[2529][2], 700.0f );
-}
 
-TEST( RealC3d, Mocap36HoldsItsPointsAndGaps )
-{
-  HARROW_NEEDS_RECORDINGS();
-  const VRecording Mocap = MustRead( TestSupport::RecordingsDir() / "c3d-trc/mocap36.c3d" );
-  EXPECT_EQ( Mocap.Form, "float, Intel" );
-  EXPECT_EQ( Mocap.PointCount(), 36u );
-  EXPECT_EQ( Mocap.FirstFrame, 1 );
-  EXPECT_EQ( Mocap.FrameCount, 1380 );
-  EXPECT_EQ( Mocap.RateHz, 100 );
-  EXPECT_TRUE( Mocap.AnalogChannels.empty() );
-  EXPECT_TRUE( Mocap.ForcePlates.empty() );
-  ExpectPoint( Mocap, 0, "Skeleton_Hip1", 198.9177, 24.8411, 981.4937 );
-  ExpectPoint( Mocap, 0, "Skeleton_Hip2", -138.3683, 24.7229, 973.5464 );
-  ExpectPoint( Mocap, 690, "Skeleton_Hip2", -149.4506, 1544.8630, 954.0317 );
-  EXPECT_EQ( Mocap.Points.size(), 49680u );
-  EXPECT_EQ( Mocap.GapCount, 8244u );
-  for ( std::int64_t Frame = 0; Frame < Mocap.FrameCount; ++Frame )
-  {
-    const auto Points = Mocap.Frame( Frame );
-    const auto Valid = std::count_if( Points.begin(), Points.end(),
-                                      []( const VRecordingPoint& i_rPoint )
-                                      {
-                                        return i_rPoint.IsValid();
-                                      } );
-    ASSERT_EQ( Valid, Frame < 1380 - 229 ? 36 : 0 ) << Frame;
-  }
-  ExpectBounds( Mocap.Bounds, { -723, 766, -2222, 1815, 42, 1820 }, 0.6 );
-}
-
-TEST( RealC3d, EmgOnlyHoldsChannelsAndNoPoints )
-{
-  HARROW_NEEDS_RECORDINGS();
-  const VRecording Emg = MustRead( TestSupport::RecordingsDir() / "c3d-trc/emg-only.c3d" );
-  EXPECT_EQ( Emg.PointCount(), 0u );
-  EXPECT_EQ( Emg.FrameCount, 4564 );
-  EXPECT_EQ( Emg.RateHz, 1000 );
-  ASSERT_EQ( Emg.AnalogChannels.size(), 8u );
-  EXPECT_EQ( Emg.AnalogChannels[0].Name, "Right Rectus Femoris" );
-  EXPECT_EQ( Emg.AnalogChannels[7].Unit, "mV" );
-  EXPECT_EQ( Emg.Analog.size(), 8u * 4564u );
-  EXPECT_TRUE( std::all_of( Emg.Analog.begin(), Emg.Analog.end(),
-                            []( float i_Value )
-                            {
-                              return std::abs( i_Value ) < 100;
-                            } ) );
-  EXPECT_TRUE( Emg.Bounds.IsEmpty() );
-}
-
-TEST( RealC3d, QualisysHoldsPointsEventsAndForcePlatesOfType2 )
-{
-  HARROW_NEEDS_RECORDINGS();
-  const VRecording Walk = MustRead( TestSupport::RecordingsDir() / "c3d-gpl/Qualisys.c3d" );
-  EXPECT_EQ( Walk.Form, "float, Intel" );
-  EXPECT_EQ( Walk.PointCount(), 55u );
-  EXPECT_EQ( Walk.FirstFrame, 705 );
-  EXPECT_EQ( Walk.FrameCount, 340 );
-  EXPECT_EQ( Walk.RateHz, 200 );
-  EXPECT_EQ( Walk.GapCount, 0u );
-  ExpectPoint( Walk, 0, "L_IAS", -220.1226, 306.4248, 846.3361 );
-  ExpectPoint( Walk, 0, "L_IPS", -398.1731, 237.0688, 872.8574 );
-  ExpectPoint( Walk, 339, "L_IAS", 2266.2837, 315.5139, 856.4126 );
-  ExpectBounds( Walk.Bounds, { -606, 2439, -125, 527, 8, 1496 }, 0.6 );
-  EXPECT_EQ( Walk.AnalogChannels.size(), 69u );
-  EXPECT_EQ( Walk.AnalogRateHz(), 2000 );
-
-  ASSERT_EQ( Walk.ForcePlates.size(), 2u );
   EXPECT_EQ( Walk.ForcePlates[0].Type, 2u );
   EXPECT_THAT( Walk.ForcePlates[0].Channels, testing::ElementsAre( 57, 58, 59, 60, 61, 62 ) );
   EXPECT_THAT( Walk.ForcePlates[1].Channels, testing::ElementsAre( 63, 64, 65, 66, 67, 68 ) );
@@ -164,9 +160,29 @@ TEST( RealC3d, QualisysHoldsPointsEventsAndForcePlatesOfType2 )
   EXPECT_NEAR( Walk.ForcePlates[1].Origin.z, 36.322, 1e-4 );
   ExpectPeak( Plate( Walk, 0 ), 808.43, 380, 38, 194, 292 );
   ExpectPeak( Plate( Walk, 1 ), 839.72, 1294, 129, 814, 159 );
-  // This file holds the force on the plate; the force on the body is its opposite.
-  EXPECT_GT( Walk.ForcePlates[0].Wrench[380][2], 700.0f );
 
+  const VForcePlate& rCorners = Stand.ForcePlates[0];
+  EXPECT_EQ( rCorners.Type, 3u );
+  EXPECT_TRUE( rCorners.Origin.x == 210 && rCorners.Origin.y == 350 && rCorners.Origin.z == -53 );
+  ExpectCorners( rCorners, { 881.199, 581.160, -4.928, 880.102, -2.366, -5.843, -0.813, -6.946, -6.118, -4.827, 578.421,
+                             -6.172 } );
+  const VRecordingInfo::VPlate Info = Plate( Stand, 0 );
+  EXPECT_NEAR( Info.PeakForce, 886.7, 0.05 );
+  EXPECT_NEAR( Info.PeakCentre.x, 446.5, 0.5 );
+  EXPECT_NEAR( Info.PeakCentre.y, 291, 0.5 );
+  // Nobody stands on the second plate, so it has no centre of pressure.
+  EXPECT_TRUE( std::isnan( Stand.ForcePlates[1].Wrench[0][6] ) );
+  // The force on the body points up, out of the floor, also from the file that holds the force on the plate.
+  EXPECT_GT( Gait.ForcePlates[0].Wrench[3007][2], 700.0f );
+  EXPECT_GT( Gait.ForcePlates[1].Wrench[2529][2], 700.0f );
+  EXPECT_GT( Walk.ForcePlates[0].Wrench[380][2], 700.0f );
+  EXPECT_GT( rCorners.Wrench[0][2], 880.0f );
+}
+
+TEST( RealC3d, EventsCountFromTheFirstFrame )
+{
+  HARROW_NEEDS_RECORDINGS();
+  const VRecording Walk = Real( "c3d-gpl/Qualisys.c3d" );
   const std::array< std::pair< const char*, double >, 7 > Events{ { { "LHS", 3.590 },
                                                                     { "RTO", 3.685 },
                                                                     { "RHS", 4.050 },
@@ -182,35 +198,6 @@ TEST( RealC3d, QualisysHoldsPointsEventsAndForcePlatesOfType2 )
     EXPECT_NEAR( Walk.Events[Index].FileSeconds, Events[Index].second, 1e-6 );
     EXPECT_NEAR( Walk.Events[Index].Seconds, Events[Index].second - 3.52, 1e-6 );
   }
-}
-
-TEST( RealC3d, ForcePlateOfType3 )
-{
-  HARROW_NEEDS_RECORDINGS();
-  const VRecording Stand = MustRead( TestSupport::RecordingsDir() / "c3d-gpl/FP_Type3.c3d" );
-  EXPECT_EQ( Stand.PointCount(), 34u );
-  EXPECT_EQ( Stand.FirstFrame, 1166 );
-  EXPECT_EQ( Stand.FrameCount, 2 );
-  EXPECT_EQ( Stand.RateHz, 250 );
-  ExpectPoint( Stand, 0, "LPSIS", 397.6465, 177.6959, 1175.8829 );
-  ExpectPoint( Stand, 0, "RPSIS", 493.9481, 183.7718, 1179.5167 );
-  EXPECT_EQ( Stand.AnalogChannels.size(), 16u );
-  EXPECT_EQ( Stand.AnalogRateHz(), 1000 );
-  ASSERT_EQ( Stand.ForcePlates.size(), 2u );
-  const VForcePlate& rPlate = Stand.ForcePlates[0];
-  EXPECT_EQ( rPlate.Type, 3u );
-  EXPECT_EQ( rPlate.Origin.x, 210 );
-  EXPECT_EQ( rPlate.Origin.y, 350 );
-  EXPECT_EQ( rPlate.Origin.z, -53 );
-  ExpectCorners(
-      rPlate, { 881.199, 581.160, -4.928, 880.102, -2.366, -5.843, -0.813, -6.946, -6.118, -4.827, 578.421, -6.172 } );
-  const VRecordingInfo::VPlate Info = Plate( Stand, 0 );
-  EXPECT_NEAR( Info.PeakForce, 886.7, 0.05 );
-  EXPECT_NEAR( Info.PeakCentre.x, 446.5, 0.5 );
-  EXPECT_NEAR( Info.PeakCentre.y, 291, 0.5 );
-  EXPECT_GT( rPlate.Wrench[0][2], 880.0f );
-  // Nobody stands on the second plate, so it has no centre of pressure.
-  EXPECT_TRUE( std::isnan( Stand.ForcePlates[1].Wrench[0][6] ) );
 }
 
 TEST( RealC3d, CutOffFileGivesItsWholeFrames )

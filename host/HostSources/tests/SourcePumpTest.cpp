@@ -3,6 +3,7 @@
 
 #include <HostFlow/VFlowFramework.h>
 
+#include <TestSupport/Calls.h>
 #include <TestSupport/LogGuard.h>
 
 #include <gtest/gtest.h>
@@ -43,6 +44,10 @@ public:
                     } );
     }
     Made.push_back( i_Index );
+    if ( i_Index == Throws )
+    {
+      throw std::bad_alloc();
+    }
     if ( i_Index >= Count && Count >= 0 )
     {
       o_rState.Reset();
@@ -67,7 +72,7 @@ public:
                   } );
   }
 
-  std::int64_t Count = -1;
+  std::int64_t Count = -1, Throws = -1;
   std::chrono::milliseconds Slowness{ 0 };
   std::vector< std::int64_t > Made; ///< read after Stop
 
@@ -99,34 +104,26 @@ protected:
 
 TEST_F( SourcePump, FollowsAndEmptiesTheCacheOnAStepBackAndOnASeek )
 {
-  std::atomic< int > Emptied{ 0 };
-  const VConnection Connection = pCache->Notifier6().Connect(
-      [&]
-      {
-        ++Emptied;
-      },
-      nullptr );
-  Pump.Show( 5 );
+  const TestSupport::VCalls Emptied( pCache->Notifier6() );
+  Pump.Show( 5 ); // before it starts
   Pump.StartFollow();
   Pump.WaitShown();
-  EXPECT_EQ( Newest(), 5 );
-  for ( const std::int64_t Index : { 6, 7, 7 } )
+  struct VStep
   {
-    Pump.Show( Index );
+    std::int64_t Index;
+    bool bSeek;
+    std::int64_t Oldest;
+    int Emptied;
+  };
+  for ( const VStep& rStep :
+        { VStep{ 6, false, 5, 0 }, { 7, false, 5, 0 }, { 7, false, 5, 0 }, { 6, false, 6, 1 }, { 50, true, 50, 2 } } )
+  {
+    Pump.Show( rStep.Index, rStep.bSeek );
     Pump.WaitShown();
+    EXPECT_EQ( Newest(), rStep.Index );
+    EXPECT_EQ( Oldest(), rStep.Oldest );
+    EXPECT_EQ( Emptied.Count(), rStep.Emptied );
   }
-  EXPECT_EQ( Newest(), 7 );
-  EXPECT_EQ( Oldest(), 5 );
-  EXPECT_EQ( Emptied, 0 );
-  Pump.Show( 6 );
-  Pump.WaitShown();
-  EXPECT_EQ( Newest(), 6 );
-  EXPECT_EQ( Oldest(), 6 );
-  EXPECT_EQ( Emptied, 1 );
-  Pump.Show( 50, true );
-  Pump.WaitShown();
-  EXPECT_EQ( Oldest(), 50 );
-  EXPECT_EQ( Emptied, 2 );
   EXPECT_EQ( Pump.ShownIndex(), 50 );
   EXPECT_EQ( Pump.AddedCount(), 6u );
 }
@@ -166,10 +163,14 @@ TEST_F( SourcePump, AFrameThatCannotBeMadeIsSaidOnceAndTheCacheKeepsWhatItHas )
   const auto Lines = TestSupport::LogTexts( "Source", ELogWarning );
   ASSERT_EQ( Lines.size(), 1u );
   EXPECT_EQ( Lines[0].find( "Frame 10 of \"Script\" could not be shown: InvalidIndex" ), 0u ) << Lines[0];
-  Pump.Show( 9 );
-  Pump.WaitShown();
-  EXPECT_TRUE( Pump.LastResult().IsOk() );
-  EXPECT_EQ( Newest(), 9 );
+  pSource->Throws = 8;
+  for ( const auto& [Index, Result] : { std::pair{ 8, IResult::AllocationFailure }, { 9, IResult::Ok } } )
+  {
+    Pump.Show( Index );
+    Pump.WaitShown();
+    EXPECT_EQ( Pump.LastResult(), IResult( Result ) );
+    EXPECT_EQ( Newest(), 9 );
+  }
 }
 
 TEST_F( SourcePump, LiveLeavesFramesOutWhenLateAndStandsAtTheEnd )

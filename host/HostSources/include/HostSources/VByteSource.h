@@ -52,6 +52,8 @@ public:
   std::span< const std::byte > Read( std::uint64_t i_Offset, std::size_t i_Count ) override;
 
 private:
+  void Close();
+
   int m_File = -1;
   std::uint64_t m_Size = 0;
   std::vector< std::byte > m_Buffer;

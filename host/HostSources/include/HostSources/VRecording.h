@@ -83,7 +83,7 @@ struct VRecordingBounds
 /// A recording in memory, in millimetres, newtons and newton millimetres whatever the units of its file.
 struct VRecording
 {
-  std::string Name; ///< of the file, without its folder
+  std::string Name; ///< of the file, without its folder; UTF-8
   ERecordingFormat Format = ERecordingFormat::Unknown;
   std::string Form; ///< how the file holds its numbers, e.g. "integer, DEC"
   double RateHz = 100;
