@@ -14,8 +14,7 @@ std::uint64_t HashOf( std::string_view i_Name )
   std::uint64_t Hash = i_Name.size() * Factor;
   const auto Mix = [&]( std::uint64_t i_Word )
   {
-    Hash = ( Hash ^ i_Word ) * Factor;
-    Hash ^= Hash >> 29;
+    Hash = ( std::rotl( Hash, 23 ) ^ i_Word ) * Factor;
   };
   std::size_t At = 0;
   for ( ; At + 8 <= i_Name.size(); At += 8 )
@@ -34,14 +33,14 @@ std::uint64_t HashOf( std::string_view i_Name )
 }
 } // namespace
 
-void VTaggedCoreTypeExtractor::VNameTable::Clear()
+void VNameTable::Clear()
 {
   m_Rows.clear();
   m_Hashes.clear();
   std::fill( m_Buckets.begin(), m_Buckets.end(), 0 );
 }
 
-std::uint32_t VTaggedCoreTypeExtractor::VNameTable::RowOf( std::string_view i_Name )
+std::uint32_t VNameTable::RowOf( std::string_view i_Name )
 {
   if ( m_Rows.size() * 2 >= m_Buckets.size() )
   {
@@ -49,7 +48,7 @@ std::uint32_t VTaggedCoreTypeExtractor::VNameTable::RowOf( std::string_view i_Na
   }
   const std::uint64_t Hash = HashOf( i_Name );
   const std::size_t Mask = m_Buckets.size() - 1;
-  std::size_t Bucket = Hash & Mask;
+  std::size_t Bucket = BucketOf( Hash );
   for ( ; m_Buckets[Bucket] != 0; Bucket = ( Bucket + 1 ) & Mask )
   {
     const std::uint32_t Found = m_Buckets[Bucket] - 1;
@@ -64,13 +63,13 @@ std::uint32_t VTaggedCoreTypeExtractor::VNameTable::RowOf( std::string_view i_Na
   return m_Buckets[Bucket] - 1;
 }
 
-void VTaggedCoreTypeExtractor::VNameTable::Grow()
+void VNameTable::Grow()
 {
   m_Buckets.assign( std::max< std::size_t >( 64, m_Buckets.size() * 2 ), 0 );
   const std::size_t Mask = m_Buckets.size() - 1;
   for ( std::size_t Row = 0; Row < m_Rows.size(); ++Row )
   {
-    std::size_t Bucket = m_Hashes[Row] & Mask;
+    std::size_t Bucket = BucketOf( m_Hashes[Row] );
     while ( m_Buckets[Bucket] != 0 )
     {
       Bucket = ( Bucket + 1 ) & Mask;
@@ -79,7 +78,7 @@ void VTaggedCoreTypeExtractor::VNameTable::Grow()
   }
 }
 
-void VTaggedCoreTypeExtractor::VNameTable::Number( std::uint32_t i_Needed, std::vector< std::string >& o_rNames )
+void VNameTable::Number( std::uint32_t i_Needed, std::vector< std::string >& o_rNames )
 {
   m_Order.clear();
   std::size_t Dropped = 0;

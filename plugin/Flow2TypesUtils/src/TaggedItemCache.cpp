@@ -1,5 +1,7 @@
 #include <Flow2TypesUtils/TaggedItemCache.h>
 
+#include "NameTable.h"
+
 #include <algorithm>
 #include <tuple>
 
@@ -13,22 +15,31 @@ bool IdLess( const ZEK::VFlowValueId& i_rLeft, const ZEK::VFlowValueId& i_rRight
          std::tie( i_rRight.Salt, i_rRight.Type, i_rRight.Number );
 }
 
-/// Calls back with each entry of the tag that passes the time test, until the callback says false.
-template < typename TCallback >
-bool ForEntries( const VJoinQuery& i_rQuery, std::uint32_t i_Tag, TCallback i_Callback )
+/// The time test of one query. Most entries of a tag share their key, so the last answer is kept.
+class VTimeTest
 {
-  ZEK::VFlowCursor It, End;
-  i_rQuery.rState.ItemsBegin( It, i_Tag, i_rQuery.Match, i_rQuery.Key );
-  i_rQuery.rState.ItemsEnd( End, i_Tag, i_rQuery.Match, i_rQuery.Key );
-  for ( ; It != End; ++It )
+public:
+  explicit VTimeTest( const VJoinQuery& i_rQuery )
+    : m_rQuery( i_rQuery )
   {
-    if ( ZEK::FlowTimeMatches( i_rQuery.Match, It->Key, i_rQuery.Key ) && !i_Callback( It ) )
-    {
-      return false;
-    }
   }
-  return true;
-}
+  bool Passes( const ZEK::VFlowTimeKey& i_rKey )
+  {
+    if ( !( i_rKey == m_Last && i_rKey.Span == m_Last.Span && m_bKnown ) )
+    {
+      m_Last = i_rKey;
+      m_bKnown = true;
+      m_bPasses = ZEK::FlowTimeMatches( m_rQuery.Match, i_rKey, m_rQuery.Key );
+    }
+    return m_bPasses;
+  }
+
+private:
+  const VJoinQuery& m_rQuery;
+  ZEK::VFlowTimeKey m_Last;
+  bool m_bKnown = false;
+  bool m_bPasses = false;
+};
 } // namespace
 
 VItemCache::VItemCache( std::uint32_t i_Tag, ETagRequirement i_Requirement )
@@ -39,45 +50,52 @@ VItemCache::VItemCache( std::uint32_t i_Tag, ETagRequirement i_Requirement )
 
 VItemCache::~VItemCache() = default;
 
-bool VItemCache::Collect( const VJoinQuery& i_rQuery, std::uint32_t i_CacheNumber, IJoinRows& io_rRows,
+bool VItemCache::Collect( const VJoinQuery& i_rQuery, std::uint32_t i_CacheNumber, VNameTable& io_rTable,
                           bool& o_rbRequired )
 {
   bool bAnyHit = false;
-  ForEntries( i_rQuery, m_Tag,
-              [&]( const ZEK::VFlowCursor& i_rEntry )
-              {
-                VSeen Seen{ i_rEntry->pItem->Id(), i_rEntry->pItem, VJoinRow::None, VJoinRow::None };
-                std::string_view Name;
-                if ( i_rEntry->pItem->Value().GetName( i_rQuery.NameSelector, Name ) )
-                {
-                  Seen.Row = io_rRows.RowOf( Name );
-                  VJoinRow& rRow = io_rRows.Row( Seen.Row );
-                  if ( rRow.LastCache != i_CacheNumber )
-                  {
-                    rRow.LastCache = i_CacheNumber;
-                    rRow.HitCount += m_Requirement == ETagRequirement::Optional ? 0 : 1;
-                    Seen.Slot = Seen.Row; // the row's slot is known when all tags are counted
-                    bAnyHit = true;
-                  }
-                }
-                m_Seen.push_back( Seen );
-                m_SeenEntries.push_back( i_rEntry );
-                return true;
-              } );
+  VTimeTest Time( i_rQuery );
+  ZEK::VFlowCursor It, End;
+  i_rQuery.rState.ItemsBegin( It, m_Tag, i_rQuery.Match, i_rQuery.Key );
+  i_rQuery.rState.ItemsEnd( End, m_Tag, i_rQuery.Match, i_rQuery.Key );
+  for ( ; It != End; ++It )
+  {
+    if ( !Time.Passes( It->Key ) )
+    {
+      continue;
+    }
+    VSeen Seen{ It->pItem->Id(), It->pItem, None, None };
+    std::string_view Name;
+    if ( It->pItem->Value().GetName( i_rQuery.NameSelector, Name ) )
+    {
+      Seen.Row = io_rTable.RowOf( Name );
+      VJoinRow& rRow = io_rTable.Row( Seen.Row );
+      if ( rRow.LastCache != i_CacheNumber )
+      {
+        rRow.LastCache = i_CacheNumber;
+        rRow.HitCount += m_Requirement == ETagRequirement::Optional ? 0 : 1;
+        Seen.Slot = Seen.Row; // the row's slot is known when all tags are counted
+        bAnyHit = true;
+      }
+    }
+    m_Seen.push_back( Seen );
+    m_SeenEntries.push_back( It );
+  }
   o_rbRequired =
       m_Requirement == ETagRequirement::Required || ( m_Requirement != ETagRequirement::Optional && bAnyHit );
   return bAnyHit || m_Requirement != ETagRequirement::Required;
 }
 
-void VItemCache::Resize( std::size_t i_Count, ZEK::VFlowCursor i_EndEntry, IJoinRows& io_rRows )
+void VItemCache::Resize( std::size_t i_Count, ZEK::VFlowCursor i_EndEntry, VNameTable& io_rTable )
 {
   const bool bAnyHit = std::any_of( m_Seen.begin(), m_Seen.end(),
                                     []( const VSeen& i_rSeen )
                                     {
-                                      return i_rSeen.Slot != VJoinRow::None;
+                                      return i_rSeen.Slot != None;
                                     } );
   const std::size_t Count = m_Requirement == ETagRequirement::RequiredIfAny && !bAnyHit ? 0 : i_Count;
-  ResizeValues( Count );
+  m_bValuesTaken = false;
+  m_EndEntry = i_EndEntry;
   m_Entries.assign( Count, i_EndEntry );
   m_Ids.assign( Count, {} );
   m_Holes.clear();
@@ -85,13 +103,12 @@ void VItemCache::Resize( std::size_t i_Count, ZEK::VFlowCursor i_EndEntry, IJoin
   for ( std::size_t Index = 0; Index < m_Seen.size(); ++Index )
   {
     VSeen& rSeen = m_Seen[Index];
-    rSeen.Slot = rSeen.Slot == VJoinRow::None ? VJoinRow::None : io_rRows.Row( rSeen.Slot ).Index;
-    if ( rSeen.Slot != VJoinRow::None )
+    rSeen.Slot = rSeen.Slot == None ? None : io_rTable.Row( rSeen.Slot ).Index;
+    if ( rSeen.Slot != None )
     {
       ++Filled;
       m_Entries[rSeen.Slot] = m_SeenEntries[Index];
       m_Ids[rSeen.Slot] = rSeen.Id;
-      TakeValue( rSeen.Slot, rSeen.pItem );
     }
   }
   for ( std::uint32_t Slot = 0; Filled != Count && Slot < Count; ++Slot )
@@ -112,63 +129,71 @@ void VItemCache::Clear( bool i_bKeepAsPrevious )
   m_bSameIds = false;
   m_Ids.clear();
   m_Entries.clear();
-  ResizeValues( 0 );
+  m_bValuesTaken = false;
   m_Seen.clear();
   m_SeenEntries.clear();
   m_Holes.clear();
 }
 
-bool VItemCache::Keep( const VJoinQuery& i_rQuery, IJoinRows& io_rRows )
+bool VItemCache::Keep( const VJoinQuery& i_rQuery, VNameTable& io_rTable )
 {
   VSeen* pSeen = m_Seen.data();
   VSeen* const pEnd = pSeen + m_Seen.size();
-  const bool bSame =
-      ForEntries( i_rQuery, m_Tag,
-                  [&]( const ZEK::VFlowCursor& i_rEntry )
-                  {
-                    return pSeen != pEnd && KeepEntry( *pSeen++, i_rEntry, i_rQuery.NameSelector, io_rRows );
-                  } );
-  return bSame && pSeen == pEnd;
-}
-
-inline bool VItemCache::KeepEntry( VSeen& io_rSeen, const ZEK::VFlowCursor& i_rEntry, std::uint32_t i_NameSelector,
-                                   IJoinRows& io_rRows )
-{
-  const ZEK::IFlowItem* pItem = i_rEntry->pItem;
-  const bool bSlot = io_rSeen.Slot != VJoinRow::None;
-  // An item at the same place in memory with the same id is the same item.
-  if ( pItem->Id() == io_rSeen.Id && pItem == io_rSeen.pItem )
+  ZEK::VFlowCursor* const pEntries = m_Entries.data();
+  VTimeTest Time( i_rQuery );
+  ZEK::VFlowCursor It, End;
+  i_rQuery.rState.ItemsBegin( It, m_Tag, i_rQuery.Match, i_rQuery.Key );
+  i_rQuery.rState.ItemsEnd( End, m_Tag, i_rQuery.Match, i_rQuery.Key );
+  for ( ; It != End; ++It )
   {
-    if ( bSlot )
+    if ( !Time.Passes( It->Key ) )
     {
-      m_Entries[io_rSeen.Slot] = i_rEntry;
+      continue;
     }
-    return true;
-  }
-  if ( !( pItem->Id() == io_rSeen.Id ) )
-  {
-    std::string_view Name;
-    const bool bName = pItem->Value().GetName( i_NameSelector, Name );
-    if ( bName != ( io_rSeen.Row != VJoinRow::None ) || ( bName && io_rRows.Row( io_rSeen.Row ).Name != Name ) )
+    if ( pSeen == pEnd )
     {
       return false;
     }
-    io_rSeen.Id = pItem->Id();
-    if ( bSlot )
+    // An item at the same place in memory with the same id is the same item.
+    const ZEK::IFlowItem* pItem = It->pItem;
+    const bool bSame = pItem == pSeen->pItem && pItem->Id() == pSeen->Id;
+    if ( !bSame && !TakeOther( *pSeen, pItem, i_rQuery.NameSelector, io_rTable ) )
     {
-      if ( m_bSameIds )
-      {
-        m_PreviousIds.assign( m_Ids.begin(), m_Ids.end() );
-        m_bSameIds = false;
-      }
-      m_Ids[io_rSeen.Slot] = io_rSeen.Id;
+      return false;
     }
+    if ( pSeen->Slot != None )
+    {
+      pEntries[pSeen->Slot] = It;
+    }
+    ++pSeen;
   }
-  io_rSeen.pItem = pItem;
-  if ( bSlot )
+  return pSeen == pEnd;
+}
+
+bool VItemCache::TakeOther( VSeen& io_rSeen, const ZEK::IFlowItem* i_pItem, std::uint32_t i_NameSelector,
+                            VNameTable& io_rTable )
+{
+  io_rSeen.pItem = i_pItem;
+  m_bValuesTaken = m_bValuesTaken && io_rSeen.Slot == None;
+  if ( i_pItem->Id() == io_rSeen.Id )
   {
-    m_Entries[io_rSeen.Slot] = i_rEntry;
-    TakeValue( io_rSeen.Slot, pItem );
+    return true;
+  }
+  std::string_view Name;
+  const bool bName = i_pItem->Value().GetName( i_NameSelector, Name );
+  if ( bName != ( io_rSeen.Row != None ) || ( bName && io_rTable.Row( io_rSeen.Row ).Name != Name ) )
+  {
+    return false;
+  }
+  io_rSeen.Id = i_pItem->Id();
+  if ( io_rSeen.Slot != None )
+  {
+    if ( m_bSameIds )
+    {
+      m_PreviousIds.assign( m_Ids.begin(), m_Ids.end() );
+      m_bSameIds = false;
+    }
+    m_Ids[io_rSeen.Slot] = io_rSeen.Id;
   }
   return true;
 }
@@ -179,6 +204,7 @@ void VItemCache::Renew( ZEK::VFlowCursor i_EndEntry )
   {
     m_Entries[Slot] = i_EndEntry;
   }
+  m_EndEntry = i_EndEntry;
 }
 
 bool VItemCache::Changed() const

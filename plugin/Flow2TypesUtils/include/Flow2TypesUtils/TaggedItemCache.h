@@ -5,6 +5,8 @@
 #include <cstdint>
 #include <span>
 #include <string_view>
+#include <typeinfo>
+#include <utility>
 #include <vector>
 
 namespace Flow2TypesUtils
@@ -27,26 +29,7 @@ struct VJoinQuery
   ZEK::VFlowTimeKey Key;
 };
 
-/// One object name of a join.
-struct VJoinRow
-{
-  static constexpr std::uint32_t None = ~std::uint32_t{ 0 };
-  std::string_view Name;      ///< in the items while joining, in the extractor afterwards
-  std::uint32_t HitCount = 0; ///< tags that count and have an item of this name
-  std::uint32_t Index = None; ///< slot, or none for an object that lacks something
-  std::uint32_t LastCache = None;
-};
-
-/// Finds or makes the row of a name.
-class IJoinRows
-{
-public:
-  virtual std::uint32_t RowOf( std::string_view i_Name ) = 0;
-  virtual VJoinRow& Row( std::uint32_t i_Row ) = 0;
-
-protected:
-  ~IJoinRows() = default;
-};
+class VNameTable;
 
 /// The items of one tag within a join. Used by its extractor.
 class VItemCache
@@ -59,15 +42,15 @@ public:
   void Begin() { m_bSameIds = true; }
   /// Walks the tag's items and counts them in the rows. False when the tag is required and has no item; `o_rbRequired`
   /// says whether the tag counts for this state.
-  bool Collect( const VJoinQuery& i_rQuery, std::uint32_t i_CacheNumber, IJoinRows& io_rRows, bool& o_rbRequired );
+  bool Collect( const VJoinQuery& i_rQuery, std::uint32_t i_CacheNumber, VNameTable& io_rTable, bool& o_rbRequired );
   /// Gives every object its slot, after the rows have theirs.
-  void Resize( std::size_t i_Count, ZEK::VFlowCursor i_EndEntry, IJoinRows& io_rRows );
+  void Resize( std::size_t i_Count, ZEK::VFlowCursor i_EndEntry, VNameTable& io_rTable );
   /// Empties the present vectors; with `i_bKeepAsPrevious` the ids become those of the update before.
   void Clear( bool i_bKeepAsPrevious );
 
   /// Takes the entries of a new state for those that were joined, as long as they are the same objects in the same
   /// places. False, with the join no longer good, when they are not.
-  bool Keep( const VJoinQuery& i_rQuery, IJoinRows& io_rRows );
+  bool Keep( const VJoinQuery& i_rQuery, VNameTable& io_rTable );
   /// The end of a join that was kept: slots without an entry hold the new state's end cursor.
   void Renew( ZEK::VFlowCursor i_EndEntry );
 
@@ -81,21 +64,25 @@ public:
   std::uint32_t Tag() const { return m_Tag; }
   std::span< const ZEK::VFlowValueId > Ids() const { return m_Ids; }
 
+  /// The core type of the payloads.
+  virtual const std::type_info& ValueType() const = 0;
+
 protected:
-  virtual void ResizeValues( std::size_t i_Count ) = 0;
-  virtual void TakeValue( std::size_t i_Slot, const ZEK::IFlowItem* i_pItem ) = 0;
+  /// Whether the payloads are still to be looked up for the entries at hand; they are then taken to be.
+  bool TakeValues() const { return !std::exchange( m_bValuesTaken, true ); }
+  bool IsHole( const ZEK::VFlowCursor& i_rEntry ) const { return i_rEntry == m_EndEntry; }
 
 private:
+  static constexpr std::uint32_t None = ~std::uint32_t{ 0 };
   /// An item of the last update in the order of the state, as far as it passed the time test.
   struct VSeen
   {
     ZEK::VFlowValueId Id;
     const ZEK::IFlowItem* pItem = nullptr;
-    std::uint32_t Row = VJoinRow::None;  ///< none: the item has no name
-    std::uint32_t Slot = VJoinRow::None; ///< none: another item of the name came first, or the object lacks something
+    std::uint32_t Row = None;  ///< none: the item has no name
+    std::uint32_t Slot = None; ///< none: another item of the name came first, or the object lacks something
   };
-  bool KeepEntry( VSeen& io_rSeen, const ZEK::VFlowCursor& i_rEntry, std::uint32_t i_NameSelector,
-                  IJoinRows& io_rRows );
+  bool TakeOther( VSeen& io_rSeen, const ZEK::IFlowItem* i_pItem, std::uint32_t i_NameSelector, VNameTable& io_rTable );
 
   std::uint32_t m_Tag;
   ETagRequirement m_Requirement;
@@ -106,7 +93,9 @@ private:
   std::vector< ZEK::VFlowValueId > m_PreviousIds; ///< not kept up while `m_bSameIds`
   mutable std::vector< ZEK::VFlowValueId > m_Sorted;
   std::vector< std::uint32_t > m_Holes; ///< slots without an entry
-  bool m_bSameIds = false;              ///< the ids of the update before are those at hand
+  ZEK::VFlowCursor m_EndEntry;
+  mutable bool m_bValuesTaken = false;
+  bool m_bSameIds = false; ///< the ids of the update before are those at hand
 };
 
 template < typename TCoreType >
@@ -114,17 +103,25 @@ class VItemCacheTyped final : public VItemCache
 {
 public:
   using VItemCache::VItemCache;
-  const std::vector< const TCoreType* >& Values() const { return m_Values; }
 
-protected:
-  void ResizeValues( std::size_t i_Count ) override { m_Values.assign( i_Count, nullptr ); }
-  void TakeValue( std::size_t i_Slot, const ZEK::IFlowItem* i_pItem ) override
+  /// Looked up when somebody asks: most of what changes in a frame is asked for once, some of it never.
+  const std::vector< const TCoreType* >& Values() const
   {
-    m_Values[i_Slot] = ZEK::FlowPayload< TCoreType >( i_pItem );
+    if ( TakeValues() )
+    {
+      const std::vector< ZEK::VFlowCursor >& rEntries = Entries();
+      m_Values.resize( rEntries.size() );
+      for ( std::size_t Slot = 0; Slot < rEntries.size(); ++Slot )
+      {
+        m_Values[Slot] = IsHole( rEntries[Slot] ) ? nullptr : ZEK::FlowPayload< TCoreType >( rEntries[Slot]->pItem );
+      }
+    }
+    return m_Values;
   }
+  const std::type_info& ValueType() const override { return typeid( TCoreType ); }
 
 private:
-  std::vector< const TCoreType* > m_Values;
+  mutable std::vector< const TCoreType* > m_Values;
 };
 
 } // namespace Flow2TypesUtils
