@@ -24,6 +24,14 @@ QString In( const TestSupport::VTemporaryDir& i_rFolder, const char* i_pName )
   return QString::fromStdString( ( i_rFolder.Path() / i_pName ).string() );
 }
 
+QProcessEnvironment WithoutDisplay()
+{
+  QProcessEnvironment Bare = Environment();
+  Bare.remove( "DISPLAY" );
+  Bare.remove( "WAYLAND_DISPLAY" );
+  return Bare;
+}
+
 /// One line of the program's own, and that one names what it is about.
 void ExpectComplaint( const VRun& i_rRun, int i_Exit, const char* i_pNames )
 {
@@ -69,9 +77,7 @@ TEST( Program, AModuleThatCannotBeUsedEndsWithThreeAndIsNamed )
 
 TEST( Program, NoDisplayAndNoServerNamesThePackage )
 {
-  QProcessEnvironment Bare = Environment();
-  Bare.remove( "DISPLAY" );
-  Bare.remove( "WAYLAND_DISPLAY" );
+  QProcessEnvironment Bare = WithoutDisplay();
   Bare.insert( "PATH", "/nonexistent" );
   ExpectComplaint( Harrow( { "render", "--window", "3d" }, Bare ), 4, "\"xvfb\"" );
 }
@@ -94,27 +100,15 @@ TEST( Program, FilesThatCannotBeReadOrWrittenEndWithFiveAndAreNamed )
   ExpectComplaint( Harrow( { "render", "--report", In( Folder, "no/such/folder/a.json" ) } ), 5, "a.json" );
 }
 
-TEST( Program, WithoutADisplayItBringsItsOwn )
+TEST( Program, WithoutADisplayItBringsItsOwnAndTheWindowBecomesPictures )
 {
   HARROW_NEEDS_MODULE();
-  QProcessEnvironment Bare = Environment();
-  Bare.remove( "DISPLAY" );
-  Bare.remove( "WAYLAND_DISPLAY" );
   const TestSupport::VTemporaryDir Folder;
   const QString Picture = In( Folder, "a.png" );
-  const VRun Run = Harrow( { "render", "--size", "640x360", "--output", Picture }, Bare );
+  VRun Run = Harrow( { "render", "--size", "640x360", "--output", Picture }, WithoutDisplay() );
   EXPECT_EQ( Run.Exit, 0 ) << Run.Error.toStdString();
   EXPECT_EQ( QImage( Picture ).size(), QSize( 640, 360 ) );
-}
-
-TEST( Program, WithoutADisplayTheWindowBecomesPictures )
-{
-  HARROW_NEEDS_MODULE();
-  QProcessEnvironment Bare = Environment();
-  Bare.remove( "DISPLAY" );
-  Bare.remove( "WAYLAND_DISPLAY" );
-  const TestSupport::VTemporaryDir Folder;
-  const VRun Run = Harrow( { "render", "--all", "--size", "640x360", "--output-dir", In( Folder, "out" ) }, Bare );
+  Run = Harrow( { "render", "--all", "--size", "640x360", "--output-dir", In( Folder, "out" ) }, WithoutDisplay() );
   EXPECT_EQ( Run.Exit, 0 ) << Run.Error.toStdString();
   EXPECT_TRUE( Run.Output.contains( "3D View: " ) );
   EXPECT_GT( CountColours( QImage( In( Folder, "out/3d-view.png" ) ) ), 20u );

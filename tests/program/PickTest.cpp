@@ -80,45 +80,28 @@ VMarkerAt SimulatedMarker( double i_Seconds )
 }
 } // namespace
 
-TEST( Pick, ClickOnAMarkerOfAC3dFileReportsItsLabel )
+TEST( Pick, ClickOnAMarkerOfAFileReportsItsLabel )
 {
   HARROW_NEEDS_MODULE();
   HARROW_NEEDS_RECORDINGS();
-  const QStringList Source{ "--source", Recording( "c3d-trc/Gait.c3d" ), "--time", "2.43" };
-  EXPECT_EQ( Pick( Source, { "RSHO", 640.4994, 155.2884, 1381.1512 } ), "Gait:RSHO" );
-  EXPECT_EQ( Pick( Source, { "ROFF", 775.4001, 117.7126, 1296.1035 } ), "Gait:ROFF" );
+  const QStringList AtTime{ "--time", "2.43" }, YUp{ "--up", "y" };
+  const std::tuple< const char*, QStringList, VMarkerAt > Cases[] = {
+      { "c3d-trc/Gait.c3d", AtTime, { "Gait:RSHO", 640.4994, 155.2884, 1381.1512 } },
+      { "c3d-trc/Gait.c3d", AtTime, { "Gait:ROFF", 775.4001, 117.7126, 1296.1035 } },
+      { "c3d-trc/Gait.trc", AtTime, { "Gait:R.Shoulder", 640.56439, 155.33781, 1381.36707 } },
+      // In metres, with y up.
+      { "multicam-person/static/markers21.trc", YUp, { "markers21:RHip", -80.589, 869.695, 76.164 } } };
+  for ( const auto& [pFile, rMore, rMarker] : Cases )
+  {
+    EXPECT_EQ( Pick( QStringList{ "--source", Recording( pFile ) } + rMore, rMarker ).toStdString(), rMarker.Label );
+  }
 }
 
-TEST( Pick, ClickOnAMarkerOfATrcFileReportsItsLabel )
-{
-  HARROW_NEEDS_MODULE();
-  HARROW_NEEDS_RECORDINGS();
-  EXPECT_EQ( Pick( { "--source", Recording( "c3d-trc/Gait.trc" ), "--time", "2.43" },
-                   { "R.Shoulder", 640.56439, 155.33781, 1381.36707 } ),
-             "Gait:R.Shoulder" );
-}
-
-TEST( Pick, FilesWithYUpStandOnTheFloorOfTheView )
-{
-  HARROW_NEEDS_MODULE();
-  HARROW_NEEDS_RECORDINGS();
-  const QStringList Source{ "--source", Recording( "multicam-person/static/markers21.trc" ), "--up", "y" };
-  // The file is in metres.
-  EXPECT_EQ( Pick( Source, { "RHip", -80.589, 869.695, 76.164 } ), "markers21:RHip" );
-}
-
-TEST( Pick, ClickOnASimulatedMarkerReportsItsLabel )
+TEST( Pick, ClickOnASimulatedMarkerReportsItsLabelAtAnyRatio )
 {
   HARROW_NEEDS_MODULE();
   const VMarkerAt Marker = SimulatedMarker( 1.0 );
-  EXPECT_EQ( Pick( { "--time", "1.0" }, Marker ).toStdString(), Marker.Label );
-}
-
-TEST( Pick, RatiosMoveNoPick )
-{
-  HARROW_NEEDS_MODULE();
-  const VMarkerAt Marker = SimulatedMarker( 1.0 );
-  for ( const char* pRatio : { "1.5", "2" } )
+  for ( const char* pRatio : { "1", "1.5", "2" } )
   {
     EXPECT_EQ( Pick( { "--time", "1.0", "--ratio", pRatio }, Marker ).toStdString(), Marker.Label ) << pRatio;
   }
@@ -177,15 +160,6 @@ TEST( Report, SaysWhichFrameItShowsAndWhatItDrewWith )
   EXPECT_EQ( QJsonDocument( Report["log"].toArray() ).toJson( QJsonDocument::Compact ).toStdString(), "[]" );
 }
 
-TEST( Report, ACutOffRecordingIsShownAndNoted )
-{
-  HARROW_NEEDS_MODULE();
-  HARROW_NEEDS_RECORDINGS();
-  const QJsonObject Report = Render( { "--source", Recording( "c3d-gpl/Optotrak.c3d" ), "--size", "320x200" } );
-  EXPECT_EQ( Report["frame"].toObject()["count"].toInt(), 29 );
-  EXPECT_TRUE( Report["notes"].toArray().at( 0 ).toString().contains( "Optotrak.c3d" ) );
-}
-
 TEST( Report, DragsAndTheWheelMoveTheCamera )
 {
   HARROW_NEEDS_MODULE();
@@ -203,11 +177,13 @@ TEST( Report, DragsAndTheWheelMoveTheCamera )
   EXPECT_NEAR( Home["distance"].toDouble(), 7000, 1e-6 );
 }
 
-TEST( Report, AFrameOffTheEndIsTheLastOne )
+TEST( Report, ACutOffRecordingIsNotedAndAFrameOffTheEndIsTheLastOne )
 {
   HARROW_NEEDS_MODULE();
   HARROW_NEEDS_RECORDINGS();
   const QJsonObject Report =
-      Render( { "--source", Recording( "c3d-trc/Gait.c3d" ), "--time", "1000", "--size", "320x200" } );
-  EXPECT_EQ( Report["frame"].toObject()["number"].toInt(), 487 );
+      Render( { "--source", Recording( "c3d-gpl/Optotrak.c3d" ), "--size", "320x200", "--time", "1000" } );
+  EXPECT_EQ( Report["frame"].toObject()["count"].toInt(), 29 );
+  EXPECT_EQ( Report["frame"].toObject()["index"].toInt(), 28 );
+  EXPECT_TRUE( Report["notes"].toArray().at( 0 ).toString().contains( "Optotrak.c3d" ) );
 }

@@ -12,38 +12,45 @@
 
 namespace
 {
-HostServices::VHostOptions Options( const TestSupport::VTemporaryDir& i_rFolder )
+class QmlModules : public testing::Test
 {
-  return { .ContentRoot = i_rFolder.Path(),
-           .UserRoot = i_rFolder.Path(),
-           .Preferences = i_rFolder.Path() / "preferences.json",
-           .Now = []
-           {
-             return std::int64_t{ 0 };
-           } };
-}
+protected:
+  std::unique_ptr< HostServices::VHost > NewHost() const
+  {
+    auto pHost = std::make_unique< HostServices::VHost >(
+        HostServices::VHostOptions{ .ContentRoot = m_Folder.Path(),
+                                    .UserRoot = m_Folder.Path(),
+                                    .Preferences = m_Folder.Path() / "preferences.json",
+                                    .Now = []
+                                    {
+                                      return std::int64_t{ 0 };
+                                    } } );
+    HostQml::RegisterModules( *pHost );
+    return pHost;
+  }
 
-std::unique_ptr< QObject > Make( HostServices::VHost& i_rHost, const char* i_pDocument )
-{
-  QQmlComponent Component( i_rHost.Quick()->Engine() );
-  Component.setData( i_pDocument, QUrl( QStringLiteral( "qrc:/test.qml" ) ) );
-  std::unique_ptr< QObject > pObject( Component.create() );
-  EXPECT_TRUE( pObject ) << Component.errorString().toStdString();
-  return pObject;
-}
+  static std::unique_ptr< QObject > Make( HostServices::VHost& i_rHost, const char* i_pDocument )
+  {
+    QQmlComponent Component( i_rHost.Quick()->Engine() );
+    Component.setData( i_pDocument, QUrl( QStringLiteral( "qrc:/test.qml" ) ) );
+    std::unique_ptr< QObject > pObject( Component.create() );
+    EXPECT_TRUE( pObject ) << Component.errorString().toStdString();
+    return pObject;
+  }
+
+  const TestSupport::VTemporaryDir m_Folder;
+  const std::unique_ptr< HostServices::VHost > m_pHost = NewHost();
+};
 } // namespace
 
-TEST( QmlModules, PlaybackFollowsAndMovesTheClockOfItsOwnHost )
+TEST_F( QmlModules, PlaybackFollowsAndMovesTheClockOfItsOwnHost )
 {
-  const TestSupport::VTemporaryDir Folder;
   // A second host in the process must not answer for the first.
-  HostServices::VHost First( Options( Folder ) );
-  HostServices::VHost Second( Options( Folder ) );
-  HostQml::RegisterModules( First );
-  HostQml::RegisterModules( First );
-  HostQml::RegisterModules( Second );
-  ASSERT_TRUE( Second.Playback()->Open( 100, 1000 ).IsOk() );
-  const auto pObject = Make( Second, R"(
+  const auto pSecond = NewHost();
+  HostServices::VHost& rSecond = *pSecond;
+  HostQml::RegisterModules( *m_pHost );
+  ASSERT_TRUE( rSecond.Playback()->Open( 100, 1000 ).IsOk() );
+  const auto pObject = Make( rSecond, R"(
     import QtQml
     import Moxel.Playback
     QtObject {
@@ -57,21 +64,19 @@ TEST( QmlModules, PlaybackFollowsAndMovesTheClockOfItsOwnHost )
   EXPECT_EQ( pObject->property( "period" ).toInt(), 1000 );
   EXPECT_TRUE( pObject->property( "scrub" ).toBool() );
   QMetaObject::invokeMethod( pObject.get(), "move" );
-  EXPECT_EQ( Second.Playback()->CurrentFrame(), 4 );
-  EXPECT_EQ( First.Playback()->CurrentTick(), 0 );
-  Second.Playback()->Play();
-  Second.Playback()->SeekFrame( 7 );
-  EXPECT_TRUE( Second.Postal()->DrainForTest() );
+  EXPECT_EQ( rSecond.Playback()->CurrentFrame(), 4 );
+  EXPECT_EQ( m_pHost->Playback()->CurrentTick(), 0 );
+  rSecond.Playback()->Play();
+  rSecond.Playback()->SeekFrame( 7 );
+  EXPECT_TRUE( rSecond.Postal()->DrainForTest() );
   EXPECT_EQ( pObject->property( "tick" ).toLongLong(), 7000 );
   EXPECT_TRUE( pObject->property( "playing" ).toBool() );
 }
 
-TEST( QmlModules, SelectionCountsKindsAndSignals )
+TEST_F( QmlModules, SelectionCountsKindsAndSignals )
 {
-  const TestSupport::VTemporaryDir Folder;
-  HostServices::VHost Host( Options( Folder ) );
-  HostQml::RegisterModules( Host );
-  const auto pObject = Make( Host, R"(
+  HostServices::VHost& rHost = *m_pHost;
+  const auto pObject = Make( rHost, R"(
     import QtQml
     import Moxel.Selection
     import Moxel.Graphics
@@ -87,28 +92,22 @@ TEST( QmlModules, SelectionCountsKindsAndSignals )
     })" );
   ASSERT_TRUE( pObject );
   EXPECT_EQ( pObject->property( "lock" ).toInt(), 34 );
-  Host.Selection()->Set( ZEK::ISelectionService::EPrimary,
-                         { { .Kind = ZEK::ESelectCamera, .Device = "A" },
-                           { .Kind = ZEK::ESelectMarker, .Device = "S:M" },
-                           { .Kind = ZEK::ESelectReconstruction, .Device = "", .Sub = 3 } } );
-  EXPECT_TRUE( Host.Postal()->DrainForTest() );
+  rHost.Selection()->Set( ZEK::ISelectionService::EPrimary,
+                          { { .Kind = ZEK::ESelectCamera, .Device = "A" },
+                            { .Kind = ZEK::ESelectMarker, .Device = "S:M" },
+                            { .Kind = ZEK::ESelectReconstruction, .Device = "", .Sub = 3 } } );
+  EXPECT_TRUE( rHost.Postal()->DrainForTest() );
   EXPECT_EQ( pObject->property( "points" ).toInt(), 2 );
   EXPECT_EQ( pObject->property( "all" ).toInt(), 3 );
   EXPECT_EQ( pObject->property( "changes" ).toInt(), 1 );
   EXPECT_TRUE( TestSupport::LogTexts( "Qml", ZEK::ELogWarning ).empty() );
 }
 
-TEST( QmlModules, SingletonsGoWithTheirEngine )
+TEST_F( QmlModules, SingletonsGoWithTheirEngine )
 {
-  const TestSupport::VTemporaryDir Folder;
-  auto pHost = std::make_unique< HostServices::VHost >( Options( Folder ) );
+  auto pHost = NewHost();
   const auto pClock = pHost->Playback();
-  HostQml::RegisterModules( *pHost );
-  {
-    const auto pObject =
-        Make( *pHost, "import QtQml\nimport Moxel.Playback\nQtObject { property real t: Playback.tick }" );
-    ASSERT_TRUE( pObject );
-  }
+  ASSERT_TRUE( Make( *pHost, "import QtQml\nimport Moxel.Playback\nQtObject { property real t: Playback.tick }" ) );
   pHost.reset();
   // The singleton is gone with the engine; its connections must not be called.
   ASSERT_TRUE( pClock->Open( 10, 1000 ).IsOk() );
