@@ -15,6 +15,37 @@ using namespace CoreGraphicsTests;
 
 namespace
 {
+// Vertex shaders and the fragment shaders that each is drawn with.
+const char* const Pairs = R"(FloorGrid: FloorGrid UniformColour; ScreenSpaceAxis: Colour; Sphere: SimpleLighting;
+SpherePoint: SimpleLighting; SphereShadow: Colour; Simple3D: UniformColour; Simple3DUniformColour: Colour;
+Simple3DVertexColour: Colour; FullScreen: Copy Distort; Simple: Outlines AntiAlias;
+ForcePlate: ForcePlate SimpleLighting; Simple3DModel: SimpleLighting;
+Simple3DModelColour: SimpleLighting ClipFloor CameraCoverageFurstum;
+Simple3DModelWireframe: Colour UniformColour; Locator: Colour; Billboard: ActiveLabelHalo;
+PlumeMarkerTrails: Colour; Point3D: Colour; Simple3DPointSize: UniformColour; SimpleColour: Colour;
+ColoredLine: StippledLine; Camera: Camera; CameraRay: Colour CameraCoverageFurstum ClipFloor StippledLine;
+Edge3D: Colour; Edge2D: Colour; General2D: Colour; MaskSquare: Mask MaskSelection;
+Greyscale2D: Greyscale2D Greyscale2DSelection; GreyscaleMaximised: Greyscale2D Greyscale2DSelection;
+Greyscale3D: Colour; WandWave2D: WandWave2D; Centroid2D: Centroid2D Centroid2DSelection Colour;
+Centroid3D: Colour; Frame: UniformColour; Video: VideoBayer VideoLuminance VideoYUV VideoYUVPlanar;
+Stick: Colour SimpleLighting; StickShadow: Colour; Target: SimpleLighting Colour; Segment: Segment;
+NonUniformSphere: Covariance; MissingMarker: MissingMarker; FBXSkin: FBXMaterial XRay;
+FBXMesh: FBXMaterial XRay; FBXColoredMesh: FBXMaterial SimpleLighting XRay;)";
+
+// The uniforms that the code sets, by type.
+const char* const Uniforms = R"(mat4: u_ViewProjection u_View u_Projection mv u_BoneTransforms;
+vec4: u_View2D u_Extents u_Colour u_PrimaryColour u_SensorImageOffsetScale u_MapOffsetScale
+u_VideoScaleAndOffset u_UserColourA u_UserColourB;
+vec2: u_ViewportSize u_ViewportOffset u_FrameSize u_GridSpacings u_SensorSize u_RadialDistortionCentre
+u_RotationCentre u_Offset;
+vec3: u_LightVector u_Up u_CameraPosition u_SelectionId u_PreSelectColour u_Force u_CentreOfPressure
+u_SourcePoint u_RadialDistortionParameters u_SpecularColour u_EmissiveColour;
+float: u_GlobalTime u_PointSize u_FrameNumber u_GammaCorrection u_VideoSaturation u_Shininess u_Alpha;
+sampler2D: t_Texture t_DiffuseTexture t_Selection t_Buffer t_MapX t_MapY t_TextureY t_TextureU t_TextureV;
+mat2: u_Rotation u_RotationInverse;
+bool: u_ShowSelection u_Inverted u_ChromaFirst u_HighlightMissing;
+int: u_PhaseX u_PhaseY;)";
+
 struct VSource
 {
   EShaderType Type;
@@ -76,78 +107,15 @@ TEST_P( CatalogueTest, EveryPairLinks )
   VTestContext Context( GetParam() );
   VResources Resources;
   ASSERT_TRUE( Resources.Prepare() );
-  const std::vector< std::array< const char*, 2 > > Pairs = { { "FloorGrid", "FloorGrid" },
-                                                              { "FloorGrid", "UniformColour" },
-                                                              { "ScreenSpaceAxis", "Colour" },
-                                                              { "Sphere", "SimpleLighting" },
-                                                              { "SpherePoint", "SimpleLighting" },
-                                                              { "SphereShadow", "Colour" },
-                                                              { "Simple3D", "UniformColour" },
-                                                              { "Simple3DUniformColour", "Colour" },
-                                                              { "Simple3DVertexColour", "Colour" },
-                                                              { "FullScreen", "Copy" },
-                                                              { "Simple", "Outlines" },
-                                                              { "Simple", "AntiAlias" },
-                                                              { "ForcePlate", "ForcePlate" },
-                                                              { "ForcePlate", "SimpleLighting" },
-                                                              { "Simple3DModel", "SimpleLighting" },
-                                                              { "Simple3DModelColour", "SimpleLighting" },
-                                                              { "Simple3DModelColour", "ClipFloor" },
-                                                              { "Simple3DModelWireframe", "Colour" },
-                                                              { "Simple3DModelWireframe", "UniformColour" },
-                                                              { "Locator", "Colour" },
-                                                              { "Billboard", "ActiveLabelHalo" },
-                                                              { "PlumeMarkerTrails", "Colour" },
-                                                              { "Point3D", "Colour" },
-                                                              { "Simple3DPointSize", "UniformColour" },
-                                                              { "SimpleColour", "Colour" },
-                                                              { "ColoredLine", "StippledLine" },
-                                                              { "Camera", "Camera" },
-                                                              { "CameraRay", "Colour" },
-                                                              { "CameraRay", "CameraCoverageFurstum" },
-                                                              { "Simple3DModelColour", "CameraCoverageFurstum" },
-                                                              { "CameraRay", "ClipFloor" },
-                                                              { "CameraRay", "StippledLine" },
-                                                              { "Edge3D", "Colour" },
-                                                              { "Edge2D", "Colour" },
-                                                              { "General2D", "Colour" },
-                                                              { "MaskSquare", "Mask" },
-                                                              { "MaskSquare", "MaskSelection" },
-                                                              { "Greyscale2D", "Greyscale2D" },
-                                                              { "Greyscale2D", "Greyscale2DSelection" },
-                                                              { "GreyscaleMaximised", "Greyscale2D" },
-                                                              { "GreyscaleMaximised", "Greyscale2DSelection" },
-                                                              { "Greyscale3D", "Colour" },
-                                                              { "WandWave2D", "WandWave2D" },
-                                                              { "Centroid2D", "Centroid2D" },
-                                                              { "Centroid2D", "Centroid2DSelection" },
-                                                              { "Centroid2D", "Colour" },
-                                                              { "Centroid3D", "Colour" },
-                                                              { "Frame", "UniformColour" },
-                                                              { "FullScreen", "Distort" },
-                                                              { "Video", "VideoBayer" },
-                                                              { "Video", "VideoLuminance" },
-                                                              { "Video", "VideoYUV" },
-                                                              { "Video", "VideoYUVPlanar" },
-                                                              { "Stick", "Colour" },
-                                                              { "Stick", "SimpleLighting" },
-                                                              { "StickShadow", "Colour" },
-                                                              { "Target", "SimpleLighting" },
-                                                              { "Target", "Colour" },
-                                                              { "Segment", "Segment" },
-                                                              { "NonUniformSphere", "Covariance" },
-                                                              { "MissingMarker", "MissingMarker" },
-                                                              { "FBXSkin", "FBXMaterial" },
-                                                              { "FBXSkin", "XRay" },
-                                                              { "FBXMesh", "FBXMaterial" },
-                                                              { "FBXMesh", "XRay" },
-                                                              { "FBXColoredMesh", "FBXMaterial" },
-                                                              { "FBXColoredMesh", "SimpleLighting" },
-                                                              { "FBXColoredMesh", "XRay" } };
-  for ( const auto& [pVertex, pFragment] : Pairs )
+  for ( const QString& rLook : QString( Pairs ).simplified().split( ';', Qt::SkipEmptyParts ) )
   {
-    EXPECT_TRUE( Resources.GetProgram( pVertex, pFragment )->IsUsable() ) << pVertex << ' ' << pFragment;
-    EXPECT_TRUE( Resources.GetProgram( pVertex, pFragment, EFormInstanced )->IsUsable() ) << pVertex;
+    const std::string Vertex = rLook.section( ':', 0, 0 ).trimmed().toStdString();
+    for ( const QString& rFragment : rLook.section( ':', 1 ).split( ' ', Qt::SkipEmptyParts ) )
+    {
+      const std::string Fragment = rFragment.toStdString();
+      EXPECT_TRUE( Resources.GetProgram( Vertex, Fragment )->IsUsable() ) << Vertex << ' ' << Fragment;
+      EXPECT_TRUE( Resources.GetProgram( Vertex, Fragment, EFormInstanced )->IsUsable() ) << Vertex << ' ' << Fragment;
+    }
   }
   // Whatever can be drawn can be picked.
   for ( const VSource& rSource : Catalogue() )
@@ -177,63 +145,14 @@ TEST( CatalogueText, PrecisionIsNeverLowered )
 // A uniform with a misspelt name or another type compiles and links, and stays 0.
 TEST( CatalogueText, EveryUniformIsOneThatSomebodySets )
 {
-  std::map< QString, QString > Known = { { "u_ViewProjection", "mat4" },
-                                         { "u_View", "mat4" },
-                                         { "u_Projection", "mat4" },
-                                         { "u_View2D", "vec4" },
-                                         { "u_ViewportSize", "vec2" },
-                                         { "u_ViewportOffset", "vec2" },
-                                         { "u_FrameSize", "vec2" },
-                                         { "u_LightVector", "vec3" },
-                                         { "u_Up", "vec3" },
-                                         { "u_GlobalTime", "float" },
-                                         { "u_CameraPosition", "vec3" },
-                                         { "u_Extents", "vec4" },
-                                         { "u_GridSpacings", "vec2" },
-                                         { "t_Texture", "sampler2D" },
-                                         { "t_DiffuseTexture", "sampler2D" },
-                                         { "u_Colour", "vec4" },
-                                         { "u_SelectionId", "vec3" },
-                                         { "t_Selection", "sampler2D" },
-                                         { "t_Buffer", "sampler2D" },
-                                         { "u_PrimaryColour", "vec4" },
-                                         { "u_PreSelectColour", "vec3" },
-                                         { "u_Force", "vec3" },
-                                         { "u_CentreOfPressure", "vec3" },
-                                         { "u_PointSize", "float" },
-                                         { "mv", "mat4" },
-                                         { "u_SourcePoint", "vec3" },
-                                         { "u_SensorSize", "vec2" },
-                                         { "u_SensorImageOffsetScale", "vec4" },
-                                         { "u_MapOffsetScale", "vec4" },
-                                         { "t_MapX", "sampler2D" },
-                                         { "t_MapY", "sampler2D" },
-                                         { "u_RadialDistortionCentre", "vec2" },
-                                         { "u_RadialDistortionParameters", "vec3" },
-                                         { "u_RotationCentre", "vec2" },
-                                         { "u_Rotation", "mat2" },
-                                         { "u_RotationInverse", "mat2" },
-                                         { "u_Offset", "vec2" },
-                                         { "u_ShowSelection", "bool" },
-                                         { "u_FrameNumber", "float" },
-                                         { "u_VideoScaleAndOffset", "vec4" },
-                                         { "u_Inverted", "bool" },
-                                         { "u_GammaCorrection", "float" },
-                                         { "u_VideoSaturation", "float" },
-                                         { "u_PhaseX", "int" },
-                                         { "u_PhaseY", "int" },
-                                         { "u_ChromaFirst", "bool" },
-                                         { "t_TextureY", "sampler2D" },
-                                         { "t_TextureU", "sampler2D" },
-                                         { "t_TextureV", "sampler2D" },
-                                         { "u_BoneTransforms", "mat4" },
-                                         { "u_HighlightMissing", "bool" },
-                                         { "u_UserColourA", "vec4" },
-                                         { "u_UserColourB", "vec4" },
-                                         { "u_SpecularColour", "vec3" },
-                                         { "u_EmissiveColour", "vec3" },
-                                         { "u_Shininess", "float" },
-                                         { "u_Alpha", "float" } };
+  std::map< QString, QString > Known;
+  for ( const QString& rType : QString( Uniforms ).simplified().split( ';', Qt::SkipEmptyParts ) )
+  {
+    for ( const QString& rName : rType.section( ':', 1 ).split( ' ', Qt::SkipEmptyParts ) )
+    {
+      Known[rName] = rType.section( ':', 0, 0 ).trimmed();
+    }
+  }
   std::set< QString > PerObject;
   for ( int Attribute = EAttributeModelTransform; Attribute < EAttributeInstanceFlags; ++Attribute )
   {

@@ -82,8 +82,7 @@ class FragmentShaderTest : public testing::TestWithParam< EContextKind >
 public:
   VShaderBench Bench{ GetParam() };
 };
-INSTANTIATE_TEST_SUITE_P( Contexts, FragmentShaderTest, testing::Values( EKindCore, EKindCompatibility, EKindES ),
-                          KindName );
+INSTANTIATE_TEST_SUITE_P( Contexts, FragmentShaderTest, testing::Values( EKindCore, EKindES ), KindName );
 
 TEST_P( FragmentShaderTest, LightIsTheSumOfItsTerms )
 {

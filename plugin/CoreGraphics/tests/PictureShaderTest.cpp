@@ -29,8 +29,7 @@ class PictureShaderTest : public testing::TestWithParam< EContextKind >
 public:
   VShaderBench Bench{ GetParam() };
 };
-INSTANTIATE_TEST_SUITE_P( Contexts, PictureShaderTest, testing::Values( EKindCore, EKindCompatibility, EKindES ),
-                          KindName );
+INSTANTIATE_TEST_SUITE_P( Contexts, PictureShaderTest, testing::Values( EKindCore, EKindES ), KindName );
 
 TEST_P( PictureShaderTest, OutlinesOfAMask )
 {

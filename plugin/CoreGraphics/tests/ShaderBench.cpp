@@ -251,9 +251,11 @@ VShaderBench::VValues VShaderBench::Vertex( const std::string& i_rName, const VV
   }
   SetValues( rProgram, i_rValues );
   m_rGl.glBindBufferBase( GL_TRANSFORM_FEEDBACK_BUFFER, 0, m_Captured );
+  m_rGl.glEnable( GL_RASTERIZER_DISCARD );
   m_rGl.glBeginTransformFeedback( GL_POINTS );
   m_rGl.glDrawArrays( GL_POINTS, 0, 1 );
   m_rGl.glEndTransformFeedback();
+  m_rGl.glDisable( GL_RASTERIZER_DISCARD );
   const auto* pValue = static_cast< const float* >(
       m_rGl.glMapBufferRange( GL_TRANSFORM_FEEDBACK_BUFFER, 0, Captured * sizeof( float ), GL_MAP_READ_BIT ) );
   VValues Result;

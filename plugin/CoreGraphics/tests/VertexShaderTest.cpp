@@ -98,8 +98,7 @@ public:
   VShaderBench Bench;
   QMatrix4x4 View, Perspective, Parallel, Model;
 };
-INSTANTIATE_TEST_SUITE_P( Contexts, VertexShaderTest, testing::Values( EKindCore, EKindCompatibility, EKindES ),
-                          KindName );
+INSTANTIATE_TEST_SUITE_P( Contexts, VertexShaderTest, testing::Values( EKindCore, EKindES ), KindName );
 
 TEST_P( VertexShaderTest, AllOfASensorLandsBySameRule )
 {
