@@ -212,6 +212,8 @@ void VSceneFramebufferObject::mouseDoubleClickEvent( QMouseEvent* i_pEvent )
   if ( m_pScene && !m_Options.CameraView )
   {
     SetPreviewCamera( m_pScene->GetSelectedCameraURN() );
+    // The first of the two clicks may still wait for its pick.
+    m_bPreviewPicked = true;
   }
 }
 

@@ -235,6 +235,11 @@ void VSceneFramebufferObject::ApplyPick( const VPickResult& i_rResult )
         ZEK::ISelectionService::EPrimary,
         ZEK::EditSelection( pService->Get( ZEK::ISelectionService::EPrimary ), i_rResult.Selection, i_rResult.Edit ) );
   }
+  const bool bPreview = std::exchange( m_bPreviewPicked, false );
+  if ( const QString URN = bPreview && m_pScene ? m_pScene->GetSelectedCameraURN() : QString(); !URN.isEmpty() )
+  {
+    SetPreviewCamera( URN );
+  }
   emit SelectionChanged();
   update();
 }

@@ -60,6 +60,11 @@ public:
     o_rPose = Pose;
     return i_rSelection.size() == 1;
   }
+  QString GetSelectedCameraURN() override
+  {
+    const ZEK::VSelection Selection = pSelection->Get( ZEK::ISelectionService::EPrimary );
+    return Selection.size() == 1 ? QString( "vi:%1" ).arg( Selection[0].Sub ) : QString();
+  }
 
   std::vector< std::string > Seen;
   VScenePose Pose;
@@ -290,6 +295,41 @@ TEST_F( VItemHooks, CamerasAndNamesStandWhereTheFrameShowsThem )
   Frames( 3 );
   EXPECT_TRUE( pItem->CameraObjects().isEmpty() );
   EXPECT_EQ( Memberships, 2 );
+}
+
+TEST_F( VItemHooks, ADoubleClickPreviewsTheCameraEvenBeforeItsPickIsBack )
+{
+  QStringList Previews;
+  QObject::connect( pItem, &VSceneFramebufferObject::PreviewCameraChanged,
+                    [&]
+                    {
+                      Previews.append( pItem->PreviewCamera() );
+                    } );
+  pScene->pSelection->Set( ZEK::ISelectionService::EPrimary, { Recon( 2 ) } );
+  const auto DoubleClick = [&]( QPointF i_Place )
+  {
+    Mouse( QEvent::MouseButtonPress, i_Place, Qt::LeftButton, Qt::LeftButton );
+    Mouse( QEvent::MouseButtonRelease, i_Place, Qt::LeftButton, Qt::NoButton );
+    Mouse( QEvent::MouseButtonPress, i_Place, Qt::LeftButton, Qt::LeftButton );
+    Mouse( QEvent::MouseButtonDblClick, i_Place, Qt::LeftButton, Qt::LeftButton );
+    Mouse( QEvent::MouseButtonRelease, i_Place, Qt::LeftButton, Qt::NoButton );
+    return Until(
+        [&]
+        {
+          return !pItem->IsPickPending();
+        } );
+  };
+  ASSERT_TRUE( DoubleClick( Place( 1 ) ) );
+  ASSERT_TRUE( Until(
+      [&]
+      {
+        return pItem->PreviewCamera() == "vi:1";
+      } ) );
+  EXPECT_EQ( Previews.last(), "vi:1" );
+  pItem->setOption( "CameraView", true );
+  pScene->pSelection->Set( ZEK::ISelectionService::EPrimary, { Recon( 0 ) } );
+  ASSERT_TRUE( DoubleClick( { 600, 40 } ) );
+  EXPECT_EQ( pItem->PreviewCamera(), "vi:1" ) << "in a camera view the grid answers";
 }
 
 TEST_F( VItemHooks, OnlyTheFreeViewIsMultisampled )

@@ -207,6 +207,7 @@ private:
   int m_PreselectColour = 0;
   ZEK::ESelectionEdit m_Edit = ZEK::ESelectionEdit::Replace;
   bool m_bClickPending = false;
+  bool m_bPreviewPicked = false; ///< the next commit says which camera is previewed
   bool m_bFollowUp = false;
   bool m_bFocusPending = false;
   ETracking m_Tracking = ETrackNone;
