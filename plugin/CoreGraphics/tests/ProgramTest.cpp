@@ -3,6 +3,8 @@
 #include <TestSupport/LogGuard.h>
 #include <TestSupport/Paths.h>
 
+#include <numeric>
+
 using namespace CoreGraphics;
 using namespace CoreGraphicsTests;
 
@@ -128,6 +130,27 @@ TEST_P( ProgramTest, OtherUniformsAreFoundByNameAndSetByLocation )
              ( std::vector< float >{ 1, 2, 3, 4 } ) );
   EXPECT_EQ( Value( Context, *pProgram, pProgram->UniformLocation( "u_Matrix2" ), 4 ),
              std::vector< float >( Matrix.constData(), Matrix.constData() + 4 ) );
+}
+
+TEST_P( ProgramTest, AnArrayOfMatricesIsFilledFromItsStart )
+{
+  const auto pProgram = Resources.GetProgram( "FBXSkin", "FBXMaterial" );
+  Context.Begin();
+  ASSERT_TRUE( Context.pRender->UseProgram( pProgram ) );
+  const int Bones = pProgram->UniformLocation( "u_BoneTransforms" );
+  ASSERT_GE( Bones, 0 );
+  std::vector< float > Columns( 250 * 16 + 7 );
+  std::iota( Columns.begin(), Columns.end(), 1.0f );
+  pProgram->SetUniformMatrices( Bones, Columns ); // seven floats are no matrix
+  pProgram->SetUniformMatrices( Bones, std::span( Columns ).first( 15 ) );
+  pProgram->SetUniformMatrices( -1, Columns );
+  for ( const int Index : { 0, 1, 249 } )
+  {
+    const std::string Name = "u_BoneTransforms[" + std::to_string( Index ) + "]";
+    const int Location = Context.pRender->Functions()->glGetUniformLocation( pProgram->Id(), Name.c_str() );
+    const auto First = Columns.begin() + Index * 16;
+    EXPECT_EQ( Value( Context, *pProgram, Location, 16 ), std::vector< float >( First, First + 16 ) ) << Index;
+  }
 }
 
 TEST_P( ProgramTest, UsingProgramsAllocatesNothing )
