@@ -186,14 +186,14 @@ TEST( SimulatedCapture, SlowItemsAreTheSameObjectsInEveryState )
   const auto First = StateOf( Capture, 10 ), Second = StateOf( Capture, 5000000 );
   const std::map< std::uint32_t, std::size_t > Counts = { { 0x1000, 12 }, { 0x100a, 12 }, { 0x1012, 2 },
                                                           { 0x1013, 2 },  { 0x1023, 2 },  { 0x1029, 1 },
-                                                          { 0x1031, 1 },  { 0x100f, 1 } };
+                                                          { 0x1031, 1 },  { 0x100f, 1 },  { 0x1, 1 } };
   for ( const auto& [Tag, Count] : Counts )
   {
     EXPECT_EQ( ItemsOf( *First, Tag ).size(), Count ) << Tag;
     EXPECT_EQ( ItemsOf( *First, Tag ), ItemsOf( *Second, Tag ) ) << Tag;
   }
   EXPECT_NE( ItemsOf( *First, 0x100d ), ItemsOf( *Second, 0x100d ) );
-  EXPECT_EQ( First->ItemCount(), 36u );
+  EXPECT_EQ( First->ItemCount(), 37u );
 
   const auto Axis = ItemsOf( *First, 0x1029 );
   EXPECT_EQ( FlowPayload< VWorldAxis >( Axis[0].Get() )->Up, 2u );

@@ -50,6 +50,13 @@ void MarkMembers( std::vector< std::uint8_t >& o_rFlags, const MoxelGraphics::IR
 }
 } // namespace
 
+VFlowRenderReconstructions::VFlowRenderReconstructions( MoxelGraphics::VMoxelScene& i_rScene )
+  : VRenderReconstructions( i_rScene )
+{
+  m_Subjects.AddCache< CoreMoxelTypes::FlowSubject >( Flow2TypesUtils::ETagRequirement::Required );
+  m_Subjects.AddCache< CoreMoxelTypes::FlowSubjectApplicationData >( Flow2TypesUtils::ETagRequirement::Optional );
+}
+
 void VFlowRenderReconstructions::Update( const ZEK::IFlowState& i_rState )
 {
   if ( TakeItems( i_rState ) )
@@ -69,47 +76,27 @@ bool VFlowRenderReconstructions::TakeItems( const ZEK::IFlowState& i_rState )
 
 bool VFlowRenderReconstructions::TakeSubjects( const ZEK::IFlowState& i_rState )
 {
-  std::vector< VLabellingSubject >& rSubjects = m_LabelledPoints.Subjects;
-  bool bOther = false;
-  std::size_t Count = 0;
-  constexpr std::uint32_t SubjectTag = ZEK::FlowTag< CoreMoxelTypes::FlowSubject >;
-  constexpr std::uint32_t DataTag = ZEK::FlowTag< CoreMoxelTypes::FlowSubjectApplicationData >;
-  ZEK::VFlowCursor It, End, DataIt, DataEnd;
-  i_rState.TagBegin( It, SubjectTag, EFlowTimeMatch::Overlap );
-  i_rState.TagEnd( End, SubjectTag, EFlowTimeMatch::Overlap );
-  i_rState.TagBegin( DataIt, DataTag, EFlowTimeMatch::Overlap );
-  i_rState.TagEnd( DataEnd, DataTag, EFlowTimeMatch::Overlap );
-  const auto DataOf = [&]( std::string_view i_Name ) -> ZEK::IFlowItem*
+  using namespace CoreMoxelTypes;
+  m_Subjects.Update( i_rState, ZEK::EFlowNameObject, EFlowTimeMatch::Overlap, i_rState.GetKey() );
+  if ( !m_Subjects.NamesChanged() && !m_Subjects.Changed( ZEK::FlowTag< FlowSubject > ) &&
+       !m_Subjects.Changed( ZEK::FlowTag< FlowSubjectApplicationData > ) )
   {
-    for ( ZEK::VFlowCursor Data = DataIt; Data != DataEnd; ++Data )
-    {
-      std::string_view Name;
-      if ( Data->pItem->Value().GetName( ZEK::EFlowNameObject, Name ) && Name == i_Name )
-      {
-        return Data->pItem;
-      }
-    }
-    return nullptr;
-  };
-  for ( ; It != End; ++It )
-  {
-    const auto* const pSubject = ZEK::FlowPayload< CoreMoxelTypes::VSubject >( It->pItem );
-    std::string_view Name;
-    if ( !pSubject || !FlowTimeMatches( EFlowTimeMatch::Overlap, It->Key, i_rState.GetKey() ) ||
-         !It->pItem->Value().GetName( ZEK::EFlowNameObject, Name ) )
-    {
-      continue;
-    }
-    VLabellingSubject& rSlot = Count < rSubjects.size() ? rSubjects[Count] : rSubjects.emplace_back();
-    const ZEK::VFlowItemRef Subject( It->pItem );
-    const ZEK::VFlowItemRef Data( DataOf( Name ) );
-    bOther = bOther || IsOtherValue( rSlot.Subject, Subject ) || IsOtherValue( rSlot.ApplicationData, Data );
-    rSlot = { Subject, Data, pSubject, ZEK::FlowPayload< CoreMoxelTypes::VSubjectApplicationData >( Data.Get() ) };
-    ++Count;
+    return false;
   }
-  bOther = bOther || Count != rSubjects.size();
-  rSubjects.resize( Count );
-  return bOther;
+  m_Subjects.Items< FlowSubject >( m_SubjectItems );
+  m_Subjects.Items< FlowSubjectApplicationData >( m_DataItems );
+  m_LabelledPoints.Subjects.clear();
+  for ( std::size_t Slot = 0; Slot < m_SubjectItems.size(); ++Slot )
+  {
+    if ( const auto* const pSubject = m_Subjects.Values< FlowSubject >()[Slot] )
+    {
+      m_LabelledPoints.Subjects.push_back( { m_SubjectItems[Slot], m_DataItems[Slot], pSubject,
+                                             m_Subjects.Values< FlowSubjectApplicationData >()[Slot] } );
+    }
+  }
+  m_SubjectItems.clear();
+  m_DataItems.clear();
+  return true;
 }
 
 void VFlowRenderReconstructions::Rebuild()

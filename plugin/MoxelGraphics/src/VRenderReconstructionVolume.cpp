@@ -16,6 +16,8 @@ namespace
 using namespace CoreGraphics;
 
 constexpr float LargestPlace = 1e9F; // mm
+/// How far the edges on the floor are drawn above it, mm: in its plane they would fight with it.
+constexpr float EdgeLift = 10.0F;
 const QVector4D EdgeColour( 0.5F, 0.5F, 0.5F, 1.0F );
 const QVector4D FarColour( 0.5F, 0.5F, 0.5F, 0.2F );
 const QVector4D NearColour( 0.5F, 0.5F, 0.5F, 0.1F );
@@ -98,7 +100,10 @@ void VRenderReconstructionVolume::Render( CoreGraphics::VRenderContext& io_rCont
   {
     return;
   }
-  const QVector3D Low( m_Minimum[0], m_Minimum[1], m_Minimum[2] ), High( m_Maximum[0], m_Maximum[1], m_Maximum[2] );
+  QVector3D Low( m_Minimum[0], m_Minimum[1], m_Minimum[2] );
+  const QVector3D High( m_Maximum[0], m_Maximum[1], m_Maximum[2] );
+  float& rFoot = Low[io_rContext.YUp() ? 1 : 2];
+  rFoot = std::abs( rFoot ) < EdgeLift ? std::min( EdgeLift, High[io_rContext.YUp() ? 1 : 2] ) : rFoot;
   QMatrix4x4 Model;
   Model.translate( 0.5F * ( Low + High ) );
   Model.scale( High - Low );

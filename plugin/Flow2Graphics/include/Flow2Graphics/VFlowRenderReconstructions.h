@@ -2,6 +2,8 @@
 
 #include <Flow2Graphics/IFlowRenderType.h>
 #include <Flow2Graphics/LabelledPoints.h>
+
+#include <Flow2TypesUtils/TaggedCoreTypeExtractor.h>
 #include <MoxelGraphics/VRenderReconstructions.h>
 
 namespace Flow2Graphics
@@ -14,7 +16,7 @@ namespace Flow2Graphics
 class VFlowRenderReconstructions : public MoxelGraphics::VRenderReconstructions, public IFlowRenderType
 {
 public:
-  using VRenderReconstructions::VRenderReconstructions;
+  explicit VFlowRenderReconstructions( MoxelGraphics::VMoxelScene& i_rScene );
 
   void Update( const ZEK::IFlowState& i_rState ) override;
 
@@ -27,6 +29,8 @@ private:
   void Rebuild();
   void GiveIds();
 
+  Flow2TypesUtils::VTaggedCoreTypeExtractor m_Subjects;
+  std::vector< ZEK::VFlowItemRef > m_SubjectItems, m_DataItems; ///< by slot, while subjects are taken
   ZEK::VFlowItemRef m_Set;
   ZEK::VFlowItemRef m_Labels;
   VUnlabelledPoints m_UnlabelledPoints;
