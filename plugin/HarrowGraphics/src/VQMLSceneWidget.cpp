@@ -216,6 +216,8 @@ bool VQMLSceneWidget::Execute3DCommand( const std::string& i_rText )
   {
     if ( i_bCondition )
     {
+      // Chosen once more, it is about what is selected now.
+      setTracking( ETracking::ETrackNone );
       setTracking( i_Tracking );
     }
     return i_bCondition;

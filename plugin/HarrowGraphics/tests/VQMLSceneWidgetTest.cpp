@@ -124,6 +124,16 @@ TEST_F( SceneWindow, CommandsAnswerForTheirConditions )
   EXPECT_TRUE( pContent->ExecuteCommand( "Workspace3d:TrackSelection" ) );
   EXPECT_EQ( rWidget.tracking(), MoxelGraphics::ETrackSelection );
   EXPECT_EQ( rWidget.SceneItem()->Tracking(), MoxelGraphics::ETrackSelection );
+  int Taken = 0;
+  QObject::connect( rWidget.SceneItem(), &MoxelGraphics::VSceneFramebufferObject::TrackSelectionChanged,
+                    [&]
+                    {
+                      ++Taken;
+                    } );
+  rWidget.setTracking( MoxelGraphics::ETrackCurrent );
+  EXPECT_EQ( Taken, 1 );
+  EXPECT_TRUE( pContent->ExecuteCommand( "Workspace3d:NoTracking" ) );
+  EXPECT_EQ( rWidget.SceneItem()->Tracking(), MoxelGraphics::ETrackNone );
   for ( int Index = 0; Index < 20; ++Index )
   {
     EXPECT_TRUE( pContent->ExecuteCommand( "Workspace3d:ScaleUpManipulator" ) );

@@ -110,9 +110,11 @@ void VSceneFramebufferObject::itemChange( ItemChange i_Change, const ItemChangeD
 
 bool VSceneFramebufferObject::event( QEvent* i_pEvent )
 {
-  TakeOver( m_pSynced.get() );
+  // An event may end the item; the place is then no more than a number.
+  const void* const pPlace = m_pSynced.get();
+  TakeOver( pPlace );
   const bool bTaken = QQuickFramebufferObject::event( i_pEvent );
-  HandOver( m_pSynced.get() );
+  HandOver( pPlace );
   return bTaken;
 }
 
