@@ -72,7 +72,7 @@ ZEK::IResult VFeatureFlags::SetFromText( const QString& i_rText )
   }
   bool bWord = false;
   const bool bHex = Text.startsWith( QLatin1String( "0x" ), Qt::CaseInsensitive );
-  const std::uint32_t Flags = ( bHex ? Text.mid( 2 ) : Text ).toUInt( &bWord, bHex ? 16 : 10 );
+  const std::uint32_t Flags = Text.toUInt( &bWord, bHex ? 16 : 10 );
   if ( !bWord )
   {
     return ZEK::IResult::InvalidValue;

@@ -19,7 +19,7 @@ ZEK::VLogCategory& Category()
   return rCategory;
 }
 
-/// Replaces the entry of the same name, or appends.
+/// Replaces the entry of the same name, or appends. The old one goes last: what its callback holds may come back here.
 template < typename T >
 void Put( std::vector< T >& io_rEntries, T i_Entry )
 {
@@ -34,7 +34,7 @@ void Put( std::vector< T >& io_rEntries, T i_Entry )
   }
   else
   {
-    *Known = std::move( i_Entry );
+    std::swap( *Known, i_Entry );
   }
 }
 
@@ -196,7 +196,7 @@ void VContentFactories::AddFactory( const std::string& i_rName, std::shared_ptr<
   }
   else
   {
-    Known->second = std::move( i_pFactory );
+    Known->second.swap( i_pFactory );
   }
   m_Changed.Fire();
 }

@@ -82,7 +82,7 @@ TEST_F( Host, FeatureFlagsTakeProfilesAndWords )
   EXPECT_TRUE( Each.Features()->SetFromText( QStringLiteral( "Objects" ) ).IsOk() );
   EXPECT_TRUE( Each.Features()->SetFromText( QStringLiteral( "objects" ) ).IsOk() );
   EXPECT_EQ( Each.Features()->Flags(), ( 1u << 0 ) | ( 1u << 1 ) | ( 1u << 4 ) | ( 1u << 12 ) );
-  for ( const char* pBad : { "", "0x", "0x1ffffffff", "-1", "1.5", "subject" } )
+  for ( const char* pBad : { "", "0x", "0x0x10", "0x1ffffffff", "-1", "1.5", "subject" } )
   {
     EXPECT_EQ( Each.Features()->SetFromText( QString::fromLatin1( pBad ) ), ZEK::IResult::InvalidValue ) << pBad;
   }

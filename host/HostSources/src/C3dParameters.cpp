@@ -1,6 +1,6 @@
 #include "C3dParameters.h"
 
-#include "Units.h"
+#include "ReaderSupport.h"
 
 #include <algorithm>
 #include <cmath>

@@ -3,7 +3,7 @@
 #include <HostSources/VC3dReader.h>
 #include <HostSources/VTrcReader.h>
 
-#include "Units.h"
+#include "ReaderSupport.h"
 
 #include <algorithm>
 #include <cctype>

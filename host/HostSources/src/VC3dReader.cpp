@@ -3,7 +3,7 @@
 #include "C3dLayout.h"
 #include "ForcePlates.h"
 #include "Labels.h"
-#include "Units.h"
+#include "ReaderSupport.h"
 #include "UpAxis.h"
 
 #include <algorithm>

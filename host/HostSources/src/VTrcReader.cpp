@@ -1,8 +1,8 @@
 #include <HostSources/VTrcReader.h>
 
 #include "Labels.h"
+#include "ReaderSupport.h"
 #include "TrcText.h"
-#include "Units.h"
 #include "UpAxis.h"
 
 #include <algorithm>

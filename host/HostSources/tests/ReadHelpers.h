@@ -33,6 +33,12 @@ inline VRecording MustRead( const std::filesystem::path& i_rPath, ZEK::IResult i
   return Recording;
 }
 
+/// One of the recordings beside the checkout.
+inline VRecording Real( const char* i_pFile )
+{
+  return MustRead( TestSupport::RecordingsDir() / i_pFile );
+}
+
 inline VRecording MustReadC3d( const C3dWriter::VFile& i_rFile )
 {
   VRecording Recording;

@@ -50,16 +50,22 @@ protected:
 
 TEST_F( ReadFile, WhatCannotBeReadIsNamed )
 {
-  ExpectFailure( m_Folder.Path() / "none.c3d", ZEK::IResult::FileNotFound, "found no such file" );
-  ExpectFailure( m_Folder.Path(), ZEK::IResult::FileIOFailure, "found a folder" );
-  ExpectFailure( Save( "empty.trc", {} ), ZEK::IResult::EndOfData, "byte offset 0: expected" );
-  ExpectFailure( Save( "other.txt", Bytes( "hello, world" ) ), ZEK::IResult::InvalidFormat, "found neither" );
-  ExpectFailure( Save( "other.trc", Bytes( "hello, world" ) ), ZEK::IResult::InvalidFormat, "line 1: expected" );
-  ExpectFailure( Save( "other.C3D", Bytes( "hello, world" ) ), ZEK::IResult::InvalidFormat, "byte offset 0: expected" );
   const auto Pipe = m_Folder.Path() / "pipe.c3d";
   ASSERT_EQ( mkfifo( Pipe.c_str(), 0600 ), 0 );
-  ExpectFailure( Pipe, ZEK::IResult::FileIOFailure, "no plain file" );
-  const auto Locked = Save( "locked.c3d", Bytes( "x" ) );
+  const auto Other = Bytes( "hello, world" );
+  const std::tuple< std::filesystem::path, ZEK::IResult, const char* > Cases[] = {
+      { m_Folder.Path() / "none.c3d", ZEK::IResult::FileNotFound, "found no such file" },
+      { m_Folder.Path(), ZEK::IResult::FileIOFailure, "found a folder" },
+      { Pipe, ZEK::IResult::FileIOFailure, "no plain file" },
+      { Save( "empty.trc", {} ), ZEK::IResult::EndOfData, "byte offset 0: expected" },
+      { Save( "other.txt", Other ), ZEK::IResult::InvalidFormat, "found neither" },
+      { Save( "other.trc", Other ), ZEK::IResult::InvalidFormat, "line 1: expected" },
+      { Save( "other.C3D", Other ), ZEK::IResult::InvalidFormat, "byte offset 0: expected" } };
+  for ( const auto& [rPath, Result, pText] : Cases )
+  {
+    ExpectFailure( rPath, Result, pText );
+  }
+  const auto Locked = Save( "locked.c3d", Other );
   std::filesystem::permissions( Locked, std::filesystem::perms::none );
   if ( access( Locked.c_str(), R_OK ) != 0 )
   {
@@ -79,36 +85,34 @@ TEST_F( ReadFile, ContentCountsNotTheSuffix )
 TEST_F( ReadFile, ProgressRunsToTheEndOrStops )
 {
   const auto Path = Save( "long.c3d", C3dWriter::Write( LongFile() ) );
-  VRecording Recording;
-  std::string Message;
-  std::vector< double > Steps;
-  EXPECT_TRUE( ReadRecording( Path, Recording, Message,
-                              [&]( double i_Fraction )
-                              {
-                                Steps.push_back( i_Fraction );
-                                return true;
-                              } )
-                   .IsOk() );
-  EXPECT_GT( Steps.size(), 3u );
-  EXPECT_TRUE( std::is_sorted( Steps.begin(), Steps.end() ) );
-  EXPECT_GE( Steps.front(), 0 );
-  EXPECT_LE( Steps.back(), 1 );
-  int Calls = 0;
-  EXPECT_EQ( ReadRecording( Path, Recording, Message,
-                            [&]( double )
-                            {
-                              return ++Calls < 2;
-                            } ),
-             ZEK::IResult( ZEK::IResult::Canceled ) );
-  EXPECT_EQ( Calls, 2 );
-  EXPECT_EQ( Recording.FrameCount, 0 );
   const auto Text = Save( "some.trc", Bytes( "PathFileType\nDataRate\n5\nFrame#\tTime\tA\nX1\n1\t0\t1\t2\t3\n" ) );
-  EXPECT_EQ( ReadRecording( Text, Recording, Message,
-                            []( double i_Fraction )
-                            {
-                              return i_Fraction < 0.5;
-                            } ),
-             ZEK::IResult( ZEK::IResult::Canceled ) );
+  for ( const auto& rFile : { Path, Text } )
+  {
+    std::vector< double > Steps;
+    std::size_t Limit = 1000;
+    const auto Read = [&]
+    {
+      VOutcome Outcome;
+      Steps.clear();
+      Outcome.Result = ReadRecording( rFile, Outcome.Recording, Outcome.Message,
+                                      [&]( double i_Fraction )
+                                      {
+                                        Steps.push_back( i_Fraction );
+                                        return Steps.size() < Limit;
+                                      } );
+      return Outcome;
+    };
+    EXPECT_TRUE( Read().Result.IsOk() );
+    EXPECT_GT( Steps.size(), rFile == Path ? 3u : 1u );
+    EXPECT_TRUE( std::is_sorted( Steps.begin(), Steps.end() ) );
+    EXPECT_GE( Steps.front(), 0 );
+    EXPECT_LE( Steps.back(), 1 );
+    Limit = 2;
+    const VOutcome Stopped = Read();
+    EXPECT_EQ( Stopped.Result, ZEK::IResult( ZEK::IResult::Canceled ) );
+    EXPECT_EQ( Steps.size(), 2u );
+    EXPECT_EQ( Stopped.Recording.FrameCount, 0 );
+  }
 }
 
 TEST_F( ReadFile, AMillionFrames )

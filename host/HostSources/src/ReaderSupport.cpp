@@ -1,4 +1,4 @@
-#include "Units.h"
+#include "ReaderSupport.h"
 
 #include "C3dParameters.h"
 
