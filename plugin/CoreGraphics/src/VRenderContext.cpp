@@ -10,6 +10,7 @@
 #include <array>
 #include <atomic>
 #include <cstdlib>
+#include <mutex>
 #include <set>
 #include <string_view>
 #include <tuple>
@@ -147,7 +148,7 @@ void VRenderContext::StartDebugLogger()
   m_pFunctions->glEnable( DebugOutput );
 }
 
-void VRenderContext::CheckErrors( const std::source_location& i_rWhere )
+void VRenderContext::CheckErrors( const char* i_pFile, int i_Line )
 {
   if ( m_pLogger )
   {
@@ -155,7 +156,7 @@ void VRenderContext::CheckErrors( const std::source_location& i_rWhere )
   }
   if ( m_bReadErrors && m_pFunctions )
   {
-    WriteErrors( i_rWhere );
+    WriteErrors( i_pFile, i_Line );
   }
 }
 
@@ -171,10 +172,13 @@ void VRenderContext::WriteDebugMessages()
   }
 }
 
-void VRenderContext::WriteErrors( const std::source_location& i_rWhere )
+void VRenderContext::WriteErrors( const char* i_pFile, int i_Line )
 {
   constexpr int MostErrors = 16; // a lost context reports errors for ever
-  static std::set< std::tuple< std::string_view, unsigned, GLenum > > Written;
+  static std::mutex Guard;       // views may be drawn by threads of their own
+  static std::set< std::tuple< std::string_view, int, GLenum > > Written;
+  const std::string_view Path = i_pFile;
+  const std::string_view File = Path.substr( Path.find_last_of( '/' ) + 1 );
   for ( int Count = 0; Count < MostErrors; ++Count )
   {
     const GLenum Code = m_pFunctions->glGetError();
@@ -182,11 +186,10 @@ void VRenderContext::WriteErrors( const std::source_location& i_rWhere )
     {
       return;
     }
-    const std::string_view Path = i_rWhere.file_name();
-    const std::string_view File = Path.substr( Path.find_last_of( '/' ) + 1 );
-    if ( Written.emplace( File, i_rWhere.line(), Code ).second )
+    const std::lock_guard Lock( Guard );
+    if ( Written.emplace( File, i_Line, Code ).second )
     {
-      ZEK::Log( GraphicsLog(), ZEK::ELogFailure, "OpenGL error 0x%1$04x at %2%:%3%", Code, File, i_rWhere.line() );
+      ZEK::Log( GraphicsLog(), ZEK::ELogFailure, "OpenGL error 0x%1$04x at %2%:%3%", Code, File, i_Line );
     }
   }
 }

@@ -143,9 +143,10 @@ public:
   }
   std::int32_t UseCount() const { return m_Count.load( std::memory_order_acquire ); }
 
+  virtual ~IFlowItem() = default;
+
 protected:
   IFlowItem() = default;
-  virtual ~IFlowItem() = default;
   IFlowItem( const IFlowItem& ) = delete;
   IFlowItem& operator=( const IFlowItem& ) = delete;
 

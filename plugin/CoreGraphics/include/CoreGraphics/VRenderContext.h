@@ -15,7 +15,6 @@
 #include <array>
 #include <cstdint>
 #include <memory>
-#include <source_location>
 #include <span>
 
 class QOpenGLDebugLogger;
@@ -46,7 +45,7 @@ public:
   void ReleaseVertexArray();
   /// Writes the messages of the debug logger to the log; in debug builds, or with HARROW_GL_ERRORS set to 1, also
   /// the pending OpenGL errors, once for each place and code.
-  void CheckErrors( const std::source_location& i_rWhere = std::source_location::current() );
+  void CheckErrors( const char* i_pFile = __builtin_FILE(), int i_Line = __builtin_LINE() );
 
   /// The functions of the context; null before `Initialise`.
   QOpenGLExtraFunctions* Functions() const { return m_pFunctions; }
@@ -189,7 +188,7 @@ private:
   void ReadLimits();
   void StartDebugLogger();
   void WriteDebugMessages();
-  void WriteErrors( const std::source_location& i_rWhere );
+  void WriteErrors( const char* i_pFile, int i_Line );
   void BindVertexArray();
   void ResetFixedFunction();
   void Toggle( GLenum i_Capability, bool i_bOn, bool& io_rbState );
