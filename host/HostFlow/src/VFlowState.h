@@ -17,6 +17,7 @@ namespace HostFlow
 class VFlowState final : public ZEK::IFlowState
 {
 public:
+  virtual ~VFlowState() = default; // only the pool ends one
   static ZEK::VFlowStateRef Make( const ZEK::VFlowTimeKey& i_rKey, const ZEK::VFlowInfoA& i_rInfoA,
                                   const ZEK::VFlowInfoB& i_rInfoB );
   static void TrimPool();
@@ -54,7 +55,6 @@ private:
     const ZEK::VFlowEntry* pLast;
   };
 
-  ~VFlowState() = default; // only the pool ends one
   bool Open();
   void Put( const ZEK::VFlowTimeKey& i_rKey, ZEK::IFlowItem& i_rItem );
   void Settle() const;
