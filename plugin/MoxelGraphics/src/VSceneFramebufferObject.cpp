@@ -278,18 +278,20 @@ QVariantMap VSceneFramebufferObject::frameReport() const
 {
   TakeOver( m_pSynced.get() );
   const VFrameFigures& rFigures = m_pSynced->Figures;
-  return { { "camera", CameraReport( m_pSynced->Camera ) },
-           { "timings", QVariantMap{ { "update_ms", rFigures.UpdateMs },
-                                     { "select_ms", rFigures.SelectMs },
-                                     { "highlight_ms", rFigures.HighlightMs },
-                                     { "draw_ms", rFigures.DrawMs } } },
-           { "draw_calls", QVariant::fromValue( rFigures.DrawCalls ) },
-           { "bytes_uploaded", QVariant::fromValue( rFigures.BytesUploaded ) },
-           { "gl", m_pSynced->Gl },
-           { "frames", QVariant::fromValue( rFigures.Frames ) },
-           { "labels", Texts( m_PreselectionLabels ) },
-           { "picked_labels", Texts( m_PickedLabels ) },
-           { "notice", m_Notice } };
+  QVariantMap Report{ { "camera", CameraReport( m_pSynced->Camera ) },
+                      { "timings", QVariantMap{ { "update_ms", rFigures.UpdateMs },
+                                                { "select_ms", rFigures.SelectMs },
+                                                { "highlight_ms", rFigures.HighlightMs },
+                                                { "draw_ms", rFigures.DrawMs } } },
+                      { "draw_calls", QVariant::fromValue( rFigures.DrawCalls ) },
+                      { "bytes_uploaded", QVariant::fromValue( rFigures.BytesUploaded ) },
+                      { "gl", m_pSynced->Gl },
+                      { "frames", QVariant::fromValue( rFigures.Frames ) },
+                      { "labels", Texts( m_PreselectionLabels ) },
+                      { "picked_labels", Texts( m_PickedLabels ) },
+                      { "notice", m_Notice } };
+  HandOver( m_pSynced.get() );
+  return Report;
 }
 
 } // namespace MoxelGraphics
