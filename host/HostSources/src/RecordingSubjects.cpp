@@ -9,8 +9,6 @@ namespace HostSources
 {
 namespace
 {
-constexpr float MarkerRadius = 7; // mm
-
 /// Colours far apart on the wheel for neighbouring indices, none of them dark.
 std::uint32_t MarkerColour( std::size_t i_Index )
 {

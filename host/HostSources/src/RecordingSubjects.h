@@ -9,6 +9,9 @@
 namespace HostSources
 {
 
+/// Passive markers of the usual size, mm.
+constexpr float MarkerRadius = 7;
+
 /// The subjects that the names of a recording's points speak of.
 struct VRecordingSubjects
 {

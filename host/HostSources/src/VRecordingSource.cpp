@@ -17,9 +17,6 @@ namespace
 {
 using namespace CoreMoxelTypes;
 
-/// Passive markers of the usual size.
-constexpr float MarkerRadius = 7;
-
 template < typename T >
 bool SameBits( std::span< const T > i_A, std::span< const T > i_B )
 {
@@ -141,7 +138,15 @@ ZEK::IResult VRecordingSource::VState::MakeAxisItems( const VStateMaker& i_rMake
       *pFloor = FloorOf( m_rRecording.Bounds, i_Up );
     }
   }
-  m_Up = i_Up;
+  if ( Result.IsOk() )
+  {
+    m_Up = i_Up;
+  }
+  else
+  {
+    // Half of them must not be taken for all: the next frame makes everything anew.
+    m_Store = {};
+  }
   return Result;
 }
 

@@ -24,12 +24,13 @@ void main()
 {
   vec3 normal = normalize( v_normal );
   gl_FragColor = vec4( v_colour.rgb * SimpleLighting( normal, 0.2, 0.2, 0.8, 0.5 ), v_colour.a );
-  if ( dot( normal, u_Up ) > 0.1 && dot( u_Force, u_Force ) > SmallestForce * SmallestForce )
+  vec2 place = vec2( v_position.x, u_Up.y > 0.0 ? v_position.z : v_position.y );
+  vec2 centre = vec2( u_CentreOfPressure.x, u_Up.y > 0.0 ? u_CentreOfPressure.z : u_CentreOfPressure.y );
+  // From far away a line keeps the width of a pixel, so that it does not fall into dots.
+  vec2 half_width = max( vec2( 0.5 * Thickness ), 0.5 * fwidth( place ) );
+  bool on_line = any( lessThan( abs( place - centre ), half_width ) );
+  if ( on_line && dot( normal, u_Up ) > 0.1 && dot( u_Force, u_Force ) > SmallestForce * SmallestForce )
   {
-    vec3 offset = abs( v_position - u_CentreOfPressure );
-    if ( min( offset.x, u_Up.y > 0.0 ? offset.z : offset.y ) < 0.5 * Thickness )
-    {
-      gl_FragColor.rgb = vec3( 1.0, 0.5, 0.5 );
-    }
+    gl_FragColor.rgb = vec3( 1.0, 0.5, 0.5 );
   }
 }
