@@ -1,0 +1,140 @@
+#pragma once
+
+#include "PendingChildren.h"
+
+#include <ZEK/EntryPath.h>
+#include <ZEK/StoreReader.h>
+#include <ZEK/TypedValue.h>
+
+#include <atomic>
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace Store
+{
+
+class VHandlerCallback;
+using VHandlerList = std::vector< VHandlerCallback* >;
+
+struct VEntryValues
+{
+  std::uint32_t m_Flags = 0;
+  ZEK::VTypedValue m_Verified;
+  ZEK::VTypedValue m_Proposed;
+  ZEK::VTypedValue m_Default;
+};
+
+struct VEntryPresentation
+{
+  ZEK::VTypedValue m_Minimum;
+  ZEK::VTypedValue m_Maximum;
+  std::vector< ZEK::VTypedValue > m_Choices;
+  std::vector< std::string > m_ChoiceTexts;
+  std::vector< std::string > m_ChoiceToolTips;
+  std::string m_Text;
+};
+
+struct VEntryExtras
+{
+  std::optional< std::string > m_OptionalText;
+  std::string m_Text1;
+  std::string m_Text2;
+  std::string m_Text3;
+  std::uint32_t m_Number1 = 0;
+  std::uint32_t m_Number2 = 0;
+  std::string m_Attributes;
+};
+
+/// What is committed of an entry. Readers look at it without a lock: it changes only while no reader of its generation
+/// is left. The handler list alone is guarded by the store mutex.
+struct VEntryState
+{
+  std::vector< VStoreEntry* > m_Children; ///< in child order
+  ZEK::VChangeIds m_Changes;
+  std::unique_ptr< VEntryValues > m_pValues;
+  std::unique_ptr< VEntryPresentation > m_pPresentation;
+  std::unique_ptr< VEntryExtras > m_pExtras;
+  const ZEK::IO::ISchema* m_pSchema = nullptr;
+  VHandlerList m_Handlers; ///< those whose patterns match; found again when a state is made
+};
+
+/// What the open write scope has written of an entry. Records are pooled and keep old contents: a field counts only
+/// when the mask has its bit.
+struct VEntryChange
+{
+  std::uint64_t m_Mask = 0;
+  const ZEK::IO::ISchema* m_pSchema = nullptr;
+  std::size_t m_Place = 0; ///< in the pending children of the parent
+  VPendingChildren m_Children;
+  VEntryValues m_Values;
+  VEntryPresentation m_Presentation;
+  VEntryExtras m_Extras;
+};
+
+/// A node of the tree. Made on first use of a path and kept as long as the store; it is there, for clients, when it
+/// has a state.
+class VStoreEntry
+{
+public:
+  VStoreEntry( ZEK::VEntryPath i_Path, VStoreEntry* i_pParent )
+    : m_Path( std::move( i_Path ) )
+    , m_pParent( i_pParent )
+  {
+  }
+
+  std::atomic< VStoreEntry* > m_pBucketLink{ nullptr };
+  const ZEK::VEntryPath m_Path;
+  VStoreEntry* const m_pParent;            ///< null for the root only
+  VHandlerList m_Handlers;                 ///< those registered by handle; store mutex
+  std::unique_ptr< VEntryState > m_pState; ///< null while the entry is not there
+  VEntryChange* m_pChange = nullptr;       ///< the thread of the write scope, or the store mutex
+};
+
+/// The groups of fields by type, so that one routine serves them all.
+template < typename TGroup >
+const TGroup& EmptyGroup()
+{
+  static const TGroup Empty{};
+  return Empty;
+}
+inline const VEntryValues* CommittedGroup( const VEntryState& i_rState, const VEntryValues* )
+{
+  return i_rState.m_pValues.get();
+}
+inline const VEntryPresentation* CommittedGroup( const VEntryState& i_rState, const VEntryPresentation* )
+{
+  return i_rState.m_pPresentation.get();
+}
+inline const VEntryExtras* CommittedGroup( const VEntryState& i_rState, const VEntryExtras* )
+{
+  return i_rState.m_pExtras.get();
+}
+inline const VEntryValues& PendingGroup( const VEntryChange& i_rChange, const VEntryValues* )
+{
+  return i_rChange.m_Values;
+}
+inline const VEntryPresentation& PendingGroup( const VEntryChange& i_rChange, const VEntryPresentation* )
+{
+  return i_rChange.m_Presentation;
+}
+inline const VEntryExtras& PendingGroup( const VEntryChange& i_rChange, const VEntryExtras* )
+{
+  return i_rChange.m_Extras;
+}
+
+/// The committed fields of an entry, empty ones when it has none.
+template < typename TGroup >
+const TGroup& Committed( const VStoreEntry* i_pEntry )
+{
+  if ( i_pEntry != nullptr && i_pEntry->m_pState )
+  {
+    const TGroup* const pGroup = CommittedGroup( *i_pEntry->m_pState, static_cast< const TGroup* >( nullptr ) );
+    return pGroup != nullptr ? *pGroup : EmptyGroup< TGroup >();
+  }
+  return EmptyGroup< TGroup >();
+}
+
+} // namespace Store

@@ -1,0 +1,298 @@
+#include "Merge.h"
+
+#include "HandlerCallback.h"
+#include "Resolve.h"
+
+#include <ZEK/DebugServices.h>
+#include <ZEK/StoreFlags.h>
+
+#include <algorithm>
+#include <utility>
+
+namespace Store
+{
+
+using namespace ZEK;
+
+namespace
+{
+/// Any bit that comes with a field, or stands for entries that come and go.
+constexpr std::uint64_t TakesSchema = 0x12000007070000;
+constexpr std::uint64_t MakesVerification = EChangeVerified | EChangeProposed | EVerifyRequired;
+
+std::uint64_t Promote( std::uint64_t i_Flags )
+{
+  return ( ( i_Flags & ChangeMask::Promotion ) * 2 ) | ( i_Flags & ~ChangeMask::Promotion );
+}
+
+bool IsVerificationPending( const VEntryValues& i_rValues )
+{
+  return ( i_rValues.m_Flags & EVerifyRequired ) != 0 && i_rValues.m_Verified != i_rValues.m_Proposed;
+}
+
+/// One field: told when it differs, or when the scope wants everything told.
+template < typename T >
+void ApplyField( std::uint64_t i_Bit, std::uint64_t i_Mask, T& io_rOld, T& io_rNew, std::uint64_t& io_rFlags )
+{
+  if ( ( i_Mask & i_Bit ) == 0 )
+  {
+    return;
+  }
+  if ( io_rOld != io_rNew )
+  {
+    io_rOld = std::move( io_rNew );
+    io_rFlags |= i_Bit;
+  }
+  else if ( ( i_Mask & EForce ) != 0 )
+  {
+    io_rFlags |= i_Bit;
+  }
+}
+
+template < typename TGroup >
+TGroup& Ensure( std::unique_ptr< TGroup >& io_rpGroup )
+{
+  if ( !io_rpGroup )
+  {
+    io_rpGroup = std::make_unique< TGroup >();
+  }
+  return *io_rpGroup;
+}
+
+void ApplyValues( VEntryValues& io_rOld, VEntryValues& io_rNew, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
+{
+  ApplyField( EChangeVerified, i_Mask, io_rOld.m_Verified, io_rNew.m_Verified, io_rFlags );
+  ApplyField( EChangeProposed, i_Mask, io_rOld.m_Proposed, io_rNew.m_Proposed, io_rFlags );
+  ApplyField( EChangeDefault, i_Mask, io_rOld.m_Default, io_rNew.m_Default, io_rFlags );
+  const auto Mask = static_cast< std::uint32_t >( i_Mask & EAllStoreFlags );
+  io_rFlags |= ( i_Mask & EForce ) != 0 ? i_Mask & ChangeMask::Values : ( io_rOld.m_Flags ^ io_rNew.m_Flags ) & Mask;
+  io_rOld.m_Flags = ( io_rOld.m_Flags & ~Mask ) | ( io_rNew.m_Flags & Mask );
+  // The flags may come from below: then an entry that waits is told of again.
+  if ( ( io_rFlags & MakesVerification ) != 0 && IsVerificationPending( io_rOld ) )
+  {
+    io_rFlags |= EVerificationNeeded;
+  }
+}
+
+void ApplyPresentation( VEntryPresentation& io_rOld, VEntryPresentation& io_rNew, std::uint64_t i_Mask,
+                        std::uint64_t& io_rFlags )
+{
+  if ( ( i_Mask & EChangeChoices ) != 0 && io_rOld.m_Choices.empty() != io_rNew.m_Choices.empty() )
+  {
+    io_rFlags |= EChangeHasChoices;
+  }
+  ApplyField( EChangeMinimum, i_Mask, io_rOld.m_Minimum, io_rNew.m_Minimum, io_rFlags );
+  ApplyField( EChangeMaximum, i_Mask, io_rOld.m_Maximum, io_rNew.m_Maximum, io_rFlags );
+  ApplyField( EChangeChoices, i_Mask, io_rOld.m_Choices, io_rNew.m_Choices, io_rFlags );
+  ApplyField( EChangeChoiceTexts, i_Mask, io_rOld.m_ChoiceTexts, io_rNew.m_ChoiceTexts, io_rFlags );
+  ApplyField( EChangeChoiceToolTips, i_Mask, io_rOld.m_ChoiceToolTips, io_rNew.m_ChoiceToolTips, io_rFlags );
+  ApplyField( EChangePresentationText, i_Mask, io_rOld.m_Text, io_rNew.m_Text, io_rFlags );
+}
+
+void ApplyExtras( VEntryExtras& io_rOld, VEntryExtras& io_rNew, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
+{
+  ApplyField( EChangeOptionalText, i_Mask, io_rOld.m_OptionalText, io_rNew.m_OptionalText, io_rFlags );
+  ApplyField( EChangeExtraText1, i_Mask, io_rOld.m_Text1, io_rNew.m_Text1, io_rFlags );
+  ApplyField( EChangeExtraText2, i_Mask, io_rOld.m_Text2, io_rNew.m_Text2, io_rFlags );
+  ApplyField( EChangeExtraText3, i_Mask, io_rOld.m_Text3, io_rNew.m_Text3, io_rFlags );
+  ApplyField( EChangeExtraNumber1, i_Mask, io_rOld.m_Number1, io_rNew.m_Number1, io_rFlags );
+  ApplyField( EChangeExtraNumber2, i_Mask, io_rOld.m_Number2, io_rNew.m_Number2, io_rFlags );
+  ApplyField( EChangeAttributes, i_Mask, io_rOld.m_Attributes, io_rNew.m_Attributes, io_rFlags );
+}
+
+/// Brings children that came or went into a list in child order. Few of them are moved in one by one, many by one
+/// pass over the whole list.
+void UpdateChildren( std::vector< VStoreEntry* >& io_rChildren, const std::vector< VStoreEntry* >& i_rAdded,
+                     const std::vector< VStoreEntry* >& i_rGone )
+{
+  constexpr std::size_t Few = 8;
+  if ( i_rGone.size() > Few )
+  {
+    std::erase_if( io_rChildren,
+                   []( const VStoreEntry* i_pChild )
+                   {
+                     return !i_pChild->m_pState;
+                   } );
+  }
+  else
+  {
+    for ( VStoreEntry* const pChild : i_rGone )
+    {
+      io_rChildren.erase( std::lower_bound( io_rChildren.begin(), io_rChildren.end(), pChild, ChildLess ) );
+    }
+  }
+  if ( i_rAdded.size() > Few )
+  {
+    const auto Old = static_cast< std::ptrdiff_t >( io_rChildren.size() );
+    io_rChildren.insert( io_rChildren.end(), i_rAdded.begin(), i_rAdded.end() );
+    std::inplace_merge( io_rChildren.begin(), io_rChildren.begin() + Old, io_rChildren.end(), ChildLess );
+    return;
+  }
+  for ( VStoreEntry* const pChild : i_rAdded )
+  {
+    io_rChildren.insert( std::lower_bound( io_rChildren.begin(), io_rChildren.end(), pChild, ChildLess ), pChild );
+  }
+}
+} // namespace
+
+std::uint64_t VMerge::MergeEntry( VStoreEntry& io_rEntry )
+{
+  VEntryChange& rChange = *io_rEntry.m_pChange;
+  DebugServices::Check( ( rChange.m_Mask & ChangeMask::Replaced ) != ChangeMask::Replaced, "Added or Removed", __FILE__,
+                        __LINE__ );
+  std::uint64_t Flags = 0;
+  if ( ( rChange.m_Mask & EAdded ) != 0 )
+  {
+    MakeState( io_rEntry, Flags );
+  }
+  if ( !rChange.m_Children.IsEmpty() )
+  {
+    Flags |= MergeChildren( io_rEntry );
+  }
+  Apply( *io_rEntry.m_pState, rChange, rChange.m_Mask, Flags );
+  Touch( io_rEntry.m_Handlers, Flags );
+  if ( ( rChange.m_Mask & ERemoved ) != 0 )
+  {
+    io_rEntry.m_pState.reset();
+  }
+  m_rPending.Release( io_rEntry );
+  return Flags;
+}
+
+void VMerge::MakeState( VStoreEntry& io_rEntry, std::uint64_t& io_rFlags )
+{
+  const VEntryChange& rChange = *io_rEntry.m_pChange;
+  if ( !io_rEntry.m_pState )
+  {
+    io_rEntry.m_pState = std::make_unique< VEntryState >();
+    m_rRegistry.Match( io_rEntry );
+    io_rFlags |= EAdded;
+    return;
+  }
+  // Removed and added again: what the scope did not set is gone.
+  VEntryState& rState = *io_rEntry.m_pState;
+  rState.m_pSchema = rChange.m_pSchema;
+  std::uint64_t Cleared = ~rChange.m_Mask & ChangeMask::Fields;
+  Cleared &= rState.m_pValues ? ~std::uint64_t( 0 ) : ~ChangeMask::Values;
+  Cleared &= rState.m_pPresentation ? ~std::uint64_t( 0 ) : ~ChangeMask::Presentation;
+  Cleared &= rState.m_pExtras ? ~std::uint64_t( 0 ) : ~ChangeMask::Extras;
+  VEntryChange Empty;
+  Apply( rState, Empty, Cleared, io_rFlags );
+  io_rFlags |= ( rChange.m_Mask & EReAdd ) != 0 ? std::uint64_t( EAdded ) : 0;
+}
+
+std::uint64_t VMerge::MergeChildren( VStoreEntry& io_rEntry )
+{
+  VEntryChange& rChange = *io_rEntry.m_pChange;
+  std::uint64_t Flags = 0;
+  std::vector< VStoreEntry* > Added;
+  std::vector< VStoreEntry* > Gone;
+  for ( VStoreEntry* const pChild : rChange.m_Children.Sorted() )
+  {
+    const bool bWasThere = pChild->m_pState != nullptr;
+    Flags |= Promote( MergeEntry( *pChild ) );
+    if ( bWasThere != ( pChild->m_pState != nullptr ) )
+    {
+      ( bWasThere ? Gone : Added ).push_back( pChild );
+    }
+  }
+  if ( !Added.empty() || !Gone.empty() )
+  {
+    UpdateChildren( io_rEntry.m_pState->m_Children, Added, Gone );
+  }
+  return Flags;
+}
+
+void VMerge::Apply( VEntryState& io_rState, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
+{
+  if ( ( i_Mask & ERemoved ) != 0 )
+  {
+    io_rFlags |= ERemoved;
+    Touch( io_rState.m_Handlers, io_rFlags );
+    return;
+  }
+  // Before the fields are looked at: a new entry may have a schema and nothing else.
+  if ( ( i_Mask & TakesSchema ) != 0 && io_rChange.m_pSchema != nullptr )
+  {
+    io_rState.m_pSchema = io_rChange.m_pSchema;
+  }
+  if ( ( i_Mask & ChangeMask::Values ) != 0 )
+  {
+    ApplyValues( Ensure( io_rState.m_pValues ), io_rChange.m_Values, i_Mask, io_rFlags );
+  }
+  if ( ( i_Mask & ChangeMask::Presentation ) != 0 )
+  {
+    ApplyPresentation( Ensure( io_rState.m_pPresentation ), io_rChange.m_Presentation, i_Mask, io_rFlags );
+  }
+  if ( ( i_Mask & ChangeMask::Extras ) != 0 )
+  {
+    ApplyExtras( Ensure( io_rState.m_pExtras ), io_rChange.m_Extras, i_Mask, io_rFlags );
+  }
+  io_rFlags |= i_Mask & ChangeMask::Kept;
+  Stamp( io_rState, io_rFlags );
+  Touch( io_rState.m_Handlers, io_rFlags );
+}
+
+void VMerge::Stamp( VEntryState& io_rState, std::uint64_t i_Flags ) const
+{
+  const auto StampIf = [this, i_Flags]( ChangeId& io_rStamp, std::uint64_t i_Mask )
+  {
+    if ( ( i_Flags & i_Mask ) != 0 )
+    {
+      io_rStamp = m_Id;
+    }
+  };
+  constexpr std::uint64_t Values = EChangeVerified | EChangeProposed;
+  StampIf( io_rState.m_Changes.m_Verified, EChangeVerified );
+  StampIf( io_rState.m_Changes.m_Proposed, EChangeProposed );
+  StampIf( io_rState.m_Changes.m_Other, ~Values );
+  StampIf( io_rState.m_Changes.m_Child, ChangeMask::ChildStamp );
+  StampIf( io_rState.m_Changes.m_Descendant, ChangeMask::DescendantStamp );
+}
+
+void VMerge::Touch( const VHandlerList& i_rHandlers, std::uint64_t i_Flags )
+{
+  for ( VHandlerCallback* const pHandler : i_rHandlers )
+  {
+    pHandler->Touch( i_Flags, m_rDelivery );
+  }
+}
+
+void VMerge::Expand( const VEntryTable& i_rTable, const VQueuedRequest& i_rRequest )
+{
+  std::vector< VStoreEntry* > Entries = i_rRequest.m_Set.m_Handles;
+  for ( const VEntryPath& rPath : i_rRequest.m_Set.m_Paths )
+  {
+    const std::vector< VStoreEntry* > Found = FindCommitted( i_rTable, rPath );
+    Entries.insert( Entries.end(), Found.begin(), Found.end() );
+  }
+  for ( const VStoreEntry* const pEntry : Entries )
+  {
+    if ( pEntry != nullptr )
+    {
+      TouchSubtree( *pEntry, i_rRequest.m_Flags );
+    }
+  }
+}
+
+void VMerge::TouchSubtree( const VStoreEntry& i_rEntry, std::uint64_t i_Flags )
+{
+  const std::uint64_t Flags = i_Flags != 0 ? i_Flags
+                              : IsVerificationPending( Committed< VEntryValues >( &i_rEntry ) )
+                                  ? std::uint64_t( EVerificationNeeded )
+                                  : 0;
+  if ( i_rEntry.m_pState )
+  {
+    Touch( i_rEntry.m_pState->m_Handlers, Flags );
+  }
+  Touch( i_rEntry.m_Handlers, Flags );
+  if ( i_rEntry.m_pState )
+  {
+    for ( const VStoreEntry* const pChild : i_rEntry.m_pState->m_Children )
+    {
+      TouchSubtree( *pChild, i_Flags );
+    }
+  }
+}
+
+} // namespace Store

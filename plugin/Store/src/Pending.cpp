@@ -1,0 +1,180 @@
+#include "Pending.h"
+
+namespace Store
+{
+
+using namespace ZEK;
+
+std::uint32_t OverlaidFlags( const VStoreEntry* i_pEntry )
+{
+  if ( i_pEntry == nullptr || i_pEntry->m_pChange == nullptr )
+  {
+    return Committed< VEntryValues >( i_pEntry ).m_Flags;
+  }
+  const VEntryChange& rChange = *i_pEntry->m_pChange;
+  const auto Mask = static_cast< std::uint32_t >( rChange.m_Mask & EAllStoreFlags );
+  const std::uint32_t Old = IsReplaced( *i_pEntry ) ? 0 : Committed< VEntryValues >( i_pEntry ).m_Flags;
+  return ( Old & ~Mask ) | ( rChange.m_Values.m_Flags & Mask );
+}
+
+const IO::ISchema* OverlaidSchema( const VStoreEntry* i_pEntry )
+{
+  const IO::ISchema* pSchema = nullptr;
+  if ( i_pEntry != nullptr )
+  {
+    if ( i_pEntry->m_pChange != nullptr )
+    {
+      pSchema = i_pEntry->m_pChange->m_pSchema;
+    }
+    if ( pSchema == nullptr && !IsReplaced( *i_pEntry ) && i_pEntry->m_pState )
+    {
+      pSchema = i_pEntry->m_pState->m_pSchema;
+    }
+  }
+  return pSchema != nullptr ? pSchema : IO::GetUniquePodSchema( IO::EType::Void );
+}
+
+VEntryChange& VPending::Take()
+{
+  if ( m_Free.empty() )
+  {
+    m_Free.push_back( &m_Records.emplace_back() );
+  }
+  VEntryChange& rChange = *m_Free.back();
+  m_Free.pop_back();
+  rChange.m_Mask = 0;
+  rChange.m_pSchema = nullptr;
+  rChange.m_Children.Clear();
+  rChange.m_Presentation.m_Choices.clear();
+  rChange.m_Presentation.m_ChoiceTexts.clear();
+  rChange.m_Presentation.m_ChoiceToolTips.clear();
+  return rChange;
+}
+
+void VPending::Release( VStoreEntry& io_rEntry )
+{
+#ifndef NDEBUG
+  // A field that is read past its mask shows at once.
+  io_rEntry.m_pChange->m_Values.m_Flags = ~std::uint32_t( 0 );
+  io_rEntry.m_pChange->m_Values.m_Verified = IO::VTypedValue( nullptr, IO::VValueBytes( "stale", 5 ) );
+  io_rEntry.m_pChange->m_Values.m_Proposed = io_rEntry.m_pChange->m_Values.m_Verified;
+  io_rEntry.m_pChange->m_Values.m_Default = io_rEntry.m_pChange->m_Values.m_Verified;
+  io_rEntry.m_pChange->m_Presentation.m_Text = "stale";
+  io_rEntry.m_pChange->m_Extras.m_OptionalText = "stale";
+  io_rEntry.m_pChange->m_Extras.m_Number1 = ~std::uint32_t( 0 );
+#endif
+  m_Free.push_back( io_rEntry.m_pChange );
+  io_rEntry.m_pChange = nullptr;
+}
+
+VEntryChange& VPending::Acquire( VStoreEntry& io_rEntry )
+{
+  VStoreEntry* pEntry = &io_rEntry;
+  // Up to the first entry that has a record, each new one then stands in the list of its parent.
+  for ( VStoreEntry* pBelow = nullptr; pEntry != nullptr; pBelow = pEntry, pEntry = pEntry->m_pParent )
+  {
+    const bool bHad = pEntry->m_pChange != nullptr;
+    if ( !bHad )
+    {
+      pEntry->m_pChange = &Take();
+      pEntry->m_pChange->m_Mask = pEntry->m_pState ? 0 : std::uint64_t( EAdded );
+    }
+    if ( pBelow != nullptr )
+    {
+      pEntry->m_pChange->m_Children.Add( *pBelow );
+    }
+    if ( bHad )
+    {
+      break;
+    }
+  }
+  return *io_rEntry.m_pChange;
+}
+
+VEntryChange& VPending::ObtainForWrite( VStoreEntry& io_rEntry )
+{
+  VEntryChange& rChange = Acquire( io_rEntry );
+  if ( ( rChange.m_Mask & ERemoved ) != 0 || !io_rEntry.m_pState )
+  {
+    rChange.m_Mask = ( rChange.m_Mask & ~ERemoved ) | EAdded;
+    for ( VStoreEntry* pParent = io_rEntry.m_pParent; pParent != nullptr && IsReplaced( *pParent );
+          pParent = pParent->m_pParent )
+    {
+      pParent->m_pChange->m_Mask = ( pParent->m_pChange->m_Mask & ~ERemoved ) | EAdded;
+    }
+  }
+  return rChange;
+}
+
+IResult VPending::Remove( VStoreEntry& io_rEntry, bool i_bForce )
+{
+  if ( !IsThere( io_rEntry ) )
+  {
+    return IResult::NotFound;
+  }
+  // What was made in this scope goes without a trace, as nobody else has seen it.
+  if ( io_rEntry.m_pChange != nullptr )
+  {
+    for ( VStoreEntry* const pChild : io_rEntry.m_pChange->m_Children.Sorted() )
+    {
+      ReleaseUnlessMarked( *pChild );
+    }
+    io_rEntry.m_pChange->m_Children.Clear();
+  }
+  if ( io_rEntry.m_pState )
+  {
+    MarkRemoved( io_rEntry, i_bForce );
+    return IResult::Ok;
+  }
+  // Without a state; parents that hold nothing else were only there for it.
+  for ( VStoreEntry* pEntry = &io_rEntry; pEntry != nullptr; pEntry = pEntry->m_pParent )
+  {
+    Unlink( *pEntry );
+    const VEntryChange* const pParent = pEntry->m_pParent != nullptr ? pEntry->m_pParent->m_pChange : nullptr;
+    if ( pParent == nullptr || !pParent->m_Children.IsEmpty() || pParent->m_Mask != 0 )
+    {
+      break;
+    }
+  }
+  return IResult::Ok;
+}
+
+void VPending::ReleaseUnlessMarked( VStoreEntry& io_rEntry )
+{
+  for ( VStoreEntry* const pChild : io_rEntry.m_pChange->m_Children.Sorted() )
+  {
+    ReleaseUnlessMarked( *pChild );
+  }
+  io_rEntry.m_pChange->m_Children.Clear();
+  if ( !io_rEntry.m_pState )
+  {
+    Release( io_rEntry );
+  }
+}
+
+void VPending::MarkRemoved( VStoreEntry& io_rEntry, bool i_bForce )
+{
+  VEntryChange& rChange = Acquire( io_rEntry );
+  rChange.m_Mask = ( rChange.m_Mask & ChangeMask::Kept ) | ERemoved | ( i_bForce ? std::uint64_t( EForce ) : 0 );
+  rChange.m_pSchema = nullptr;
+  // Should the entry be written again, its lists are not filled from here or from the state.
+  rChange.m_Presentation.m_Choices.clear();
+  rChange.m_Presentation.m_ChoiceTexts.clear();
+  rChange.m_Presentation.m_ChoiceToolTips.clear();
+  for ( VStoreEntry* const pChild : io_rEntry.m_pState->m_Children )
+  {
+    MarkRemoved( *pChild, i_bForce );
+  }
+  rChange.m_Children.Assign( io_rEntry.m_pState->m_Children );
+}
+
+void VPending::Unlink( VStoreEntry& io_rEntry )
+{
+  if ( io_rEntry.m_pParent != nullptr && io_rEntry.m_pParent->m_pChange != nullptr )
+  {
+    io_rEntry.m_pParent->m_pChange->m_Children.Remove( io_rEntry );
+  }
+  Release( io_rEntry );
+}
+
+} // namespace Store
