@@ -44,6 +44,9 @@ struct VView
     Frame.Controller().SetSize( { Width, Height } );
     Frame.Resize( { Width, Height } );
     Frame.Input().Options.ReconstructedRadius = true;
+    // The floor's picture has neither.
+    Frame.Input().Options.FloorGrid = false;
+    Frame.Input().Options.GlobalAxis = false;
     Frame.Input().bReporting = true;
     Moved( 0 );
   }

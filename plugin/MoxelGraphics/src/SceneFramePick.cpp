@@ -175,39 +175,37 @@ int VSceneFrame::PickLayers( const QRect& i_rBand )
     ++Layers;
     Draw( i_rBand );
     m_pContext->ReadPixels( i_rBand, m_Pixels.data(), GL_RGBA );
-    m_Layer.clear();
+    bNew = false;
     std::uint32_t Last = 0;
     for ( const std::uint32_t Pixel : m_Pixels )
     {
       const std::uint32_t Id = Pixel & EIdMask;
-      if ( Id != Last && Id != 0 )
+      // What was found no longer draws, so that the next layer shows what it hid.
+      if ( Id != Last && Id != 0 && Take( Id ) )
       {
-        m_Layer.push_back( Id );
+        bNew = true;
       }
       Last = Id;
     }
-    // What was found no longer draws, so that the next layer shows what it hid.
-    bNew = TakeNew();
   }
-  m_Layer.clear();
-  m_pScene->PickInRect( *m_pContext, m_Input.Options, i_rBand, m_Layer );
-  TakeNew();
+  m_Analytic.clear();
+  m_pScene->PickInRect( *m_pContext, m_Input.Options, i_rBand, m_Analytic );
+  for ( const std::uint32_t Id : m_Analytic )
+  {
+    Take( Id & EIdMask );
+  }
   m_pScene->SetIgnoredIds( {} );
   return Layers;
 }
 
-bool VSceneFrame::TakeNew()
+bool VSceneFrame::Take( std::uint32_t i_Id )
 {
-  std::sort( m_Layer.begin(), m_Layer.end() );
-  m_Layer.erase( std::unique( m_Layer.begin(), m_Layer.end() ), m_Layer.end() );
-  std::erase_if( m_Layer,
-                 [&]( std::uint32_t i_Id )
-                 {
-                   return i_Id == 0 || m_pScene->IgnoredIds().contains( i_Id );
-                 } );
-  m_Found.insert( m_Found.end(), m_Layer.begin(), m_Layer.end() );
-  m_pScene->IgnoreIds( m_Layer );
-  return !m_Layer.empty();
+  if ( i_Id == 0 || !m_pScene->AddIgnoredId( i_Id ) )
+  {
+    return false;
+  }
+  m_Found.push_back( i_Id );
+  return true;
 }
 
 } // namespace MoxelGraphics

@@ -29,10 +29,8 @@ VMoxelScene::VMoxelScene( std::shared_ptr< HarrowPluginInterface::IRenderResourc
   , m_pMeshCache( std::move( i_pMeshCache ) )
   , m_pPostalService( std::move( i_pPostalService ) )
   , m_bDeveloperMode( i_bDeveloperMode )
-  , m_IgnoredIds( 8 )
   , m_pFlags( std::make_shared< VFlags >() )
 {
-  m_IgnoredIds.max_load_factor( 1.0f );
   // Both fire on threads of their own; the flags outlive the scene, so a late call does no harm.
   const auto Mark = [pFlags = m_pFlags]
   {
@@ -116,16 +114,31 @@ void VMoxelScene::SelectDevice( const QString&, bool ) {}
 
 void VMoxelScene::SetIgnoredIds( std::span< const std::uint32_t > i_Ids )
 {
+  for ( const std::uint32_t Id : m_IgnoredIds )
+  {
+    m_IgnoredBits[Id / IdsPerWord] = 0;
+  }
   m_IgnoredIds.clear();
-  IgnoreIds( i_Ids );
-}
-
-void VMoxelScene::IgnoreIds( std::span< const std::uint32_t > i_Ids )
-{
   for ( const std::uint32_t Id : i_Ids )
   {
-    m_IgnoredIds.insert( Id & EIdMask );
+    AddIgnoredId( Id );
   }
+}
+
+bool VMoxelScene::AddIgnoredId( std::uint32_t i_Id )
+{
+  const std::uint32_t Id = i_Id & EIdMask;
+  if ( IsIgnored( Id ) )
+  {
+    return false;
+  }
+  if ( Id / IdsPerWord >= m_IgnoredBits.size() )
+  {
+    m_IgnoredBits.resize( Id / IdsPerWord + 1, 0 );
+  }
+  m_IgnoredBits[Id / IdsPerWord] |= std::uint64_t( 1 ) << Id % IdsPerWord;
+  m_IgnoredIds.push_back( Id );
+  return true;
 }
 
 bool VMoxelScene::IgnoreId( std::uint32_t i_Word, int i_RenderMode ) const
@@ -133,7 +146,7 @@ bool VMoxelScene::IgnoreId( std::uint32_t i_Word, int i_RenderMode ) const
   switch ( i_RenderMode )
   {
   case ERenderModeSelection:
-    return m_IgnoredIds.contains( i_Word & EIdMask );
+    return IsIgnored( i_Word );
   case ERenderModeHighlight:
     return ( i_Word & ( EIdSelected | EIdPreselected ) ) == 0;
   default:

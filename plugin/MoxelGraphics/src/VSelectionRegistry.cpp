@@ -3,7 +3,7 @@
 #include "Log.h"
 
 #include <algorithm>
-#include <set>
+#include <bit>
 
 namespace MoxelGraphics
 {
@@ -12,6 +12,15 @@ namespace
 constexpr std::uint32_t BothMarks = EIdSelected | EIdPreselected;
 /// The first id whose upper bits, with both marks, reach what the outline takes for the current item.
 constexpr std::uint32_t FirstLookalike = 0x40000;
+
+std::size_t HashOf( const ZEK::VSelectionItem& i_rItem )
+{
+  constexpr std::size_t Spread = 0x9E3779B97F4A7C15;
+  const std::size_t Number =
+      ( std::size_t( i_rItem.Kind ) << 56 ) ^ ( std::size_t( i_rItem.Object ) << 32 ) ^ i_rItem.Sub;
+  const std::size_t Mixed = ( Number ^ std::hash< std::string >()( i_rItem.Device ) ) * Spread;
+  return Mixed ^ Mixed >> 32;
+}
 
 bool IsOfGreatNumbers( std::uint32_t i_Kind )
 {
@@ -385,11 +394,30 @@ ZEK::VSelection VSelectionRegistry::ResolveAll( std::span< const std::uint32_t >
                                                 std::vector< std::string >& io_rLabels ) const
 {
   ZEK::VSelection Selection;
-  std::set< ZEK::VSelectionItem > Seen;
+  Selection.reserve( i_Ids.size() );
+  // Open addressing over the items that were taken: a band may hold thousands.
+  std::vector< std::uint32_t > Slots( std::bit_ceil( i_Ids.size() * 2 + 1 ), 0 );
+  const auto IsNew = [&]( const ZEK::VSelectionItem& i_rItem )
+  {
+    std::size_t Slot = HashOf( i_rItem );
+    for ( ;; ++Slot )
+    {
+      std::uint32_t& rTaken = Slots[Slot & ( Slots.size() - 1 )];
+      if ( rTaken == 0 )
+      {
+        rTaken = static_cast< std::uint32_t >( Selection.size() + 1 );
+        return true;
+      }
+      if ( Selection[rTaken - 1] == i_rItem )
+      {
+        return false;
+      }
+    }
+  };
+  ZEK::VSelectionItem Item;
+  std::string Label;
   for ( const std::uint32_t Id : i_Ids )
   {
-    ZEK::VSelectionItem Item;
-    std::string Label;
     if ( !Resolve( Id, Item, Label ) )
     {
       continue;
@@ -398,9 +426,9 @@ ZEK::VSelection VSelectionRegistry::ResolveAll( std::span< const std::uint32_t >
     {
       io_rLabels.push_back( std::move( Label ) );
     }
-    if ( Seen.insert( Item ).second )
+    if ( IsNew( Item ) )
     {
-      Selection.push_back( std::move( Item ) );
+      Selection.push_back( Item );
     }
   }
   return Selection;

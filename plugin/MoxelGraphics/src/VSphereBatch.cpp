@@ -192,14 +192,13 @@ VSphereExtent VSphereBatch::Gather( const VPickWindow& i_rWindow, const VSphereS
                                     std::vector< VPickedSphere >& io_rPicked ) const
 {
   VSphereExtent Extent;
-  const bool bIgnoring = !i_rScene.IgnoredIds().empty();
   for ( std::uint32_t Index = i_First; Index < i_End; ++Index )
   {
     const VScenePoint& rSphere = m_Spheres[Index];
     const float Size = SizeOf( rSphere, i_rSizing );
     const float Depth = i_rWindow.Depth( rSphere.X, rSphere.Y, rSphere.Z );
     if ( !( Size > 0 ) || !i_rWindow.Meets( rSphere.X, rSphere.Y, rSphere.Z, i_rWindow.Drawn( Size, Depth ) ) ||
-         ( bIgnoring && i_rScene.IgnoredIds().contains( m_FirstId + Index ) ) )
+         i_rScene.IsIgnored( m_FirstId + Index ) )
     {
       continue;
     }

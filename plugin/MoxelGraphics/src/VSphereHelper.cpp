@@ -40,6 +40,9 @@ constexpr std::uint32_t GatherBlock = 0x4000;
 /// A batch of up to so many spheres gets the fine mesh when one sphere deserves it, a larger one when an eighth does:
 /// all spheres of a batch share one mesh, so that they stay one draw.
 constexpr std::size_t SmallBatch = 2000;
+/// From so many spheres on, points take the place of meshes as soon as they cover the same pixels; fewer are drawn
+/// round until they are smaller still.
+constexpr std::size_t ManySpheres = 500;
 
 VRenderState SphereState()
 {
@@ -110,7 +113,8 @@ void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxe
   // In the highlight mask only the stretch that holds all marked spheres is drawn.
   const std::uint32_t First = bVisible ? 0 : io_rBatch.m_MarkedBegin;
   const std::uint32_t End = bVisible ? static_cast< std::uint32_t >( io_rBatch.Count() ) : io_rBatch.m_MarkedEnd;
-  VMesh* pMesh = m_pGl->MeshFor( io_rBatch.Extent( io_rContext, i_rSizing ), io_rBatch.Count(), CoarsePixels );
+  VMesh* pMesh = m_pGl->MeshFor( io_rBatch.Extent( io_rContext, i_rSizing ), io_rBatch.Count(),
+                                 io_rBatch.Count() < ManySpheres ? CoarsePixels : SmallestPixels );
   VInstancedProgramPair& rPrograms = pMesh ? m_pGl->Programs : m_pGl->Points;
   if ( !rPrograms.Use( io_rContext, io_rBatch.FirstId() == 0 ? 0 : io_rBatch.FirstId() + First ) )
   {

@@ -20,7 +20,6 @@
 #include <span>
 #include <string>
 #include <unordered_map>
-#include <unordered_set>
 #include <vector>
 
 class QPainter;
@@ -98,12 +97,17 @@ public:
   // What a frame does, in the order of a frame.
   bool IsPending() const { return m_pFlags->bPending.load( std::memory_order_acquire ); }
   void SetIgnoredIds( std::span< const std::uint32_t > i_Ids );
-  /// Adds to them.
-  void IgnoreIds( std::span< const std::uint32_t > i_Ids );
+  /// Adds to them; false when the id was among them.
+  bool AddIgnoredId( std::uint32_t i_Id );
   /// What a render type asks before it draws an object: `i_Word` is the object's selection word.
   bool IgnoreId( std::uint32_t i_Word, int i_RenderMode ) const;
-  /// Ids that the running band pick has found already, in no order.
-  const std::unordered_set< std::uint32_t >& IgnoredIds() const { return m_IgnoredIds; }
+  /// What the running band pick has found already, in the order of finding.
+  std::span< const std::uint32_t > IgnoredIds() const { return m_IgnoredIds; }
+  bool IsIgnored( std::uint32_t i_Id ) const
+  {
+    const std::uint32_t Id = i_Id & EIdMask;
+    return Id / IdsPerWord < m_IgnoredBits.size() && ( m_IgnoredBits[Id / IdsPerWord] >> Id % IdsPerWord & 1u ) != 0;
+  }
   /// The start of a view; `i_rScissor` is all that it will touch, in pixels, y up.
   void Clear( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, const QRect& i_rScissor );
   void Clear( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
@@ -189,8 +193,10 @@ private:
   bool m_bCanDraw = false;
   bool m_bHighlighted = false;
   std::atomic< bool > m_bYUp{ false };
-  std::unordered_set< std::uint32_t > m_IgnoredIds;
-  std::uint64_t m_DrawsAtClear = 0; ///< the context's draw calls when the depth was last cleared
+  static constexpr std::uint32_t IdsPerWord = 64;
+  std::vector< std::uint32_t > m_IgnoredIds;
+  std::vector< std::uint64_t > m_IgnoredBits; ///< a bit an id: every object asks for its own while a band draws
+  std::uint64_t m_DrawsAtClear = 0;           ///< the context's draw calls when the depth was last cleared
   std::shared_ptr< VFlags > m_pFlags;
   std::mutex m_CallbackGuard;
   std::vector< std::shared_ptr< VRenderCallback > > m_Callbacks;

@@ -118,7 +118,7 @@ private:
   void PickPoint();
   int PickBand();
   int PickLayers( const QRect& i_rBand );
-  bool TakeNew();
+  bool Take( std::uint32_t i_Id );
   void Draw( const QRect& i_rScissor );
   void Highlight();
   void DrawView();
@@ -140,7 +140,7 @@ private:
   QElapsedTimer m_Clock;
   std::vector< std::uint32_t > m_Pixels;
   std::vector< std::uint32_t > m_Found; ///< in the order in which they were found
-  std::vector< std::uint32_t > m_Layer;
+  std::vector< std::uint32_t > m_Analytic;
   std::vector< QVector4D > m_Points;
 };
 
