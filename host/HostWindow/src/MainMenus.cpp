@@ -196,6 +196,9 @@ void VMainWindow::FillWindowMenu()
                               [this, rKind]
                               {
                                 AddWindow( rKind );
+                                // A new view would get what is left over beside the others.
+                                const QList< QDockWidget* > Docks( m_Docks.begin(), m_Docks.end() );
+                                resizeDocks( Docks, QList< int >( Docks.size(), width() ), Qt::Horizontal );
                               } );
   }
   m_pWindowMenu->addSeparator();
