@@ -54,6 +54,30 @@ TEST_F( VFrameTest, EveryDetailOfASphereIsFoundAtItsPlace )
   EXPECT_EQ( Pick( { 320 + 20, 180 } ).size(), 1u );
 }
 
+TEST_F( VFrameTest, AmongFortyThousandSpheresEachKeepsItsId )
+{
+  // All lie in one corner but a few, which sit at both ends of the stretches that a pick gathers.
+  std::vector< VScenePoint > Points( 40000, { -2500, 2500, 0, 0 } );
+  const std::uint32_t Few[] = { 0, 1, 0x3FFF, 0x4000, 0x7FFF, 0x8000, 39999 };
+  float Along = -900;
+  for ( const std::uint32_t Index : Few )
+  {
+    Points[Index] = { Along, Along, 800, 0 };
+    Along += 300;
+  }
+  pScene->Change( Points );
+  // The flags of a marked one share their number with what was left out before it.
+  pScene->pSelection->Set( ZEK::ISelectionService::EPrimary, { Recon( 0x3FFF ), Recon( 39999 ) } );
+  pFrame->Input().Options.ReconstructionScale = 3.0f;
+  for ( const std::uint32_t Index : Few )
+  {
+    SCOPED_TRACE( Index );
+    EXPECT_EQ( Pick( ScreenPoint( Points[Index], Size ).toPoint() ), std::vector< std::uint32_t >{ Index + 1 } );
+  }
+  EXPECT_EQ( Band( { 300, 20 }, { 340, 340 } ).size(), std::size( Few ) );
+  EXPECT_EQ( Band( { 0, 0 }, { 640, 360 } ).size(), Points.size() );
+}
+
 TEST_F( VFrameTest, TheNearestPixelToTheMiddleOfTheWindowWins )
 {
   Draw();
