@@ -93,7 +93,7 @@ TEST_F( QmlModules, SelectionCountsKindsAndSignals )
   ASSERT_TRUE( pObject );
   EXPECT_EQ( pObject->property( "lock" ).toInt(), 34 );
   rHost.Selection()->Set( ZEK::ISelectionService::EPrimary,
-                          { { .Kind = ZEK::ESelectCamera, .Device = "A" },
+                          { { .Kind = ZEK::ESelectDevice, .Device = "A" },
                             { .Kind = ZEK::ESelectMarker, .Device = "S:M" },
                             { .Kind = ZEK::ESelectReconstruction, .Device = "", .Sub = 3 } } );
   EXPECT_TRUE( rHost.Postal()->DrainForTest() );

@@ -20,13 +20,19 @@ struct VKindWord
 };
 
 constexpr VKindWord KindWords[] = {
-    { ZEK::ESelectCamera, "camera" },      { ZEK::ESelectCentroid, "centroid" },
-    { ZEK::ESelectMaskCell, "maskcell" },  { ZEK::ESelectReconstruction, "reconstruction" },
-    { ZEK::ESelectMarker, "marker" },      { ZEK::ESelectSegment, "segment" },
-    { ZEK::ESelectSubject, "subject" },    { ZEK::ESelectStick, "stick" },
-    { ZEK::ESelectRigidObject, "object" }, { ZEK::ESelectDevice, "device" },
-    { ZEK::ESelectSceneMesh, "mesh" },     { ZEK::ESelectObjectManipulator, "objectmanipulator" },
-    { ZEK::ESelectGreyscaleBlob, "blob" }, { ZEK::ESelectVolumeManipulator, "volumemanipulator" },
+    { ZEK::ESelectDevice, "device" },
+    { ZEK::ESelectGreyscaleBlob, "blob" },
+    { ZEK::ESelectCentroid, "centroid" },
+    { ZEK::ESelectReconstruction, "reconstruction" },
+    { ZEK::ESelectMarker, "marker" },
+    { ZEK::ESelectSubject, "subject" },
+    { ZEK::ESelectSegment, "segment" },
+    { ZEK::ESelectStick, "stick" },
+    { ZEK::ESelectRigidObject, "object" },
+    { ZEK::ESelectSceneMesh, "mesh" },
+    { ZEK::ESelectObjectManipulator, "objectmanipulator" },
+    { ZEK::ESelectMaskCell, "maskcell" },
+    { ZEK::ESelectVolumeManipulator, "volumemanipulator" },
 };
 constexpr char Mark = '@';
 
@@ -202,7 +208,7 @@ VSelectionItem VSelectionService::FromName( const std::string& i_rText ) const
   }
   if ( i_rText.front() != Mark )
   {
-    return { .Kind = ZEK::ESelectCamera, .Device = i_rText };
+    return { .Kind = ZEK::ESelectDevice, .Device = i_rText };
   }
   VSelectionItem Item;
   std::string_view Rest = std::string_view( i_rText ).substr( 1 );
@@ -226,7 +232,7 @@ std::string VSelectionService::Text( const VSelectionItem& i_rItem ) const
   {
     return {};
   }
-  const bool bPlain = i_rItem.Kind == ZEK::ESelectCamera && i_rItem.Object == 0 && i_rItem.Sub == 0 &&
+  const bool bPlain = i_rItem.Kind == ZEK::ESelectDevice && i_rItem.Object == 0 && i_rItem.Sub == 0 &&
                       !i_rItem.Device.empty() && i_rItem.Device.front() != Mark;
   if ( bPlain )
   {

@@ -24,12 +24,12 @@ VSelectionItem Item( std::uint32_t i_Kind, const std::string& i_rDevice, std::ui
 TEST( SelectionService, SignalsOnceADistinctChangeOfItsKinds )
 {
   VSelectionService Service;
-  TestSupport::VCalls Cameras( *Service.ForKinds( { ZEK::ESelectCamera } ) );
-  TestSupport::VCalls Both( *Service.ForKinds( { ZEK::ESelectMarker, ZEK::ESelectCamera, ZEK::ESelectMarker } ) );
+  TestSupport::VCalls Cameras( *Service.ForKinds( { ZEK::ESelectDevice } ) );
+  TestSupport::VCalls Both( *Service.ForKinds( { ZEK::ESelectMarker, ZEK::ESelectDevice, ZEK::ESelectMarker } ) );
   TestSupport::VCalls Points( *Service.ForKinds( { ZEK::ESelectReconstruction } ) );
   TestSupport::VCalls All( *Service.ForKinds( {} ) );
-  const VSelectionItem A = Item( ZEK::ESelectCamera, "A" );
-  const VSelectionItem B = Item( ZEK::ESelectCamera, "B" );
+  const VSelectionItem A = Item( ZEK::ESelectDevice, "A" );
+  const VSelectionItem B = Item( ZEK::ESelectDevice, "B" );
   const VSelectionItem M = Item( ZEK::ESelectMarker, "S:M" );
 
   const VSelectionItem P = Item( ZEK::ESelectReconstruction, "", 4 );
@@ -59,7 +59,7 @@ TEST( SelectionService, SignalsOnceADistinctChangeOfItsKinds )
 TEST( SelectionService, KeepsWhatIsSelectedWithoutDoublesAndTheLastAddedCurrent )
 {
   VSelectionService Service;
-  const VSelectionItem A = Item( ZEK::ESelectCamera, "A" );
+  const VSelectionItem A = Item( ZEK::ESelectDevice, "A" );
   const VSelectionItem B = Item( ZEK::ESelectCentroid, "A", 7 );
   const auto Before = Service.Generation();
   Service.Set( Primary, { A, B, VSelectionItem{}, A } );
@@ -67,7 +67,7 @@ TEST( SelectionService, KeepsWhatIsSelectedWithoutDoublesAndTheLastAddedCurrent 
   EXPECT_EQ( Service.CurrentItem(), A );
   EXPECT_GT( Service.Generation(), Before );
   VSelection Found{ B };
-  EXPECT_TRUE( Service.Get( Primary, { ZEK::ESelectSubject, ZEK::ESelectCamera }, Found ) );
+  EXPECT_TRUE( Service.Get( Primary, { ZEK::ESelectSubject, ZEK::ESelectDevice }, Found ) );
   EXPECT_EQ( Found, ( VSelection{ A } ) );
   EXPECT_FALSE( Service.Get( Primary, { ZEK::ESelectSubject }, Found ) );
   EXPECT_TRUE( Found.empty() );
@@ -80,7 +80,7 @@ TEST( SelectionService, AHandlerMayChangeTheSelectionItself )
 {
   VSelectionService Service;
   int Count = 0;
-  const auto Connection = Service.ForKinds( { ZEK::ESelectCamera } )
+  const auto Connection = Service.ForKinds( { ZEK::ESelectDevice } )
                               ->Connect(
                                   [&]
                                   {
@@ -88,7 +88,7 @@ TEST( SelectionService, AHandlerMayChangeTheSelectionItself )
                                     Service.Set( Secondary, Service.Get( Primary ) );
                                   },
                                   nullptr );
-  Service.SetOnly( Primary, Item( ZEK::ESelectCamera, "A" ) );
+  Service.SetOnly( Primary, Item( ZEK::ESelectDevice, "A" ) );
   EXPECT_EQ( Count, 2 );
   EXPECT_EQ( Service.Get( Secondary ), Service.Get( Primary ) );
 }
@@ -96,12 +96,12 @@ TEST( SelectionService, AHandlerMayChangeTheSelectionItself )
 TEST( SelectionService, TextsNameTheirItem )
 {
   const VSelectionService Service;
-  EXPECT_EQ( Service.Text( Item( ZEK::ESelectCamera, "cam 12/top" ) ), "cam 12/top" );
-  EXPECT_EQ( Service.FromName( "cam 12/top" ), Item( ZEK::ESelectCamera, "cam 12/top" ) );
+  EXPECT_EQ( Service.Text( Item( ZEK::ESelectDevice, "cam 12/top" ) ), "cam 12/top" );
+  EXPECT_EQ( Service.FromName( "cam 12/top" ), Item( ZEK::ESelectDevice, "cam 12/top" ) );
   EXPECT_EQ( Service.Text( { ZEK::ESelectMarker, "Walker:LFHD", 1, 4 } ), "@marker/1/4/Walker:LFHD" );
 
   using namespace std::string_literals;
-  const std::vector< std::string > Names{ "",        "plain",     "with space", "a/b/c", "@", "@camera/0/0/x", "50%",
+  const std::vector< std::string > Names{ "",        "plain",     "with space", "a/b/c", "@", "@device/0/0/x", "50%",
                                           "«ü»\n\t", "zero\0in"s, "/",          "#1",    ":", "@marker/1/2/y" };
   constexpr std::uint32_t Kinds[] = { 1, 2, 3, 5, 6, 7, 8, 9, 10, 11, 12, 27, 30, 33, 77, 0xffffffffu };
   for ( const std::uint32_t Kind : Kinds )
@@ -172,7 +172,7 @@ TEST( SelectionService, IsReadByOtherThreadsWhileItChanges )
   for ( int Round = 0; Round < 2000; ++Round )
   {
     const std::string Name = std::to_string( Round );
-    Service.Set( Primary, { Item( ZEK::ESelectCamera, Name ), Item( ZEK::ESelectCentroid, Name ) } );
+    Service.Set( Primary, { Item( ZEK::ESelectDevice, Name ), Item( ZEK::ESelectCentroid, Name ) } );
   }
   bStop = true;
   Reader.join();

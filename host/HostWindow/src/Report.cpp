@@ -12,8 +12,6 @@ const char* KindName( std::uint32_t i_Kind )
 {
   switch ( i_Kind )
   {
-  case ZEK::ESelectCamera:
-    return "camera";
   case ZEK::ESelectCentroid:
     return "centroid";
   case ZEK::ESelectMaskCell:

@@ -244,7 +244,7 @@ TEST_F( ViewMenu, AScriptSelectsAndRunsCommandsAsAPersonDoes )
   EXPECT_EQ( Do( "--select", "@marker/1/4/Ada:C7" ), "" );
   EXPECT_EQ( Do( "--select", "vi:2", Qt::ShiftModifier ), "" );
   EXPECT_EQ( pSelection->Get( ZEK::ISelectionService::EPrimary ),
-             ( ZEK::VSelection{ Marker, { ZEK::ESelectCamera, "vi:2", 0, 0 } } ) );
+             ( ZEK::VSelection{ Marker, { ZEK::ESelectDevice, "vi:2", 0, 0 } } ) );
   EXPECT_EQ( Do( "--select", "vi:2", Qt::ControlModifier ), "" );
   EXPECT_EQ( pSelection->Get( ZEK::ISelectionService::EPrimary ), ZEK::VSelection{ Marker } );
   EXPECT_NE( Do( "--select", "@robot/1" ), "" );

@@ -18,8 +18,6 @@ using MoxelGraphics::VPlateLoad;
 constexpr std::uint32_t PlateColour = 0xFF665F58;
 constexpr double UsualThickness = 50; // mm
 constexpr unsigned FlagShift = 21;
-/// Cameras and other devices share a kind: a device URN names either.
-constexpr std::uint32_t DeviceKind = ZEK::ESelectCamera;
 
 bool MakePlate( const VDevice& i_rDevice, bool i_bYUp, VForcePlate& o_rPlate )
 {
@@ -124,7 +122,7 @@ void VFlowRenderForcePlates::Rebuild( bool i_bYUp )
     m_Made.push_back( Plate );
     const std::string& rURN = m_Devices.Names()[Slot];
     VPlateMembers::VMember& rMember = m_Members.Members.emplace_back();
-    rMember.Item = { DeviceKind, rURN, 0, 0 };
+    rMember.Item = { ZEK::ESelectDevice, rURN, 0, 0 };
     rMember.Label = pDevice->Name.empty() ? rURN : pDevice->Name;
     rMember.Slot = Slot;
     Locate( Plate, rMember );

@@ -113,7 +113,7 @@ QString VFlowScene::GetSelectedCameraURN()
 {
   ZEK::VSelection Cameras;
   const auto& rpService = SelectionService();
-  if ( !rpService || !rpService->Get( ZEK::ISelectionService::EPrimary, { ZEK::ESelectCamera }, Cameras ) ||
+  if ( !rpService || !rpService->Get( ZEK::ISelectionService::EPrimary, { ZEK::ESelectDevice }, Cameras ) ||
        Cameras.size() != 1 )
   {
     return {};

@@ -43,7 +43,7 @@ public:
   }
   ZEK::VSelectionItem FromName( const std::string& i_rText ) const override
   {
-    return i_rText.empty() ? ZEK::VSelectionItem{} : ZEK::VSelectionItem{ ZEK::ESelectCamera, i_rText, 0, 0 };
+    return i_rText.empty() ? ZEK::VSelectionItem{} : ZEK::VSelectionItem{ ZEK::ESelectDevice, i_rText, 0, 0 };
   }
   std::string Text( const ZEK::VSelectionItem& i_rItem ) const override { return i_rItem.Device; }
 

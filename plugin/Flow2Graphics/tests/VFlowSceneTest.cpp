@@ -81,6 +81,6 @@ TEST( VFlowScene, TheCameraNameNeedsExactlyOneSelectedCamera )
   EXPECT_EQ( Scene.SelectedName(), "2107" );
   EXPECT_EQ( pSelection->Get( ZEK::ISelectionService::ESecondary ).at( 0 ).Device, "2108" );
   pSelection->Set( ZEK::ISelectionService::EPrimary,
-                   { { ZEK::ESelectCamera, "1", 0, 0 }, { ZEK::ESelectCamera, "2", 0, 0 } } );
+                   { { ZEK::ESelectDevice, "1", 0, 0 }, { ZEK::ESelectDevice, "2", 0, 0 } } );
   EXPECT_EQ( Scene.SelectedName(), "" );
 }

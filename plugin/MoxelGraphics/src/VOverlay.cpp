@@ -15,12 +15,12 @@ namespace
 const QColor PlainName( 0xF0, 0xF0, 0xF0 );
 const QColor CurrentName( 231, 101, 0 );
 
-bool Holds( const ZEK::VSelection& i_rSelection, std::uint32_t i_Kind, const std::string& i_rDevice )
+bool HoldsDevice( const ZEK::VSelection& i_rSelection, const std::string& i_rDevice )
 {
   return std::any_of( i_rSelection.begin(), i_rSelection.end(),
                       [&]( const ZEK::VSelectionItem& i_rItem )
                       {
-                        return i_rItem.Kind == i_Kind && ( i_rDevice.empty() || i_rItem.Device == i_rDevice );
+                        return i_rItem.Kind == ZEK::ESelectDevice && i_rItem.Device == i_rDevice;
                       } );
 }
 
@@ -62,25 +62,23 @@ bool VOverlay::Collect( VMoxelScene& io_rScene, const CoreGraphics::VCameraField
   m_View = i_rCamera.view;
   m_ToClip = i_rCamera.projection * i_rCamera.view;
   m_Size = i_ItemSize;
-  const bool bSelection = CollectSelection( io_rScene );
+  CollectSelection( io_rScene );
   const bool bCameras = CollectCameras( io_rScene );
   const bool bSubjects = CollectSubjects( io_rScene );
-  return bSelection || bCameras || bSubjects;
+  return bCameras || bSubjects;
 }
 
-bool VOverlay::CollectSelection( VMoxelScene& io_rScene )
+void VOverlay::CollectSelection( const VMoxelScene& i_rScene )
 {
-  const auto& rpService = io_rScene.SelectionService();
+  const auto& rpService = i_rScene.SelectionService();
   const std::uint64_t Generation = rpService ? rpService->Generation() : 0;
   if ( Generation == m_SelectionGeneration )
   {
-    return false;
+    return;
   }
   m_SelectionGeneration = Generation;
   m_Selected = rpService->Get( ZEK::ISelectionService::EPrimary );
   m_Preselected = rpService->Get( ZEK::ISelectionService::ESecondary );
-  return Write( m_bCameraHeld,
-                Holds( m_Selected, ZEK::ESelectCamera, {} ) || Holds( m_Preselected, ZEK::ESelectCamera, {} ) );
 }
 
 QVector4D VOverlay::ToClip( const QVector3D& i_rPoint ) const
@@ -97,8 +95,12 @@ QPointF VOverlay::ToItem( const QVector4D& i_rClip ) const
 bool VOverlay::CollectCameras( VMoxelScene& io_rScene )
 {
   m_NewCameras.clear();
+  bool bHeld = false;
   for ( const VCameraDefinition& rDefinition : io_rScene.CameraDefinitions() )
   {
+    const bool bSelected = HoldsDevice( m_Selected, rDefinition.DeviceURN );
+    const bool bPreselected = HoldsDevice( m_Preselected, rDefinition.DeviceURN );
+    bHeld = bHeld || bSelected || bPreselected;
     const QVector4D Clip = ToClip( { rDefinition.Position[0], rDefinition.Position[1], rDefinition.Position[2] } );
     const bool bTwice = !m_NewCameras.empty() && m_NewCameras.back().DeviceURN == rDefinition.DeviceURN;
     if ( rDefinition.bCalibrated && !bTwice && IsInFront( Clip ) )
@@ -107,14 +109,14 @@ bool VOverlay::CollectCameras( VMoxelScene& io_rScene )
       const auto Depth = static_cast< float >( ( Clip.z() / Clip.w() + 1 ) / 2 );
       m_NewCameras.push_back(
           { rDefinition.DeviceURN, rDefinition.UserId,
-            QVector3D( static_cast< float >( Place.x() ), static_cast< float >( Place.y() ), Depth ),
-            Holds( m_Selected, ZEK::ESelectCamera, rDefinition.DeviceURN ),
-            Holds( m_Preselected, ZEK::ESelectCamera, rDefinition.DeviceURN ) } );
+            QVector3D( static_cast< float >( Place.x() ), static_cast< float >( Place.y() ), Depth ), bSelected,
+            bPreselected } );
     }
   }
+  const bool bHeldChanged = Write( m_bCameraHeld, bHeld );
   const bool bChanged = m_NewCameras != m_Cameras;
   m_Cameras.swap( m_NewCameras );
-  return bChanged;
+  return bChanged || bHeldChanged;
 }
 
 bool VOverlay::CollectSubjects( VMoxelScene& io_rScene )

@@ -59,7 +59,7 @@ public:
   bool IsCameraHeld() const { return m_bCameraHeld; }
 
 private:
-  bool CollectSelection( VMoxelScene& io_rScene );
+  void CollectSelection( const VMoxelScene& i_rScene );
   bool CollectCameras( VMoxelScene& io_rScene );
   bool CollectSubjects( VMoxelScene& io_rScene );
   QVector4D ToClip( const QVector3D& i_rPoint ) const;

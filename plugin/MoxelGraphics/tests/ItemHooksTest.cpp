@@ -281,7 +281,7 @@ TEST_F( VItemHooks, CamerasAndNamesStandWhereTheFrameShowsThem )
   EXPECT_EQ( qobject_cast< VSubjectObject* >( pItem->SubjectObjects()[1] )->m_Position.z(), -1.0f );
 
   EXPECT_FALSE( pItem->ShowCameraNumbers() );
-  pScene->pSelection->Set( ZEK::ISelectionService::EPrimary, { { ZEK::ESelectCamera, "vi:2", 0, 0 } } );
+  pScene->pSelection->Set( ZEK::ISelectionService::EPrimary, { { ZEK::ESelectDevice, "vi:2", 0, 0 } } );
   Wheel( 120 );
   Wheel( 120 );
   Frames( 3 );

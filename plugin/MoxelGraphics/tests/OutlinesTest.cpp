@@ -244,7 +244,7 @@ TEST_F( VOutlinesTest, MoreObjectsThanIdsAreDrawnAndCannotBePicked )
   // All ids but one, before the points ask.
   pFull->BeforePoints = [&]
   {
-    pFull->Registry().Allocate( { ZEK::ESelectCamera, "many", 0, 0 }, EIdMask - 1 );
+    pFull->Registry().Allocate( { ZEK::ESelectDevice, "many", 0, 0 }, EIdMask - 1 );
   };
   pFull->Change( { { 0, 0, 0, 700 }, { 0, 0, 0, 1 } } );
   pFull->pSelection->Set( ZEK::ISelectionService::EPrimary, { Recon( 0 ) } );

@@ -8,7 +8,7 @@ namespace MoxelGraphics
 TEST( SelectionRegistry, RangesGiveTheirMembersBack )
 {
   VSelectionRegistry Registry( nullptr );
-  const ZEK::VSelectionItem Camera{ ZEK::ESelectCamera, "cam:7", 0, 0 };
+  const ZEK::VSelectionItem Camera{ ZEK::ESelectDevice, "cam:7", 0, 0 };
   EXPECT_EQ( Registry.Allocate( Camera ), 1u );
   EXPECT_EQ( Registry.Allocate( { ZEK::ESelectCentroid, "cam:7", 0, 0 }, 10 ), 2u );
   EXPECT_EQ( Registry.Allocate( { ZEK::ESelectSegment, "Anna", 4, 1 }, 3 ), 12u );
@@ -126,7 +126,7 @@ TEST( SelectionRegistry, AnIdThatLooksLikeTheCurrentItemIsToldOnce )
   const auto Frame = [&]( std::uint32_t i_Others )
   {
     Registry.Reset();
-    EXPECT_EQ( Registry.Allocate( { ZEK::ESelectCamera, "cam:1", 0, 0 }, i_Others ), 1u );
+    EXPECT_EQ( Registry.Allocate( { ZEK::ESelectDevice, "cam:1", 0, 0 }, i_Others ), 1u );
     return Registry.AllocateRange( 10, Points );
   };
   // The last of the ten stays below, and so does the one that bears both marks.

@@ -15,19 +15,18 @@ namespace ZEK
 enum ESelectionKind : std::uint32_t
 {
   ESelectNone = 0,
-  ESelectCamera = 1,
-  ESelectCentroid = 2,       ///< sub: index of the centroid in its camera
-  ESelectMaskCell = 3,       ///< sub: row-major index of the cell
+  ESelectDevice = 1,         ///< a camera, a force plate or another device
+  ESelectGreyscaleBlob = 2,  ///< sub: index of the blob in its camera
+  ESelectCentroid = 3,       ///< sub: index of the centroid in its camera
   ESelectReconstruction = 5, ///< sub: index in the set of the frame
   ESelectMarker = 6,         ///< device: text «subject:marker»; object: subject id; sub: marker number
-  ESelectSegment = 7,
-  ESelectSubject = 8,
+  ESelectSubject = 7,
+  ESelectSegment = 8,
   ESelectStick = 9,
   ESelectRigidObject = 10,
-  ESelectDevice = 11, ///< force plates and other devices
   ESelectSceneMesh = 12,
   ESelectObjectManipulator = 27,
-  ESelectGreyscaleBlob = 30, ///< sub: index of the blob in its camera
+  ESelectMaskCell = 30, ///< sub: row-major index of the cell
   ESelectVolumeManipulator = 33
 };
 
