@@ -394,7 +394,7 @@ TEST( StoreConcurrency, ShortLivedThreadsAndStoresUseSlotsAgain )
     for ( int Thread = 0; Thread < 3; ++Thread )
     {
       Threads.emplace_back(
-          [&]
+          [&, Thread]
           {
             pStore->Set( "b", Thread + 1 );
             pStore->Read(
