@@ -60,10 +60,12 @@ struct VDelivery
   };
   std::vector< std::shared_ptr< VHandlerCallback > > m_Touched;
   std::vector< VImmediate > m_Immediate;
+  bool m_bPosts = false; ///< a touched handler has callbacks on services
 
   /// Releases handlers, so never under a lock.
   void Clear()
   {
+    m_bPosts = false;
     m_Immediate.clear();
     m_Touched.clear();
   }

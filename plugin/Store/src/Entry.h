@@ -11,6 +11,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <type_traits>
 #include <vector>
 
 namespace Store
@@ -54,7 +55,6 @@ struct VEntryState
 {
   std::vector< VStoreEntry* > m_Children; ///< in child order
   ZEK::VChangeIds m_Changes;
-  std::unique_ptr< VEntryValues > m_pValues;
   std::unique_ptr< VEntryPresentation > m_pPresentation;
   std::unique_ptr< VEntryExtras > m_pExtras;
   const ZEK::IO::ISchema* m_pSchema = nullptr;
@@ -69,6 +69,7 @@ struct VEntryChange
   const ZEK::IO::ISchema* m_pSchema = nullptr;
   std::size_t m_Place = 0; ///< in the pending children of the parent
   VPendingChildren m_Children;
+  bool m_bChoices = false; ///< the three lists of choices may hold something
   VEntryValues m_Values;
   VEntryPresentation m_Presentation;
   VEntryExtras m_Extras;
@@ -85,12 +86,14 @@ public:
   {
   }
 
-  std::atomic< VStoreEntry* > m_pBucketLink{ nullptr };
-  const ZEK::VEntryPath m_Path;
-  VStoreEntry* const m_pParent;            ///< null for the root only
-  VHandlerList m_Handlers;                 ///< those registered by handle; store mutex
+  /// Part of what is committed, and here so that a read of a value looks at one place; empty without a state.
+  VEntryValues m_Values;
   std::unique_ptr< VEntryState > m_pState; ///< null while the entry is not there
   VEntryChange* m_pChange = nullptr;       ///< the thread of the write scope, or the store mutex
+  std::atomic< VStoreEntry* > m_pBucketLink{ nullptr };
+  const ZEK::VEntryPath m_Path;
+  VStoreEntry* const m_pParent; ///< null for the root only
+  VHandlerList m_Handlers;      ///< those registered by handle; store mutex
 };
 
 /// The groups of fields by type, so that one routine serves them all.
@@ -99,10 +102,6 @@ const TGroup& EmptyGroup()
 {
   static const TGroup Empty{};
   return Empty;
-}
-inline const VEntryValues* CommittedGroup( const VEntryState& i_rState, const VEntryValues* )
-{
-  return i_rState.m_pValues.get();
 }
 inline const VEntryPresentation* CommittedGroup( const VEntryState& i_rState, const VEntryPresentation* )
 {
@@ -129,7 +128,11 @@ inline const VEntryExtras& PendingGroup( const VEntryChange& i_rChange, const VE
 template < typename TGroup >
 const TGroup& Committed( const VStoreEntry* i_pEntry )
 {
-  if ( i_pEntry != nullptr && i_pEntry->m_pState )
+  if constexpr ( std::is_same_v< TGroup, VEntryValues > )
+  {
+    return i_pEntry != nullptr ? i_pEntry->m_Values : EmptyGroup< TGroup >();
+  }
+  else if ( i_pEntry != nullptr && i_pEntry->m_pState )
   {
     const TGroup* const pGroup = CommittedGroup( *i_pEntry->m_pState, static_cast< const TGroup* >( nullptr ) );
     return pGroup != nullptr ? *pGroup : EmptyGroup< TGroup >();

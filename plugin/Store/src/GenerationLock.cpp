@@ -2,6 +2,7 @@
 
 #include <ZEK/DebugServices.h>
 
+#include <chrono>
 #include <exception>
 #include <system_error>
 #include <thread>
@@ -107,11 +108,11 @@ std::uint64_t VGenerationLock::BeginCommit( std::unique_lock< std::mutex >& io_r
   if ( !IsDrained() )
   {
     m_bDrainWaits.store( true );
-    m_Drain.wait( io_rLock,
-                  [this]
-                  {
-                    return IsDrained();
-                  } );
+    // Whoever leaves wakes it; should its look have missed the sleeper, the commit is late by so much and no more.
+    while ( !IsDrained() )
+    {
+      m_Drain.wait_for( io_rLock, std::chrono::milliseconds( 1 ) );
+    }
     m_bDrainWaits.store( false );
   }
   m_Fifo.erase( m_Fifo.begin() );

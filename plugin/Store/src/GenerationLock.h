@@ -75,8 +75,9 @@ private:
 
   void LeaveLine( VThreadState& io_rThread )
   {
-    io_rThread.m_pLine->m_Reading.store( 0 );
-    if ( m_bDrainWaits.load() )
+    // The look may come before the store: the commit that fell asleep in between looks again by itself.
+    io_rThread.m_pLine->m_Reading.store( 0, std::memory_order_release );
+    if ( m_bDrainWaits.load( std::memory_order_relaxed ) )
     {
       WakeDrain();
     }

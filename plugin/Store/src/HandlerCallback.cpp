@@ -179,6 +179,7 @@ void VHandlerCallback::Collect( ChangeId i_Id, VDelivery& io_rDelivery )
   for ( const auto& [rpService, rpList] : m_Posted )
   {
     rpList->Accumulate( Flags, i_Id );
+    io_rDelivery.m_bPosts = true;
   }
 }
 

@@ -149,10 +149,11 @@ std::uint64_t VMerge::MergeEntry( VStoreEntry& io_rEntry )
   {
     Flags |= MergeChildren( io_rEntry );
   }
-  Apply( *io_rEntry.m_pState, rChange, rChange.m_Mask, Flags );
+  Apply( io_rEntry, rChange, rChange.m_Mask, Flags );
   Touch( io_rEntry.m_Handlers, Flags );
   if ( ( rChange.m_Mask & ERemoved ) != 0 )
   {
+    io_rEntry.m_Values = VEntryValues();
     io_rEntry.m_pState.reset();
   }
   m_rPending.Release( io_rEntry );
@@ -173,11 +174,10 @@ void VMerge::MakeState( VStoreEntry& io_rEntry, std::uint64_t& io_rFlags )
   VEntryState& rState = *io_rEntry.m_pState;
   rState.m_pSchema = rChange.m_pSchema;
   std::uint64_t Cleared = ~rChange.m_Mask & ChangeMask::Fields;
-  Cleared &= rState.m_pValues ? ~std::uint64_t( 0 ) : ~ChangeMask::Values;
   Cleared &= rState.m_pPresentation ? ~std::uint64_t( 0 ) : ~ChangeMask::Presentation;
   Cleared &= rState.m_pExtras ? ~std::uint64_t( 0 ) : ~ChangeMask::Extras;
   VEntryChange Empty;
-  Apply( rState, Empty, Cleared, io_rFlags );
+  Apply( io_rEntry, Empty, Cleared, io_rFlags );
   io_rFlags |= ( rChange.m_Mask & EReAdd ) != 0 ? std::uint64_t( EAdded ) : 0;
 }
 
@@ -203,34 +203,35 @@ std::uint64_t VMerge::MergeChildren( VStoreEntry& io_rEntry )
   return Flags;
 }
 
-void VMerge::Apply( VEntryState& io_rState, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
+void VMerge::Apply( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
 {
+  VEntryState& rState = *io_rEntry.m_pState;
   if ( ( i_Mask & ERemoved ) != 0 )
   {
     io_rFlags |= ERemoved;
-    Touch( io_rState.m_Handlers, io_rFlags );
+    Touch( rState.m_Handlers, io_rFlags );
     return;
   }
   // Before the fields are looked at: a new entry may have a schema and nothing else.
   if ( ( i_Mask & TakesSchema ) != 0 && io_rChange.m_pSchema != nullptr )
   {
-    io_rState.m_pSchema = io_rChange.m_pSchema;
+    rState.m_pSchema = io_rChange.m_pSchema;
   }
   if ( ( i_Mask & ChangeMask::Values ) != 0 )
   {
-    ApplyValues( Ensure( io_rState.m_pValues ), io_rChange.m_Values, i_Mask, io_rFlags );
+    ApplyValues( io_rEntry.m_Values, io_rChange.m_Values, i_Mask, io_rFlags );
   }
   if ( ( i_Mask & ChangeMask::Presentation ) != 0 )
   {
-    ApplyPresentation( Ensure( io_rState.m_pPresentation ), io_rChange.m_Presentation, i_Mask, io_rFlags );
+    ApplyPresentation( Ensure( rState.m_pPresentation ), io_rChange.m_Presentation, i_Mask, io_rFlags );
   }
   if ( ( i_Mask & ChangeMask::Extras ) != 0 )
   {
-    ApplyExtras( Ensure( io_rState.m_pExtras ), io_rChange.m_Extras, i_Mask, io_rFlags );
+    ApplyExtras( Ensure( rState.m_pExtras ), io_rChange.m_Extras, i_Mask, io_rFlags );
   }
   io_rFlags |= i_Mask & ChangeMask::Kept;
-  Stamp( io_rState, io_rFlags );
-  Touch( io_rState.m_Handlers, io_rFlags );
+  Stamp( rState, io_rFlags );
+  Touch( rState.m_Handlers, io_rFlags );
 }
 
 void VMerge::Stamp( VEntryState& io_rState, std::uint64_t i_Flags ) const

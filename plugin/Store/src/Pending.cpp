@@ -34,6 +34,21 @@ const IO::ISchema* OverlaidSchema( const VStoreEntry* i_pEntry )
   return pSchema != nullptr ? pSchema : IO::GetUniquePodSchema( IO::EType::Void );
 }
 
+namespace
+{
+/// Most records never have any, and are not looked at as far as that.
+void ClearChoices( VEntryChange& io_rChange )
+{
+  if ( io_rChange.m_bChoices )
+  {
+    io_rChange.m_bChoices = false;
+    io_rChange.m_Presentation.m_Choices.clear();
+    io_rChange.m_Presentation.m_ChoiceTexts.clear();
+    io_rChange.m_Presentation.m_ChoiceToolTips.clear();
+  }
+}
+} // namespace
+
 VEntryChange& VPending::Take()
 {
   if ( m_Free.empty() )
@@ -45,9 +60,7 @@ VEntryChange& VPending::Take()
   rChange.m_Mask = 0;
   rChange.m_pSchema = nullptr;
   rChange.m_Children.Clear();
-  rChange.m_Presentation.m_Choices.clear();
-  rChange.m_Presentation.m_ChoiceTexts.clear();
-  rChange.m_Presentation.m_ChoiceToolTips.clear();
+  ClearChoices( rChange );
   return rChange;
 }
 
@@ -158,9 +171,7 @@ void VPending::MarkRemoved( VStoreEntry& io_rEntry, bool i_bForce )
   rChange.m_Mask = ( rChange.m_Mask & ChangeMask::Kept ) | ERemoved | ( i_bForce ? std::uint64_t( EForce ) : 0 );
   rChange.m_pSchema = nullptr;
   // Should the entry be written again, its lists are not filled from here or from the state.
-  rChange.m_Presentation.m_Choices.clear();
-  rChange.m_Presentation.m_ChoiceTexts.clear();
-  rChange.m_Presentation.m_ChoiceToolTips.clear();
+  ClearChoices( rChange );
   for ( VStoreEntry* const pChild : io_rEntry.m_pState->m_Children )
   {
     MarkRemoved( *pChild, i_bForce );

@@ -107,6 +107,7 @@ void VStoreWriter::FillChoices( Entry i_pEntry, VEntryChange& io_rChange )
 {
   const VEntryPresentation& rOld = Committed< VEntryPresentation >( i_pEntry );
   VEntryPresentation& rNew = io_rChange.m_Presentation;
+  io_rChange.m_bChoices = true;
   const auto IsMissing = [&io_rChange]( std::uint64_t i_Bit )
   {
     return ( io_rChange.m_Mask & ( i_Bit | ChangeMask::Replaced ) ) == 0;

@@ -216,9 +216,9 @@ void VStore::Deliver( VThreadState& io_rThread, VDelivery& io_rDelivery, ChangeI
   {
     rImmediate.m_pList->RunNow( rImmediate.m_Flags, i_Id, io_rFailure );
   }
-  for ( const std::shared_ptr< VHandlerCallback >& rpHandler : io_rDelivery.m_Touched )
+  for ( std::size_t Place = 0; io_rDelivery.m_bPosts && Place < io_rDelivery.m_Touched.size(); ++Place )
   {
-    rpHandler->GatherPosts( i_Id, io_rThread.m_Outbox );
+    io_rDelivery.m_Touched[Place]->GatherPosts( i_Id, io_rThread.m_Outbox );
   }
   if ( --io_rThread.m_Dispatch == 0 && !io_rThread.m_Outbox.IsEmpty() )
   {

@@ -39,52 +39,35 @@ struct VWriter : testing::Test
   }
 };
 
+using VSet = IResult ( IStoreWriter::* )( VStoreEntry*, VTypedValue );
 struct VSetter
 {
   const char* m_pMessage;
-  std::function< IResult( IStoreWriter&, VStoreEntry*, const VTypedValue& ) > m_Set;
+  VSet m_Set; ///< null for a choice and for the type alone
+
+  IResult operator()( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue ) const
+  {
+    if ( m_Set != nullptr )
+    {
+      return ( io_rWriter.*m_Set )( i_pEntry, i_rValue );
+    }
+    return IsChoice() ? io_rWriter.AddValueChoice( i_pEntry, i_rValue, "", "" )
+                      : io_rWriter.SetSchema( i_pEntry, i_rValue.Schema() );
+  }
+  bool IsChoice() const { return std::string( m_pMessage ).find( "choice" ) != std::string::npos; }
 };
 const std::vector< VSetter > Setters{
     { "Failed to set 'p/e' verified value: the value type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.SetVerifiedValue( i_pEntry, i_rValue );
-      } },
+      &IStoreWriter::SetVerifiedValue },
     { "Failed to set 'p/e' proposed value: the value type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.SetProposedValue( i_pEntry, i_rValue );
-      } },
-    { "Failed to set 'p/e' value: the value type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.SetValue( i_pEntry, i_rValue );
-      } },
+      &IStoreWriter::SetProposedValue },
+    { "Failed to set 'p/e' value: the value type does not match the entry type.", &IStoreWriter::SetValue },
     { "Failed to set 'p/e' default value: the value type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.SetDefaultValue( i_pEntry, i_rValue );
-      } },
-    { "Failed to set 'p/e' minimum value: the value type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.SetMinimum( i_pEntry, i_rValue );
-      } },
-    { "Failed to set 'p/e' maximum value: the value type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.SetMaximum( i_pEntry, i_rValue );
-      } },
-    { "Failed to add 'p/e' value choice: the value type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.AddValueChoice( i_pEntry, i_rValue, "", "" );
-      } },
-    { "Failed to set 'p/e' value schema: the requested type does not match the entry type.",
-      []( IStoreWriter& io_rWriter, VStoreEntry* i_pEntry, const VTypedValue& i_rValue )
-      {
-        return io_rWriter.SetSchema( i_pEntry, i_rValue.Schema() );
-      } } };
+      &IStoreWriter::SetDefaultValue },
+    { "Failed to set 'p/e' minimum value: the value type does not match the entry type.", &IStoreWriter::SetMinimum },
+    { "Failed to set 'p/e' maximum value: the value type does not match the entry type.", &IStoreWriter::SetMaximum },
+    { "Failed to add 'p/e' value choice: the value type does not match the entry type.", nullptr },
+    { "Failed to set 'p/e' value schema: the requested type does not match the entry type.", nullptr } };
 } // namespace
 
 TEST_F( VWriter, EachSetterFixesTheTypeAndRefusesOthersWithItsText )
@@ -101,17 +84,17 @@ TEST_F( VWriter, EachSetterFixesTheTypeAndRefusesOthersWithItsText )
           {
             VStoreEntry* const pEntry = Store["p/e"];
             const bool bSchema = &rSetter == &Setters.back();
-            EXPECT_EQ( rSetter.m_Set( io_rWriter, pEntry, Int( 1 ) ),
+            EXPECT_EQ( rSetter( io_rWriter, pEntry, Int( 1 ) ),
                        bSchema && bCommitted ? IResult::OkButNoEffect : IResult::Ok );
             EXPECT_EQ( io_rWriter.Schema( pEntry ), IO::GetUniquePodSchema( IO::EType::Int32 ) );
             TestSupport::ExpectFailureLine( rSetter.m_pMessage );
-            EXPECT_EQ( rSetter.m_Set( io_rWriter, pEntry, IO::MakeValue( 1.0 ) ), IResult::InvalidType );
+            EXPECT_EQ( rSetter( io_rWriter, pEntry, IO::MakeValue( 1.0 ) ), IResult::InvalidType );
             Wanted.push_back( rSetter.m_pMessage );
             rCategory.SetMaximumLevel( 1 );
-            EXPECT_EQ( rSetter.m_Set( io_rWriter, pEntry, IO::MakeValue( true ) ), IResult::InvalidType );
+            EXPECT_EQ( rSetter( io_rWriter, pEntry, IO::MakeValue( true ) ), IResult::InvalidType );
             rCategory.SetMaximumLevel( ELogWarning );
-            EXPECT_TRUE( bSchema || rSetter.m_Set( io_rWriter, pEntry, VTypedValue() ) == IResult::Ok );
-            EXPECT_EQ( rSetter.m_Set( io_rWriter, pEntry, Int( 2 ) ), bSchema ? IResult::OkButNoEffect : IResult::Ok );
+            EXPECT_TRUE( bSchema || rSetter( io_rWriter, pEntry, VTypedValue() ) == IResult::Ok );
+            EXPECT_EQ( rSetter( io_rWriter, pEntry, Int( 2 ) ), bSchema ? IResult::OkButNoEffect : IResult::Ok );
           } );
     }
   }
@@ -164,8 +147,7 @@ TEST_F( VWriter, UsingDefaultFollowsTheSetters )
     m_Store.Write(
         [&]( IStoreWriter& io_rWriter )
         {
-          EXPECT_EQ( Setters[static_cast< std::size_t >( rCase.Setter )].m_Set( io_rWriter, pEntry, Int( 6 ) ),
-                     IResult::Ok );
+          EXPECT_EQ( Setters[static_cast< std::size_t >( rCase.Setter )]( io_rWriter, pEntry, Int( 6 ) ), IResult::Ok );
         } );
     EXPECT_EQ( ( Flags( Path.c_str() ) & EUsingDefault ) != 0, rCase.bStays ) << Path;
   }
