@@ -11,6 +11,8 @@
 
 #include <gmock/gmock.h>
 
+#include <set>
+
 using namespace ProgramTest;
 
 namespace
@@ -133,6 +135,31 @@ TEST( Pick, ActionsWorkInTheirOrderAndModifiersEditTheSelection )
   EXPECT_EQ( Selected( 3 ), Band - 1 ) << "Shift with Control removes";
   EXPECT_EQ( Selected( 5 ), 0 ) << "a click on nothing clears";
   EXPECT_EQ( Report["selection"].toArray().size(), 0 );
+}
+
+TEST( Pick, ABandAroundALegReportsItsMarkersAndThoseBehindThem )
+{
+  HARROW_NEEDS_MODULE();
+  HARROW_NEEDS_RECORDINGS();
+  // Seen from the right, the knee's marker hides the one inside of the knee, and the toe's the one inside of the foot.
+  const QStringList View{ "--source", Recording( "c3d-trc/Gait.c3d" ), "--time", "2.43", "--size", "1280x720", "--view",
+                          "Front" };
+  const double Scale = Render( View )["camera"].toObject()["orthoScale"].toDouble();
+  ASSERT_GT( Scale, 0 );
+  const auto Place = [&]( double i_X, double i_Z )
+  {
+    return Text( { 640 - i_X / Scale, 360 - i_Z / Scale } );
+  };
+  const QString Corners = Place( 540, 660 ) + "," + Place( 900, 12 );
+  const QJsonObject Report = Render( View + QStringList{ "--band", Corners } );
+  std::set< std::string > Labels;
+  for ( const QJsonValue& rItem : Report["selection"].toArray() )
+  {
+    Labels.insert( rItem.toObject()["label"].toString().toStdString() );
+  }
+  EXPECT_THAT( Labels, testing::UnorderedElementsAre(
+                           "Gait:RTHI", "Gait:R.Knee", "Gait:RSHA", "Gait:R.Ankle", "Gait:RHEE", "Gait:RTOE",
+                           "Gait:R.Knee.Medial", "Gait:R.Ankle.Medial", "Gait:R.Foot.Medial", "Gait:R.Foot.Lateral" ) );
 }
 
 TEST( Report, SaysWhichFrameItShowsAndWhatItDrewWith )
