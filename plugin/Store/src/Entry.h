@@ -71,8 +71,23 @@ struct VEntryChange
   VPendingChildren m_Children;
   bool m_bChoices = false; ///< the three lists of choices may hold something
   VEntryValues m_Values;
-  VEntryPresentation m_Presentation;
-  VEntryExtras m_Extras;
+  /// Made on first need and kept with the record: most records never have them, and are small.
+  VEntryPresentation& Presentation() { return Made( m_pPresentation ); }
+  VEntryExtras& Extras() { return Made( m_pExtras ); }
+
+  std::unique_ptr< VEntryPresentation > m_pPresentation;
+  std::unique_ptr< VEntryExtras > m_pExtras;
+
+private:
+  template < typename TGroup >
+  static TGroup& Made( std::unique_ptr< TGroup >& io_rpGroup )
+  {
+    if ( !io_rpGroup )
+    {
+      io_rpGroup = std::make_unique< TGroup >();
+    }
+    return *io_rpGroup;
+  }
 };
 
 /// A node of the tree. Made on first use of a path and kept as long as the store; it is there, for clients, when it
@@ -117,11 +132,11 @@ inline const VEntryValues& PendingGroup( const VEntryChange& i_rChange, const VE
 }
 inline const VEntryPresentation& PendingGroup( const VEntryChange& i_rChange, const VEntryPresentation* )
 {
-  return i_rChange.m_Presentation;
+  return *i_rChange.m_pPresentation;
 }
 inline const VEntryExtras& PendingGroup( const VEntryChange& i_rChange, const VEntryExtras* )
 {
-  return i_rChange.m_Extras;
+  return *i_rChange.m_pExtras;
 }
 
 /// The committed fields of an entry, empty ones when it has none.

@@ -223,11 +223,11 @@ void VMerge::Apply( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint6
   }
   if ( ( i_Mask & ChangeMask::Presentation ) != 0 )
   {
-    ApplyPresentation( Ensure( rState.m_pPresentation ), io_rChange.m_Presentation, i_Mask, io_rFlags );
+    ApplyPresentation( Ensure( rState.m_pPresentation ), io_rChange.Presentation(), i_Mask, io_rFlags );
   }
   if ( ( i_Mask & ChangeMask::Extras ) != 0 )
   {
-    ApplyExtras( Ensure( rState.m_pExtras ), io_rChange.m_Extras, i_Mask, io_rFlags );
+    ApplyExtras( Ensure( rState.m_pExtras ), io_rChange.Extras(), i_Mask, io_rFlags );
   }
   io_rFlags |= i_Mask & ChangeMask::Kept;
   Stamp( rState, io_rFlags );

@@ -42,9 +42,9 @@ void ClearChoices( VEntryChange& io_rChange )
   if ( io_rChange.m_bChoices )
   {
     io_rChange.m_bChoices = false;
-    io_rChange.m_Presentation.m_Choices.clear();
-    io_rChange.m_Presentation.m_ChoiceTexts.clear();
-    io_rChange.m_Presentation.m_ChoiceToolTips.clear();
+    io_rChange.Presentation().m_Choices.clear();
+    io_rChange.Presentation().m_ChoiceTexts.clear();
+    io_rChange.Presentation().m_ChoiceToolTips.clear();
   }
 }
 } // namespace
@@ -72,9 +72,9 @@ void VPending::Release( VStoreEntry& io_rEntry )
   io_rEntry.m_pChange->m_Values.m_Verified = IO::VTypedValue( nullptr, IO::VValueBytes( "stale", 5 ) );
   io_rEntry.m_pChange->m_Values.m_Proposed = io_rEntry.m_pChange->m_Values.m_Verified;
   io_rEntry.m_pChange->m_Values.m_Default = io_rEntry.m_pChange->m_Values.m_Verified;
-  io_rEntry.m_pChange->m_Presentation.m_Text = "stale";
-  io_rEntry.m_pChange->m_Extras.m_OptionalText = "stale";
-  io_rEntry.m_pChange->m_Extras.m_Number1 = ~std::uint32_t( 0 );
+  io_rEntry.m_pChange->Presentation().m_Text = "stale";
+  io_rEntry.m_pChange->Extras().m_OptionalText = "stale";
+  io_rEntry.m_pChange->Extras().m_Number1 = ~std::uint32_t( 0 );
 #endif
   m_Free.push_back( io_rEntry.m_pChange );
   io_rEntry.m_pChange = nullptr;

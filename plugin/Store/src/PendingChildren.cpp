@@ -46,11 +46,8 @@ VChildRange FindChildren( const std::vector< VStoreEntry* >& i_rSorted, std::str
 
 void VPendingChildren::Add( VStoreEntry& io_rChild )
 {
-  const bool bInOrder =
-      m_Sorted == m_Items.size() && m_Gone == 0 && ( m_Items.empty() || ChildLess( m_Items.back(), &io_rChild ) );
   io_rChild.m_pChange->m_Place = m_Items.size();
   m_Items.push_back( &io_rChild );
-  m_Sorted += bInOrder ? 1 : 0;
 }
 
 void VPendingChildren::Remove( VStoreEntry& io_rChild )
@@ -86,8 +83,15 @@ const std::vector< VStoreEntry* >& VPendingChildren::Sorted()
   const auto Middle = m_Items.begin() + static_cast< std::ptrdiff_t >( m_Sorted );
   const std::ptrdiff_t Sorted = Middle - m_Items.begin() - std::count( m_Items.begin(), Middle, nullptr );
   std::erase( m_Items, nullptr );
-  std::sort( m_Items.begin() + Sorted, m_Items.end(), ChildLess );
-  std::inplace_merge( m_Items.begin(), m_Items.begin() + Sorted, m_Items.end(), ChildLess );
+  // Often everything is new, and often in order.
+  if ( !std::is_sorted( m_Items.begin() + Sorted, m_Items.end(), ChildLess ) )
+  {
+    std::sort( m_Items.begin() + Sorted, m_Items.end(), ChildLess );
+  }
+  if ( Sorted != 0 )
+  {
+    std::inplace_merge( m_Items.begin(), m_Items.begin() + Sorted, m_Items.end(), ChildLess );
+  }
   m_Sorted = m_Items.size();
   m_Gone = 0;
   for ( std::size_t Place = 0; Place < m_Items.size(); ++Place )

@@ -84,7 +84,7 @@ IResult VStoreWriter::SetMinimum( Entry i_pEntry, VTypedValue i_Value )
       i_pEntry, i_Value, "Failed to set '%1%' minimum value: the value type does not match the entry type.", Result );
   if ( pChange != nullptr )
   {
-    pChange->m_Presentation.m_Minimum = std::move( i_Value );
+    pChange->Presentation().m_Minimum = std::move( i_Value );
     pChange->m_Mask |= EChangeMinimum;
   }
   return Result;
@@ -97,7 +97,7 @@ IResult VStoreWriter::SetMaximum( Entry i_pEntry, VTypedValue i_Value )
       i_pEntry, i_Value, "Failed to set '%1%' maximum value: the value type does not match the entry type.", Result );
   if ( pChange != nullptr )
   {
-    pChange->m_Presentation.m_Maximum = std::move( i_Value );
+    pChange->Presentation().m_Maximum = std::move( i_Value );
     pChange->m_Mask |= EChangeMaximum;
   }
   return Result;
@@ -106,7 +106,7 @@ IResult VStoreWriter::SetMaximum( Entry i_pEntry, VTypedValue i_Value )
 void VStoreWriter::FillChoices( Entry i_pEntry, VEntryChange& io_rChange )
 {
   const VEntryPresentation& rOld = Committed< VEntryPresentation >( i_pEntry );
-  VEntryPresentation& rNew = io_rChange.m_Presentation;
+  VEntryPresentation& rNew = io_rChange.Presentation();
   io_rChange.m_bChoices = true;
   const auto IsMissing = [&io_rChange]( std::uint64_t i_Bit )
   {
@@ -134,7 +134,7 @@ IResult VStoreWriter::AddValueChoice( Entry i_pEntry, VTypedValue i_Value, std::
   if ( pChange != nullptr )
   {
     FillChoices( i_pEntry, *pChange );
-    VEntryPresentation& rNew = pChange->m_Presentation;
+    VEntryPresentation& rNew = pChange->Presentation();
     rNew.m_Choices.push_back( std::move( i_Value ) );
     pChange->m_Mask |= EChangeChoices;
     const std::size_t Count = rNew.m_Choices.size();
@@ -158,11 +158,11 @@ IResult VStoreWriter::RemoveValueChoice( Entry i_pEntry, std::size_t i_Index )
   }
   VEntryChange& rChange = Obtain( i_pEntry );
   FillChoices( i_pEntry, rChange );
-  EraseAt( rChange.m_Presentation.m_Choices, i_Index );
-  EraseAt( rChange.m_Presentation.m_ChoiceTexts, i_Index );
-  EraseAt( rChange.m_Presentation.m_ChoiceToolTips, i_Index );
-  ClearIfAllEmpty( rChange.m_Presentation.m_ChoiceTexts );
-  ClearIfAllEmpty( rChange.m_Presentation.m_ChoiceToolTips );
+  EraseAt( rChange.Presentation().m_Choices, i_Index );
+  EraseAt( rChange.Presentation().m_ChoiceTexts, i_Index );
+  EraseAt( rChange.Presentation().m_ChoiceToolTips, i_Index );
+  ClearIfAllEmpty( rChange.Presentation().m_ChoiceTexts );
+  ClearIfAllEmpty( rChange.Presentation().m_ChoiceToolTips );
   rChange.m_Mask |= EChangeChoices | EChangeChoiceTexts | EChangeChoiceToolTips;
   return IResult::Ok;
 }
@@ -178,9 +178,9 @@ IResult VStoreWriter::ClearValueChoices( Entry i_pEntry )
     return IResult::OkButNoEffect;
   }
   VEntryChange& rChange = Obtain( i_pEntry );
-  rChange.m_Presentation.m_Choices.clear();
-  rChange.m_Presentation.m_ChoiceTexts.clear();
-  rChange.m_Presentation.m_ChoiceToolTips.clear();
+  rChange.Presentation().m_Choices.clear();
+  rChange.Presentation().m_ChoiceTexts.clear();
+  rChange.Presentation().m_ChoiceToolTips.clear();
   rChange.m_Mask |= EChangeChoices | EChangeChoiceTexts;
   if ( !Committed< VEntryPresentation >( i_pEntry ).m_ChoiceToolTips.empty() )
   {
@@ -202,7 +202,7 @@ IResult VStoreWriter::SetChoiceToolTip( Entry i_pEntry, std::size_t i_Index, std
   }
   VEntryChange& rChange = Obtain( i_pEntry );
   FillChoices( i_pEntry, rChange );
-  std::vector< std::string >& rToolTips = rChange.m_Presentation.m_ChoiceToolTips;
+  std::vector< std::string >& rToolTips = rChange.Presentation().m_ChoiceToolTips;
   rToolTips.resize( Count );
   rToolTips[i_Index] = std::move( i_Text );
   ClearIfAllEmpty( rToolTips );
@@ -215,7 +215,7 @@ void VStoreWriter::SetPresentationText( Entry i_pEntry, std::string i_Text )
   if ( i_pEntry != nullptr )
   {
     VEntryChange& rChange = Obtain( i_pEntry );
-    rChange.m_Presentation.m_Text = std::move( i_Text );
+    rChange.Presentation().m_Text = std::move( i_Text );
     rChange.m_Mask |= EChangePresentationText;
   }
 }
@@ -226,7 +226,7 @@ void VStoreWriter::SetExtra( Entry i_pEntry, T VEntryExtras::*i_pField, std::uin
   if ( i_pEntry != nullptr )
   {
     VEntryChange& rChange = Obtain( i_pEntry );
-    rChange.m_Extras.*i_pField = std::move( i_Value );
+    rChange.Extras().*i_pField = std::move( i_Value );
     rChange.m_Mask |= i_Bit;
   }
 }
