@@ -96,7 +96,8 @@ class VStoreEntry
 {
 public:
   VStoreEntry( ZEK::VEntryPath i_Path, VStoreEntry* i_pParent )
-    : m_Path( std::move( i_Path ) )
+    : m_LeafKey( LeafKey( i_Path.LeafView() ) )
+    , m_Path( std::move( i_Path ) )
     , m_pParent( i_pParent )
   {
   }
@@ -105,6 +106,7 @@ public:
   VEntryValues m_Values;
   std::unique_ptr< VEntryState > m_pState; ///< null while the entry is not there
   VEntryChange* m_pChange = nullptr;       ///< the thread of the write scope, or the store mutex
+  const std::uint64_t m_LeafKey;           ///< orders most siblings without their names
   std::atomic< VStoreEntry* > m_pBucketLink{ nullptr };
   const ZEK::VEntryPath m_Path;
   VStoreEntry* const m_pParent; ///< null for the root only

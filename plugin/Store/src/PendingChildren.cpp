@@ -18,8 +18,22 @@ int CompareBytes( std::string_view i_A, std::string_view i_B )
 }
 } // namespace
 
+std::uint64_t LeafKey( std::string_view i_Name )
+{
+  std::uint64_t Key = 0;
+  for ( std::size_t Place = 0; Place < sizeof( Key ); ++Place )
+  {
+    Key = Key << 8 | ( Place < i_Name.size() ? static_cast< std::uint8_t >( i_Name[Place] ) : 0 );
+  }
+  return Key;
+}
+
 bool ChildLess( const VStoreEntry* i_pA, const VStoreEntry* i_pB )
 {
+  if ( i_pA->m_LeafKey != i_pB->m_LeafKey )
+  {
+    return i_pA->m_LeafKey < i_pB->m_LeafKey;
+  }
   const int Leaf = CompareBytes( i_pA->m_Path.LeafView(), i_pB->m_Path.LeafView() );
   return Leaf != 0 ? Leaf < 0 : CompareBytes( i_pA->m_Path.Text(), i_pB->m_Path.Text() ) < 0;
 }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <string_view>
 #include <vector>
 
@@ -11,6 +12,8 @@ class VStoreEntry;
 
 /// By leaf name, bytes compared as numbers from 0 to 255, the shorter first; equal leaf names by full path.
 bool ChildLess( const VStoreEntry* i_pA, const VStoreEntry* i_pB );
+/// The first eight bytes of a name as a number: where two differ, they are in the order of their names.
+std::uint64_t LeafKey( std::string_view i_Name );
 /// Less than 0, 0 or greater for the leaf name of the entry against a name.
 int CompareLeaf( const VStoreEntry* i_pEntry, std::string_view i_Name );
 
