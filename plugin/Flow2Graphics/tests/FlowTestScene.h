@@ -8,55 +8,16 @@
 #include <Flow2Graphics/VFlowScene.h>
 #include <HostFlow/VFlowFramework.h>
 
-#include <memory>
-#include <string>
+#include <TestScene.h> // of the room below
 
 namespace FlowTest
 {
 
-/// A selection that a test sets by hand.
-class VSelection : public ZEK::ISelectionService
-{
-public:
-  ZEK::VSelection Get( ESet i_Set ) const override { return m_Sets[i_Set]; }
-  bool Get( ESet i_Set, const std::vector< std::uint32_t >& i_rKinds, ZEK::VSelection& o_rSelection ) const override
-  {
-    o_rSelection.clear();
-    for ( const ZEK::VSelectionItem& rItem : m_Sets[i_Set] )
-    {
-      if ( std::find( i_rKinds.begin(), i_rKinds.end(), rItem.Kind ) != i_rKinds.end() )
-      {
-        o_rSelection.push_back( rItem );
-      }
-    }
-    return !o_rSelection.empty();
-  }
-  std::uint64_t Generation() const override { return m_Generation; }
-  void Set( ESet i_Set, ZEK::VSelection i_Selection ) override
-  {
-    m_Sets[i_Set] = std::move( i_Selection );
-    ++m_Generation;
-  }
-  std::shared_ptr< ZEK::IMultiCallback< void() > > ForKinds( const std::vector< std::uint32_t >& ) override
-  {
-    return std::make_shared< ZEK::VMultiCallback< void() > >();
-  }
-  ZEK::VSelectionItem FromName( const std::string& i_rText ) const override
-  {
-    return i_rText.empty() ? ZEK::VSelectionItem{} : ZEK::VSelectionItem{ ZEK::ESelectDevice, i_rText, 0, 0 };
-  }
-  std::string Text( const ZEK::VSelectionItem& i_rItem ) const override { return i_rItem.Device; }
-
-private:
-  ZEK::VSelection m_Sets[2];
-  std::uint64_t m_Generation = 1;
-};
-
 class VScene : public Flow2Graphics::VFlowScene
 {
 public:
-  explicit VScene( std::shared_ptr< VSelection > i_pSelection = nullptr )
-    : VFlowScene( nullptr, std::move( i_pSelection ), nullptr, nullptr, false )
+  VScene()
+    : VFlowScene( nullptr, std::make_shared< HostServices::VSelectionService >(), nullptr, nullptr, false )
   {
     CreateRenderTypes();
   }
@@ -68,22 +29,14 @@ public:
     MarkDirty();
     ProcessPending();
   }
-  Flow2Graphics::VFlowRenderFloorGrid& Floor()
+  void Select( ZEK::VSelection i_Items )
   {
-    return dynamic_cast< Flow2Graphics::VFlowRenderFloorGrid& >( *FlowRenderTypes().at( 0 ) );
+    SelectionService()->Set( ZEK::ISelectionService::EPrimary, std::move( i_Items ) );
   }
-  Flow2Graphics::VFlowRenderReconstructions& Reconstructions()
-  {
-    return dynamic_cast< Flow2Graphics::VFlowRenderReconstructions& >( *FlowRenderTypes().at( 2 ) );
-  }
-  Flow2Graphics::VFlowRenderForcePlates& Plates()
-  {
-    return dynamic_cast< Flow2Graphics::VFlowRenderForcePlates& >( *FlowRenderTypes().at( 1 ) );
-  }
-  Flow2Graphics::VFlowRenderReconstructionVolume& Volume()
-  {
-    return dynamic_cast< Flow2Graphics::VFlowRenderReconstructionVolume& >( *FlowRenderTypes().at( 3 ) );
-  }
+  auto& Floor() { return Type< Flow2Graphics::VFlowRenderFloorGrid >( 0 ); }
+  auto& Plates() { return Type< Flow2Graphics::VFlowRenderForcePlates >( 1 ); }
+  auto& Reconstructions() { return Type< Flow2Graphics::VFlowRenderReconstructions >( 2 ); }
+  auto& Volume() { return Type< Flow2Graphics::VFlowRenderReconstructionVolume >( 3 ); }
 
   ZEK::VFlowStateRef State;
   int Fetches = 0;
@@ -94,30 +47,65 @@ protected:
     ++Fetches;
     return State;
   }
+
+private:
+  template < typename TType >
+  TType& Type( std::size_t i_Place )
+  {
+    return dynamic_cast< TType& >( *FlowRenderTypes().at( i_Place ) );
+  }
+};
+
+/// A view of a scene in a context of its own.
+class VFrame
+{
+public:
+  explicit VFrame( std::shared_ptr< VScene > i_pScene, QSize i_Size = { 480, 270 } )
+    : m_Size( i_Size )
+    , m_Frame( std::move( i_pScene ), std::make_shared< CoreGraphics::VCameraController >() )
+  {
+  }
+  MoxelGraphics::VSceneFrame& Frame() { return m_Frame; }
+  QImage Draw()
+  {
+    const QImage Picture = m_Offscreen.Draw( m_Frame, m_Size );
+    EXPECT_TRUE( m_Offscreen.bDrawn );
+    return Picture;
+  }
+  /// The pixel that shows a place.
+  QPoint Screen( const QVector3D& i_rPlace )
+  {
+    const CoreGraphics::VCameraFields& rCamera = m_Frame.Controller().Fields();
+    const QVector3D Clip = ( rCamera.projection * rCamera.view ).map( i_rPlace );
+    return QPointF( ( static_cast< qreal >( Clip.x() ) + 1 ) * m_Size.width() / 2,
+                    ( 1 - static_cast< qreal >( Clip.y() ) ) * m_Size.height() / 2 )
+        .toPoint();
+  }
+
+private:
+  QSize m_Size;
+  MoxelGraphics::VOffscreen m_Offscreen;
+  MoxelGraphics::VSceneFrame m_Frame;
 };
 
 /// Makes states from values.
 class VMaker
 {
 public:
-  ZEK::VFlowStateRef State( std::int64_t i_Frame = 0 )
+  ZEK::VFlowStateRef State( std::int64_t i_Frame = 0, const std::vector< ZEK::VFlowItemRef >& i_rItems = {} )
   {
     ZEK::VFlowStateRef State;
     (void)m_Factory->CreateState( State, { i_Frame, 1, 1 }, {}, {} );
+    for ( const ZEK::VFlowItemRef& rItem : i_rItems )
+    {
+      State->AddItem( rItem );
+    }
     return State;
   }
 
-  /// A device's item, named by its URN.
   template < typename TFlow >
-  ZEK::VFlowItemRef Device( const typename ZEK::FlowValueType< TFlow >::type& i_rValue, const std::string& i_rURN )
-  {
-    const ZEK::VFlowItemRef Made = Item< TFlow >( i_rValue );
-    Made->MutableValue().SetName( ZEK::EFlowNameDevice, i_rURN );
-    return Made;
-  }
-
-  template < typename TFlow >
-  ZEK::VFlowItemRef Item( const typename ZEK::FlowValueType< TFlow >::type& i_rValue, const std::string& i_rName = {} )
+  ZEK::VFlowItemRef Item( const typename ZEK::FlowValueType< TFlow >::type& i_rValue, const std::string& i_rName = {},
+                          ZEK::EFlowName i_Selector = ZEK::EFlowNameObject )
   {
     ZEK::IResult Status;
     ZEK::VFlowItemRef Item;
@@ -125,9 +113,16 @@ public:
     *ZEK::FlowMutablePayload< typename ZEK::FlowValueType< TFlow >::type >( Item.Get() ) = i_rValue;
     if ( !i_rName.empty() )
     {
-      Item->MutableValue().SetName( ZEK::EFlowNameObject, i_rName );
+      Item->MutableValue().SetName( i_Selector, i_rName );
     }
     return Item;
+  }
+
+  /// A device's item, named by its URN.
+  template < typename TFlow >
+  ZEK::VFlowItemRef Device( const typename ZEK::FlowValueType< TFlow >::type& i_rValue, const std::string& i_rURN )
+  {
+    return Item< TFlow >( i_rValue, i_rURN, ZEK::EFlowNameDevice );
   }
 
   ZEK::VFlowItemRef Points( std::size_t i_Count )

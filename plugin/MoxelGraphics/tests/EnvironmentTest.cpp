@@ -28,11 +28,11 @@ public:
     m_RenderList = { pFloor, pPlates, pPoints, pAssignments, pVolume };
   }
 
-  std::shared_ptr< VRenderFloorGrid > pFloor;
-  std::shared_ptr< VRenderForcePlates > pPlates;
-  std::shared_ptr< VRenderReconstructions > pPoints;
-  std::shared_ptr< VRenderCentroidAssignments > pAssignments;
-  std::shared_ptr< VRenderReconstructionVolume > pVolume;
+  const std::shared_ptr< VRenderFloorGrid > pFloor;
+  const std::shared_ptr< VRenderForcePlates > pPlates;
+  const std::shared_ptr< VRenderReconstructions > pPoints;
+  const std::shared_ptr< VRenderCentroidAssignments > pAssignments;
+  const std::shared_ptr< VRenderReconstructionVolume > pVolume;
 };
 
 using VPlace = std::array< double, 3 >;
@@ -42,227 +42,167 @@ VPlace YUp( const VPlace& i_rPlace )
 {
   return { i_rPlace[0], i_rPlace[2], -i_rPlace[1] };
 }
-
-std::array< float, 3 > ToFloat( const VPlace& i_rPlace )
+std::array< float, 3 > Floats( const VPlace& i_rPlace )
 {
-  return { static_cast< float >( i_rPlace[0] ), static_cast< float >( i_rPlace[1] ),
-           static_cast< float >( i_rPlace[2] ) };
+  return { float( i_rPlace[0] ), float( i_rPlace[1] ), float( i_rPlace[2] ) };
+}
+QPoint Seen( const VPlace& i_rPlace )
+{
+  const auto [X, Y, Z] = Floats( i_rPlace );
+  return Pixel( { X, Y, Z, 0 } );
+}
+/// On the floor, so far along the way from a middle to a corner.
+VPlace Along( const VPlace& i_rMiddle, const VPlace& i_rCorner, double i_Share )
+{
+  return { i_rMiddle[0] + ( i_rCorner[0] - i_rMiddle[0] ) * i_Share,
+           i_rMiddle[1] + ( i_rCorner[1] - i_rMiddle[1] ) * i_Share, 0 };
+}
+/// The greatest distance between two pictures at a place and its eight neighbours: a line lies on one of them.
+int Change( const QImage& i_rA, const QImage& i_rB, const VPlace& i_rPlace )
+{
+  int Greatest = 0;
+  for ( int Offset = 0; Offset < 9; ++Offset )
+  {
+    const QPoint Place = Seen( i_rPlace ) + QPoint( Offset % 3 - 1, Offset / 3 - 1 );
+    Greatest = std::max( Greatest, Distance( i_rA.pixel( Place ), i_rB.pixel( Place ) ) );
+  }
+  return Greatest;
+}
+/// By how much red outdoes a channel: 1 green, 2 blue.
+int Redness( const QImage& i_rPicture, const VPlace& i_rPlace, int i_Channel )
+{
+  const QRgb Colour = i_rPicture.pixel( Seen( i_rPlace ) );
+  return qRed( Colour ) - ( i_Channel == 1 ? qGreen( Colour ) : qBlue( Colour ) );
 }
 
-class VEnvironmentTest : public testing::Test
+class VEnvironmentTest : public VSceneTest< VEnvironmentScene >
 {
 protected:
-  VEnvironmentTest()
-  {
-    InitShaders();
-    rOptions.GlobalAxis = false;
-  }
-  ~VEnvironmentTest() override
-  {
-    Offscreen.MakeCurrent();
-    pFrame.reset();
-  }
-
-  QImage Draw() { return Offscreen.Draw( *pFrame, Size ); }
-  static QRgb At( const QImage& i_rPicture, const VPlace& i_rPlace )
-  {
-    const std::array< float, 3 > Place = ToFloat( i_rPlace );
-    return i_rPicture.pixel( ScreenPoint( { Place[0], Place[1], Place[2], 0 }, Size ).toPoint() );
-  }
-
-  /// The greatest distance between two pictures at a place and its eight neighbours: a line lies on one of them.
-  static int Change( const QImage& i_rA, const QImage& i_rB, const VPlace& i_rPlace )
-  {
-    const std::array< float, 3 > Place = ToFloat( i_rPlace );
-    const QPoint Middle = ScreenPoint( { Place[0], Place[1], Place[2], 0 }, Size ).toPoint();
-    int Greatest = 0;
-    for ( int Offset = 0; Offset < 9; ++Offset )
-    {
-      const QPoint Point = Middle + QPoint( Offset % 3 - 1, Offset / 3 - 1 );
-      Greatest = std::max( Greatest, Distance( i_rA.pixel( Point ), i_rB.pixel( Point ) ) );
-    }
-    return Greatest;
-  }
-
-  VOffscreen Offscreen;
-  std::shared_ptr< VEnvironmentScene > pScene = std::make_shared< VEnvironmentScene >();
-  std::unique_ptr< VSceneFrame > pFrame =
-      std::make_unique< VSceneFrame >( pScene, std::make_shared< CoreGraphics::VCameraController >() );
-  VSceneOptions& rOptions = pFrame->Input().Options;
+  VEnvironmentTest() { Options().GlobalAxis = false; }
 };
-
-bool IsArrow( QRgb i_Pixel )
-{
-  return qRed( i_Pixel ) > qGreen( i_Pixel ) + 25 && qRed( i_Pixel ) > qBlue( i_Pixel ) + 25;
-}
 } // namespace
 
 TEST_F( VEnvironmentTest, PlatesAndTheirArrowStandWhereTheyShouldWithEitherAxisUp )
 {
   const std::array< VPlace, 4 > Corners{ { { 900, 500, 0 }, { 900, -300, 0 }, { -100, -300, 0 }, { -100, 500, 0 } } };
-  const VPlace Centre{ 600, 300, 0 };
-  for ( const bool bYUp : { false, true } )
+  const VPlace Centre{ 600, 300, 0 }, Middle{ 400, 100, 0 };
+  for ( const int Case : { 0, 1, 2, 3 } )
   {
-    for ( const bool bOtherWay : { false, true } )
+    const bool bYUp = Case / 2 == 1, bOtherWay = Case % 2 == 1;
+    SCOPED_TRACE( testing::Message() << "y up " << bYUp << ", corners the other way about " << bOtherWay );
+    pScene->SetYUp( bYUp );
+    pScene->pPlates->SetPlates( {} );
+    const QImage Without = Draw();
+    std::array< VPlace, 4 > Given = Corners;
+    VPlateLoad Load{ { 100, 0, 800 }, Floats( Centre ) };
+    if ( bOtherWay )
     {
-      SCOPED_TRACE( testing::Message() << "y up " << bYUp << ", corners the other way about " << bOtherWay );
-      pScene->SetYUp( bYUp );
-      pScene->pPlates->SetPlates( {} );
-      const QImage Without = Draw();
-      std::array< VPlace, 4 > Given = Corners;
-      if ( bOtherWay )
-      {
-        std::reverse( Given.begin(), Given.end() );
-      }
-      VPlateLoad Load{ { 100, 0, 800 }, ToFloat( Centre ) };
-      VPlace Tip{ 650, 300, 400 };
-      if ( bYUp )
-      {
-        std::transform( Given.begin(), Given.end(), Given.begin(), YUp );
-        Load = { { 100, 800, 0 }, ToFloat( YUp( Centre ) ) };
-      }
-      VForcePlate Plate;
-      Plate.Colour = 0xFF4000C0;
-      ASSERT_TRUE( VRenderForcePlates::MakeModel( Given, 50, bYUp, Plate.Model ) );
-      pScene->pPlates->SetPlates( { &Plate, 1 } );
-      const QImage Bare = Draw();
-      for ( const VPlace& rCorner : Corners )
-      {
-        const auto Along = [&]( double i_Share )
-        {
-          return VPlace{ 400 + ( rCorner[0] - 400 ) * i_Share, 100 + ( rCorner[1] - 100 ) * i_Share, 0 };
-        };
-        EXPECT_GT( qRed( At( Bare, Along( 0.94 ) ) ), qGreen( At( Bare, Along( 0.94 ) ) ) + 60 ) << rCorner[0];
-        // The near corner stands before the plate's own side.
-        EXPECT_TRUE( rCorner[0] < 0 && rCorner[1] < 0
-                         ? true
-                         : Distance( At( Bare, Along( 1.08 ) ), At( Without, Along( 1.08 ) ) ) < 8 )
-            << rCorner[0] << ", " << rCorner[1];
-      }
-      pScene->pPlates->SetLoads( { &Load, 1 } );
-      const QImage Loaded = Draw();
-      for ( const double Share : { 0.02, 0.5, 0.95 } )
-      {
-        const VPlace Place{ Centre[0] + ( Tip[0] - Centre[0] ) * Share, 300, Tip[2] * Share };
-        EXPECT_TRUE( IsArrow( At( Loaded, Place ) ) ) << Share;
-        EXPECT_NE( At( Loaded, Place ), At( Bare, Place ) );
-      }
-      EXPECT_EQ( At( Loaded, { 657, 300, 450 } ), At( Bare, { 657, 300, 450 } ) ) << "past the tip";
-      // The lines of the cross are thinner than a pixel here and show as dots.
-      int Dots[2] = {};
-      for ( int Step = 0; Step < 40; ++Step )
-      {
-        Dots[0] += Change( Loaded, Bare, { 12.0 * Step, 300, 0 } ) > 20;
-        Dots[1] += Change( Loaded, Bare, { 600, 10.0 * Step - 250, 0 } ) > 20;
-      }
-      EXPECT_GT( std::min( Dots[0], Dots[1] ), 15 );
-      EXPECT_EQ( At( Loaded, { 100, -100, 0 } ), At( Bare, { 100, -100, 0 } ) );
-      // A load that is none, or no number, shows the bare plate.
-      const VPlateLoad None[] = { { { 0, 0, 25 }, Load.Centre },
-                                  { { 0, NaN, 800 }, Load.Centre },
-                                  { { 0, 0, Infinity }, Load.Centre },
-                                  { { 0, 0, 800 }, { 600, NaN, 0 } } };
-      for ( const VPlateLoad& rNone : None )
-      {
-        pScene->pPlates->SetLoads( { &rNone, 1 } );
-        EXPECT_EQ( Draw(), Bare );
-      }
+      std::reverse( Given.begin(), Given.end() );
     }
-  }
-}
-
-TEST_F( VEnvironmentTest, CornersThatAreNoPlateAreRefused )
-{
-  const std::array< VPlace, 4 > Good{ { { 1, 1, 0 }, { 1, -1, 0 }, { -1, -1, 0 }, { -1, 1, 0 } } };
-  std::array< float, 16 > Model{};
-  ASSERT_TRUE( VRenderForcePlates::MakeModel( Good, 50, false, Model ) );
-  const auto Before = Model;
-  for ( const double Bad : { std::nan( "" ), -HUGE_VAL, HUGE_VAL, 1e12 } )
-  {
-    for ( std::size_t Corner = 0; Corner < 4; ++Corner )
+    if ( bYUp )
     {
-      auto Corners = Good;
-      Corners[Corner][Corner % 3] = Bad;
-      EXPECT_FALSE( VRenderForcePlates::MakeModel( Corners, 50, false, Model ) ) << Bad;
+      std::transform( Given.begin(), Given.end(), Given.begin(), YUp );
+      Load = { { 100, 800, 0 }, Floats( YUp( Centre ) ) };
     }
-  }
-  EXPECT_FALSE( VRenderForcePlates::MakeModel( { Good[0], Good[0], Good[0], Good[0] }, 50, false, Model ) );
-  EXPECT_FALSE( VRenderForcePlates::MakeModel( { Good[0], Good[0], Good[2], Good[2] }, 50, false, Model ) );
-  EXPECT_EQ( Model, Before );
-  for ( const double Thickness : { std::nan( "" ), HUGE_VAL, 0.0, -5.0 } )
-  {
-    ASSERT_TRUE( VRenderForcePlates::MakeModel( Good, Thickness, false, Model ) );
-    EXPECT_TRUE( std::isfinite( Model[10] ) && Model[10] > 0 );
+    VForcePlate Plate;
+    Plate.Colour = 0xFF4000C0;
+    ASSERT_TRUE( VRenderForcePlates::MakeModel( Given, 50, bYUp, Plate.Model ) );
+    pScene->pPlates->SetPlates( { &Plate, 1 } );
+    const QImage Bare = Draw();
+    for ( const VPlace& rCorner : Corners )
+    {
+      EXPECT_GT( Redness( Bare, Along( Middle, rCorner, 0.94 ), 1 ), 60 ) << rCorner[0] << ", " << rCorner[1];
+      // The near corner stands before the plate's own side.
+      const QPoint Outside = Seen( Along( Middle, rCorner, 1.08 ) );
+      const bool bNear = rCorner[0] < 0 && rCorner[1] < 0;
+      EXPECT_TRUE( bNear || Distance( Bare.pixel( Outside ), Without.pixel( Outside ) ) < 8 ) << rCorner[0];
+    }
+    pScene->pPlates->SetLoads( { &Load, 1 } );
+    const QImage Loaded = Draw();
+    for ( const double Share : { 0.02, 0.5, 0.95 } )
+    {
+      const VPlace Place{ 600 + 50 * Share, 300, 400 * Share };
+      EXPECT_GT( std::min( Redness( Loaded, Place, 1 ), Redness( Loaded, Place, 2 ) ), 25 ) << Share;
+      EXPECT_NE( Loaded.pixel( Seen( Place ) ), Bare.pixel( Seen( Place ) ) ) << Share;
+    }
+    for ( const VPlace& rPlace : { VPlace{ 657, 300, 450 }, VPlace{ 100, -100, 0 } } ) // past the tip; off the cross
+    {
+      EXPECT_EQ( Loaded.pixel( Seen( rPlace ) ), Bare.pixel( Seen( rPlace ) ) ) << rPlace[0];
+    }
+    // The lines of the cross are thinner than a pixel here and show as dots.
+    int Dots[2] = {};
+    for ( int Step = 0; Step < 40; ++Step )
+    {
+      Dots[0] += Change( Loaded, Bare, { 12.0 * Step, 300, 0 } ) > 20;
+      Dots[1] += Change( Loaded, Bare, { 600, 10.0 * Step - 250, 0 } ) > 20;
+    }
+    EXPECT_GT( std::min( Dots[0], Dots[1] ), 15 );
+    // A load that is none, or no number, shows the bare plate.
+    for ( const VPlateLoad& rNone :
+          { VPlateLoad{ { 0, 0, 25 }, Load.Centre }, VPlateLoad{ { 0, NaN, 800 }, Load.Centre },
+            VPlateLoad{ { 0, 0, Infinity }, Load.Centre }, VPlateLoad{ { 0, 0, 800 }, { 600, NaN, 0 } } } )
+    {
+      pScene->pPlates->SetLoads( { &rNone, 1 } );
+      EXPECT_EQ( Draw(), Bare );
+    }
   }
 }
 
 TEST_F( VEnvironmentTest, ManyPlatesAreOneDrawAndOneUpload )
 {
-  std::vector< VForcePlate > Plates;
-  const auto Fill = [&]( int i_Count )
+  const VFrameFigures& rFigures = pFrame->Figures();
+  const auto DrawPlates = [&]( std::size_t i_Count )
   {
-    Plates.clear();
-    for ( int Index = 0; Index < i_Count; ++Index )
+    std::vector< VForcePlate > Plates( i_Count );
+    for ( std::size_t Index = 0; Index < i_Count; ++Index )
     {
-      const double X = Index % 100 * 50 - 2500, Y = Index / 100 * 50 - 2500;
-      VForcePlate& rPlate = Plates.emplace_back();
-      rPlate.Colour = 0xFF808080;
+      const double X = double( Index % 100 ) * 50 - 2500, Y = double( Index / 100 ) * 50 - 2500;
       VRenderForcePlates::MakeModel( { { { X, Y, 0 }, { X + 40, Y, 0 }, { X + 40, Y + 40, 0 }, { X, Y + 40, 0 } } }, 10,
-                                     false, rPlate.Model );
+                                     false, Plates[Index].Model );
     }
     pScene->pPlates->SetPlates( Plates );
+    Draw();
+    return rFigures.DrawCalls;
   };
-  Fill( 10 );
-  Draw();
-  const std::uint64_t Calls = pFrame->Figures().DrawCalls;
-  Fill( 10000 );
-  Draw();
-  EXPECT_EQ( pFrame->Figures().DrawCalls, Calls );
-  EXPECT_EQ( pFrame->Figures().BytesUploaded, 10000u * sizeof( VForcePlate ) );
+  const std::uint64_t Calls = DrawPlates( 10 );
+  EXPECT_EQ( DrawPlates( 10000 ), Calls );
+  EXPECT_EQ( rFigures.BytesUploaded, 10000u * sizeof( VForcePlate ) );
   std::vector< VPlateLoad > Loads( 10000 );
   Loads[0] = { { 0, 0, 500 }, { -2480, -2480, 0 } };
   Loads[4000] = { { 0, 0, 500 }, { -2480, -480, 0 } };
-  pScene->pPlates->SetLoads( Loads );
-  Draw();
-  pScene->pPlates->SetLoads( Loads );
-  Draw();
-  EXPECT_EQ( pFrame->Figures().DrawCalls, Calls + 4 ) << "two loaded plates, the plates between them, the arrows";
-  EXPECT_EQ( pFrame->Figures().BytesUploaded, 2 * sizeof( VForcePlate ) );
+  for ( int Time = 0; Time < 2; ++Time )
+  {
+    pScene->pPlates->SetLoads( Loads );
+    Draw();
+  }
+  EXPECT_EQ( rFigures.DrawCalls, Calls + 4 ) << "two loaded plates, the plates between them, the arrows";
+  EXPECT_EQ( rFigures.BytesUploaded, 2 * sizeof( VForcePlate ) );
   pScene->pPlates->SetIds( 1, {} );
   Draw();
-  EXPECT_EQ( pFrame->Figures().BytesUploaded, 0u );
+  EXPECT_EQ( rFigures.BytesUploaded, 0u );
   // What a pick has found gives way to what lies behind it.
-  VFrameInput& rInput = pFrame->Input();
-  rInput.PickMode = EPickHover;
-  rInput.Pointer = ScreenPoint( { -2480, -480, 0, 0 }, Size ).toPoint();
-  Draw();
-  EXPECT_EQ( pFrame->Result().Ids, std::vector< std::uint32_t >{ 4001 } );
-  rInput.PickMode = EPickBandDone;
-  rInput.BandStart = { 0, 0 };
-  rInput.Pointer = { Size.width(), Size.height() };
-  Draw();
-  EXPECT_GT( pFrame->Result().Ids.size(), 8000u ) << "a plate of less than a pixel may hide";
+  EXPECT_EQ( Pick( Seen( { -2480, -480, 0 } ) ), VIds{ 4001 } );
+  EXPECT_GT( Band( { 0, 0 }, { 640, 360 } ).size(), 8000u ) << "a plate of less than a pixel may hide";
 }
 
 TEST_F( VEnvironmentTest, TheVolumeIsABoxOfEdgesAndAVeil )
 {
-  rOptions.FloorGrid = false;
+  Options().FloorGrid = false;
   const QImage Empty = Draw();
-  pScene->pVolume->SetVolume( { 500, -1500, 0 }, { -1000, 800, 1200 } );
-  EXPECT_EQ( pScene->pVolume->Minimum(), ( std::array< float, 3 >{ -1000, -1500, 0 } ) );
+  pScene->pVolume->SetVolume( { 500, -1500, 0 }, { -1000, 800, 1200 } ); // corners in any order
   const QImage Shown = Draw();
-  const VPlace EdgeMiddles[] = { { 500, -350, 1200 }, { -1000, -350, 0 }, { -250, -1500, 1200 }, { 500, -1500, 600 } };
-  for ( const VPlace& rPlace : EdgeMiddles )
+  for ( const VPlace& rMiddle : { VPlace{ 500, -350, 1200 }, VPlace{ -1000, -350, 0 }, VPlace{ -250, -1500, 1200 },
+                                  VPlace{ 500, -1500, 600 } } ) // of edges
   {
-    EXPECT_NEAR( Change( Shown, Empty, rPlace ), 128 - qGreen( Background ), 4 ) << rPlace[0] << ", " << rPlace[1];
+    EXPECT_NEAR( Change( Shown, Empty, rMiddle ), 128 - qGreen( Background ), 4 ) << rMiddle[0] << ", " << rMiddle[1];
   }
   // Inside lie a near and a far wall.
-  const int Veil = qGreen( At( Shown, { -250, -350, 400 } ) );
+  const int Veil = qGreen( Shown.pixel( Seen( { -250, -350, 400 } ) ) );
   EXPECT_GT( Veil, qGreen( Background ) + 2 );
   EXPECT_LT( Veil, 100 );
-  rOptions.ReconstructionVolume = false;
+  Options().ReconstructionVolume = false;
   EXPECT_EQ( Draw(), Empty );
-  rOptions.ReconstructionVolume = true;
+  Options().ReconstructionVolume = true;
   for ( const float Bad : { NaN, Infinity, 1e20F, -1000.0F } )
   {
     pScene->pVolume->SetVolume( { -1000, 0, 0 }, { Bad, 800, 1200 } );
@@ -272,54 +212,48 @@ TEST_F( VEnvironmentTest, TheVolumeIsABoxOfEdgesAndAVeil )
 
 TEST_F( VEnvironmentTest, AssignmentsFollowTheirModeAndSkipWhatIsNotThere )
 {
-  rOptions.FloorGrid = false;
-  const auto Fill = [&]( std::uint32_t i_Camera, std::uint32_t i_Point )
-  {
-    auto& rCameras = pScene->pAssignments->Cameras();
-    rCameras.resize( 3 );
-    constexpr std::uint32_t None = VRenderCentroidAssignments::NoReconstruction;
-    rCameras[0] = { { 2000, 0, 0 }, i_Camera, { 0, None, 1, 7 } };
-    rCameras[1] = { { 0, -2000, 0 }, 0, { 1 } };
-    rCameras[2] = { { NaN, 0, 0 }, 1, { 0, 1 } };
-    const VAssignedReconstruction Points[] = { { { 0, 0, 500 }, 0 }, { { 0, 0, 1000 }, i_Point } };
-    pScene->pAssignments->SetReconstructions( Points );
-  };
+  Options().FloorGrid = false;
+  VRenderCentroidAssignments& rTested = *pScene->pAssignments;
   struct VCase
   {
-    std::uint32_t Camera, Point;
+    std::uint32_t First, Second, Last; // selected cameras, and the second point
+    std::uint32_t Point;
     std::array< std::size_t, 5 > Lines; // by mode
   };
-  // Camera 0 sees both points, camera 1 the second; a camera without a place sees nothing, though it is selected.
-  const VCase Cases[] = { { 1, 1, { 0, 2, 2, 3, 1 } }, { 0, 1, { 0, 2, 0, 2, 0 } }, { 1, 0, { 0, 0, 2, 2, 0 } } };
+  // Camera 0 sees both points, camera 1 the second; a camera without a place sees nothing, though it is selected. With
+  // nothing selected the union shows all.
+  const VCase Cases[] = { { 1, 0, 1, 1, { 0, 2, 2, 3, 1 } },
+                          { 0, 0, 1, 1, { 0, 2, 0, 2, 0 } },
+                          { 1, 0, 1, 0, { 0, 0, 2, 2, 0 } },
+                          { 0, 0, 0, 0, { 0, 0, 0, 3, 0 } } };
   for ( const VCase& rCase : Cases )
   {
-    Fill( rCase.Camera, rCase.Point );
+    constexpr std::uint32_t None = VRenderCentroidAssignments::NoReconstruction;
+    rTested.Cameras().resize( 3 );
+    rTested.Cameras()[0] = { { 2000, 0, 0 }, rCase.First, { 0, None, 1, 7 } };
+    rTested.Cameras()[1] = { { 0, -2000, 0 }, rCase.Second, { 1 } };
+    rTested.Cameras()[2] = { { NaN, 0, 0 }, rCase.Last, { 0, 1 } };
+    rTested.SetReconstructions(
+        std::vector< VAssignedReconstruction >{ { { 0, 0, 500 }, 0 }, { { 0, 0, 1000 }, rCase.Point } } );
     for ( int Mode = ENone; Mode <= EIntersection; ++Mode )
     {
-      EXPECT_EQ( pScene->pAssignments->Lines( Mode ).size(), rCase.Lines[static_cast< std::size_t >( Mode )] * 6 )
-          << rCase.Camera << rCase.Point << " mode " << Mode;
+      EXPECT_EQ( rTested.Lines( Mode ).size(), rCase.Lines[static_cast< std::size_t >( Mode )] * 6 )
+          << "case " << &rCase - Cases << " mode " << Mode;
     }
   }
-  pScene->pAssignments->Cameras().pop_back();
-  Fill( 0, 0 );
-  pScene->pAssignments->Cameras()[2].Selected = 0;
-  pScene->pAssignments->SetReconstructions( std::vector< VAssignedReconstruction >( 2, { { 0, 0, 500 }, 0 } ) );
-  EXPECT_EQ( pScene->pAssignments->Lines( EUnion ).size(), 3u * 6 ) << "nothing selected: all";
-
   const QImage Empty = Draw();
-  rOptions.ContributionsType = EUnion;
-  const QImage Shown = Draw();
-  EXPECT_GT( Change( Shown, Empty, { 1000, 0, 250 } ), 20 );
+  Options().ContributionsType = EUnion;
+  EXPECT_GT( Change( Draw(), Empty, { 1000, 0, 250 } ), 20 );
   Draw();
   EXPECT_EQ( pFrame->Figures().BytesUploaded, 0u );
-  rOptions.ContributionsType = EIntersection;
+  Options().ContributionsType = EIntersection;
   EXPECT_EQ( Draw(), Empty );
 }
 
 TEST_F( VEnvironmentTest, ResidualsColourPointsWithALegendWhileTheOptionIsOn )
 {
-  const VScenePoint Places[] = { { 0, 0, 0, 7 }, { 1000, 0, 0, 7 }, { 0, 1000, 0, 7 }, { -1000, 0, 0, 7 } };
   const VPlace Cool{ 0, 0, 0 }, Warm{ 1000, 0, 0 }, None{ 0, 1000, 0 }, Labelled{ 0, -1000, 0 };
+  const VScenePoint Places[] = { { 0, 0, 0, 7 }, { 1000, 0, 0, 7 }, { 0, 1000, 0, 7 }, { -1000, 0, 0, 7 } };
   const VScenePoint Other[] = { { 0, -1000, 0, 7 } };
   const float Residuals[] = { 0.1F, 5.0F, 0.0F, NaN }, OtherResiduals[] = { 1.0F };
   const std::uint32_t Colours[] = { 0xFF00FF00 };
@@ -328,24 +262,23 @@ TEST_F( VEnvironmentTest, ResidualsColourPointsWithALegendWhileTheOptionIsOn )
   pScene->pPoints->SetLabelled( Other );
   pScene->pPoints->SetLabelledColours( Colours );
   pScene->pPoints->SetLabelledResiduals( OtherResiduals );
-  rOptions.ReconstructionScale = 12;
+  Options().ReconstructionScale = 12;
   const QImage Usual = Draw();
-  EXPECT_GT( qGreen( At( Usual, Labelled ) ), qRed( At( Usual, Labelled ) ) + 60 );
-  EXPECT_EQ( At( Usual, Cool ), At( Usual, Warm ) );
-  rOptions.ReconstructionResiduals = true;
+  EXPECT_LT( Redness( Usual, Labelled, 1 ), -60 );
+  EXPECT_EQ( Usual.pixel( Seen( Cool ) ), Usual.pixel( Seen( Warm ) ) );
+  Options().ReconstructionResiduals = true;
   const QImage Coloured = Draw();
-  EXPECT_GT( qBlue( At( Coloured, Cool ) ), qRed( At( Coloured, Cool ) ) + 40 );
-  EXPECT_GT( qRed( At( Coloured, Warm ) ), qBlue( At( Coloured, Warm ) ) + 60 );
-  EXPECT_LT( std::abs( qRed( At( Coloured, None ) ) - qBlue( At( Coloured, None ) ) ), 12 );
-  EXPECT_GT( qRed( At( Coloured, Labelled ) ), qBlue( At( Coloured, Labelled ) ) + 30 );
-  const QRect Legend( Size.width() - 208, Size.height() - 74, 196, 62 );
-  EXPECT_NE( Coloured.copy( Legend ), Usual.copy( Legend ) );
-  const QPoint Low = Legend.topLeft() + QPoint( 15, 30 ), High = Legend.topLeft() + QPoint( 124, 30 );
-  EXPECT_GT( qBlue( Coloured.pixel( Low ) ), qRed( Coloured.pixel( Low ) ) + 40 );
-  EXPECT_GT( qRed( Coloured.pixel( High ) ), qBlue( Coloured.pixel( High ) ) + 60 );
+  EXPECT_LT( Redness( Coloured, Cool, 2 ), -40 );
+  EXPECT_GT( Redness( Coloured, Warm, 2 ), 60 );
+  EXPECT_LT( std::abs( Redness( Coloured, None, 2 ) ), 12 );
+  EXPECT_GT( Redness( Coloured, Labelled, 2 ), 30 );
+  const QRgb Low = Coloured.pixel( Size.width() - 193, Size.height() - 44 ); // the legend's ends
+  const QRgb High = Coloured.pixel( Size.width() - 84, Size.height() - 44 );
+  EXPECT_GT( qBlue( Low ), qRed( Low ) + 40 );
+  EXPECT_GT( qRed( High ), qBlue( High ) + 60 );
   Draw();
   EXPECT_EQ( pFrame->Figures().BytesUploaded, 0u );
-  rOptions.ReconstructionResiduals = false;
+  Options().ReconstructionResiduals = false;
   EXPECT_EQ( Draw(), Usual );
 }
 
@@ -353,35 +286,31 @@ TEST_F( VEnvironmentTest, TheFloorTakesTheViewsSizeUntilItHasItsOwn )
 {
   const auto Extents = [&]( float i_Size )
   {
-    rOptions.FloorGridSize = i_Size;
+    Options().FloorGridSize = i_Size;
     Draw();
     return pScene->pFloor->GetExtents();
   };
   EXPECT_EQ( Extents( 6 ), ( std::array{ -3000, -3000, 3000, 3000 } ) );
-  EXPECT_EQ( Extents( 9 ), ( std::array{ -4500, -4500, 4500, 4500 } ) );
-  for ( const float Bad : { 0.0F, -1.0F, NaN, Infinity } )
+  for ( const float Edge : { 9.0F, 0.0F, -1.0F, NaN, Infinity } )
   {
-    EXPECT_EQ( Extents( Bad ), ( std::array{ -4500, -4500, 4500, 4500 } ) ) << Bad;
+    EXPECT_EQ( Extents( Edge ), ( std::array{ -4500, -4500, 4500, 4500 } ) ) << Edge;
   }
   pScene->pFloor->SetExtents( { 100, 0, -100, 50 } );
   EXPECT_EQ( Extents( 4 ), ( std::array{ -2000, -2000, 2000, 2000 } ) ) << "no floor has its ends the wrong way round";
-  pScene->pFloor->SetExtents( { -500, -1000, 2000, 700 } );
-  EXPECT_EQ( Extents( 9 ), ( std::array{ -500, -1000, 2000, 700 } ) );
   // The border is where the extents say, whichever axis is up.
   for ( const bool bYUp : { false, true } )
   {
     pScene->SetYUp( bYUp );
-    pScene->pFloor->SetExtents( bYUp ? std::array{ -500, -700, 2000, 1000 } : std::array{ -500, -1000, 2000, 700 } );
+    const auto Own = bYUp ? std::array{ -500, -700, 2000, 1000 } : std::array{ -500, -1000, 2000, 700 };
+    pScene->pFloor->SetExtents( Own );
+    EXPECT_EQ( Extents( 9 ), Own );
     const QImage Picture = Draw();
     for ( const VPlace& rCorner :
           { VPlace{ -500, -1000, 0 }, VPlace{ 2000, -1000, 0 }, VPlace{ 2000, 700, 0 }, VPlace{ -500, 700, 0 } } )
     {
-      const auto Along = [&]( double i_Share )
-      {
-        return VPlace{ 750 + ( rCorner[0] - 750 ) * i_Share, -150 + ( rCorner[1] + 150 ) * i_Share, 0 };
-      };
-      EXPECT_NE( At( Picture, Along( 0.97 ) ), Background ) << rCorner[0];
-      EXPECT_EQ( At( Picture, Along( 1.05 ) ), Background ) << rCorner[0];
+      const VPlace Middle{ 750, -150, 0 };
+      EXPECT_NE( Picture.pixel( Seen( Along( Middle, rCorner, 0.97 ) ) ), Background ) << rCorner[0];
+      EXPECT_EQ( Picture.pixel( Seen( Along( Middle, rCorner, 1.05 ) ) ), Background ) << rCorner[0];
     }
   }
 }

@@ -26,10 +26,6 @@ std::vector< VScenePoint > Person()
   return Points;
 }
 
-QVector4D Placed( const VScenePoint& i_rPoint )
-{
-  return { i_rPoint.X, i_rPoint.Y, i_rPoint.Z, 7 };
-}
 } // namespace
 
 class VGoldenTest : public VFrameTest
@@ -37,14 +33,14 @@ class VGoldenTest : public VFrameTest
 protected:
   VGoldenTest()
   {
-    Show( false );
-    rInput.Options.ReconstructionScale = 4.0f;
+    Stand( false );
+    Options().ReconstructionScale = 4.0f;
     for ( const VScenePoint& rPoint : Points )
     {
-      Focus.push_back( Placed( rPoint ) );
+      Focus.emplace_back( rPoint.X, rPoint.Y, rPoint.Z, 7 );
     }
   }
-  void Show( bool i_bYUp )
+  void Stand( bool i_bYUp )
   {
     pScene->SetYUp( i_bYUp );
     std::vector< VScenePoint > Stood = Points;
@@ -55,37 +51,30 @@ protected:
     pScene->Change( Stood );
   }
   QImage Picture() { return Offscreen.Draw( *pFrame, GoldenSize ); }
-  /// Close enough for the markers of the upper body to be some ten pixels large.
-  void ComeNear()
-  {
-    Picture();
-    pFrame->Controller().SetFocusPoints( std::span( Focus ).first( 2 ), true );
-    rInput.Options.ReconstructionScale = 3.0f;
-  }
   void Mark( ZEK::VSelection i_Selected, ZEK::VSelection i_Preselected )
   {
-    pScene->pSelection->Set( ZEK::ISelectionService::EPrimary, std::move( i_Selected ) );
-    pScene->pSelection->Set( ZEK::ISelectionService::ESecondary, std::move( i_Preselected ) );
+    pScene->Select( std::move( i_Selected ) );
+    pScene->Preselect( std::move( i_Preselected ) );
   }
+  void Expect( const std::string& i_rName ) { EXPECT_TRUE( TestSupport::MatchesGolden( Picture(), i_rName ) ); }
 
   const std::vector< VScenePoint > Points = Person();
   std::vector< QVector4D > Focus;
-  VFrameInput& rInput = pFrame->Input();
 };
 
 TEST_F( VGoldenTest, TheFloorFromAboveAndBelowWithEitherAxisUp )
 {
   for ( const bool bYUp : { false, true } )
   {
-    Show( bYUp );
+    Stand( bYUp );
     const std::string Up = bYUp ? "y-up" : "z-up";
     pFrame->Controller().SetLockPose( {} );
-    EXPECT_TRUE( TestSupport::MatchesGolden( Picture(), "floor-above-" + Up ) );
+    Expect( "floor-above-" + Up );
     // The eye is turned about the right of the view until it lies below the floor.
     QMatrix4x4 Below;
     Below.rotate( 45, QVector3D( 1, bYUp ? 0 : -1, bYUp ? 1 : 0 ) );
     pFrame->Controller().SetLockPose( Below );
-    EXPECT_TRUE( TestSupport::MatchesGolden( Picture(), "floor-below-" + Up ) );
+    Expect( "floor-below-" + Up );
   }
 }
 
@@ -96,28 +85,29 @@ TEST_F( VGoldenTest, EachViewType )
     pFrame->Controller().SetViewType( Type );
     Picture();
     pFrame->Controller().SetFocusPoints( Focus, true );
-    const std::string Name = CoreGraphics::ViewTypeName( Type );
-    EXPECT_TRUE( TestSupport::MatchesGolden( Picture(), "view-" + Name ) );
+    Expect( std::string( "view-" ) + CoreGraphics::ViewTypeName( Type ) );
   }
 }
 
 TEST_F( VGoldenTest, SelectedAndPreselectedWithEachModifier )
 {
-  ComeNear();
+  // Close enough for the markers of the upper body to be some ten pixels large.
+  Picture();
+  pFrame->Controller().SetFocusPoints( std::span( Focus ).first( 2 ), true );
+  Options().ReconstructionScale = 3.0f;
   Mark( { Recon( 0 ), Recon( 6 ), Recon( 18 ) }, {} );
-  EXPECT_TRUE( TestSupport::MatchesGolden( Picture(), "selected" ) );
+  Expect( "selected" );
   const char* const Modifiers[] = { "plain", "shift", "shift-control", "control" };
   Mark( { Recon( 6 ), Recon( 18 ) }, { Recon( 1 ), Recon( 18 ) } );
   for ( int Index = 0; Index < 4; ++Index )
   {
-    rInput.PreselectColour = Index;
-    EXPECT_TRUE( TestSupport::MatchesGolden( Picture(), std::string( "preselected-" ) + Modifiers[Index] ) );
+    Input().PreselectColour = Index;
+    Expect( std::string( "preselected-" ) + Modifiers[Index] );
   }
 }
 
 TEST_F( VGoldenTest, OutlinesOfOneAgainstManyAndWithSamples )
 {
-  pFrame->Controller().SetFocusPoints( Focus, true );
   Picture();
   pFrame->Controller().SetFocusPoints( Focus, true );
   ZEK::VSelection Arm;
@@ -126,7 +116,7 @@ TEST_F( VGoldenTest, OutlinesOfOneAgainstManyAndWithSamples )
     Arm.push_back( Recon( Index ) );
   }
   Mark( Arm, {} );
-  EXPECT_TRUE( TestSupport::MatchesGolden( Picture(), "outlines-arm" ) );
+  Expect( "outlines-arm" );
   const auto pTarget = VSceneFrame::MakeTarget( GoldenSize, true );
   ASSERT_TRUE( pTarget );
   EXPECT_EQ( pTarget->format().samples(), 4 );

@@ -114,14 +114,15 @@ TEST( SceneOptions, ValuesOfAnotherTypeLeaveTheFieldAndAreTakenBack )
 TEST( SceneOptions, WhatQmlAndCommandLinesWriteIsUnderstood )
 {
   VSceneOptions Options;
-  EXPECT_TRUE( SetSceneOption( Options, *FindSceneOption( "FloorGrid" ), "false" ) );
-  EXPECT_FALSE( Options.FloorGrid );
-  EXPECT_TRUE( SetSceneOption( Options, *FindSceneOption( "FloorGrid" ), 1 ) );
-  EXPECT_TRUE( Options.FloorGrid );
-  EXPECT_TRUE( SetSceneOption( Options, *FindSceneOption( "trialLengthPast" ), 12.0 ) );
-  EXPECT_EQ( Options.trialLengthPast, 12 );
-  EXPECT_TRUE( SetSceneOption( Options, *FindSceneOption( "ReconstructionScale" ), "2.5" ) );
-  EXPECT_EQ( Options.ReconstructionScale, 2.5f );
+  const std::tuple< const char*, QVariant, QVariant > Cases[] = { { "FloorGrid", "false", false },
+                                                                  { "FloorGrid", 1, true },
+                                                                  { "trialLengthPast", 12.0, 12 },
+                                                                  { "ReconstructionScale", "2.5", 2.5F } };
+  for ( const auto& [pKey, Written, Read] : Cases )
+  {
+    EXPECT_TRUE( SetSceneOption( Options, *FindSceneOption( pKey ), Written ) );
+    EXPECT_EQ( GetSceneOption( Options, *FindSceneOption( pKey ) ), Read ) << pKey;
+  }
 }
 
 } // namespace MoxelGraphics

@@ -12,7 +12,9 @@
 #include <CoreGraphics/VCameraController.h>
 #include <CoreGraphics/VRenderContext.h>
 #include <CoreGraphics/VResources.h>
+#include <HostServices/VSelectionService.h>
 
+#include <QtCore/QThread>
 #include <QtGui/QImage>
 #include <QtGui/QOffscreenSurface>
 #include <QtGui/QOpenGLContext>
@@ -27,51 +29,13 @@
 namespace MoxelGraphics
 {
 
-class VTestSelection final : public ZEK::ISelectionService
-{
-public:
-  ZEK::VSelection Get( ESet i_Set ) const override
-  {
-    const std::lock_guard Lock( m_Guard );
-    return m_Sets[i_Set];
-  }
-  bool Get( ESet i_Set, const std::vector< std::uint32_t >& i_rKinds, ZEK::VSelection& o_rSelection ) const override
-  {
-    o_rSelection = Get( i_Set );
-    std::erase_if( o_rSelection,
-                   [&]( const ZEK::VSelectionItem& i_rItem )
-                   {
-                     return std::find( i_rKinds.begin(), i_rKinds.end(), i_rItem.Kind ) == i_rKinds.end();
-                   } );
-    return !o_rSelection.empty();
-  }
-  std::uint64_t Generation() const override { return m_Generation; }
-  void Set( ESet i_Set, ZEK::VSelection i_Selection ) override
-  {
-    {
-      const std::lock_guard Lock( m_Guard );
-      if ( m_Sets[i_Set] == i_Selection )
-      {
-        return;
-      }
-      m_Sets[i_Set] = std::move( i_Selection );
-      ++m_Generation;
-    }
-    m_pChanged->Fire();
-  }
-  std::shared_ptr< ZEK::IMultiCallback< void() > > ForKinds( const std::vector< std::uint32_t >& ) override
-  {
-    return m_pChanged;
-  }
-  ZEK::VSelectionItem FromName( const std::string& ) const override { return {}; }
-  std::string Text( const ZEK::VSelectionItem& i_rItem ) const override { return i_rItem.Device; }
+inline constexpr QSize Size( 640, 360 );
 
-private:
-  mutable std::mutex m_Guard;
-  ZEK::VSelection m_Sets[2];
-  std::atomic< std::uint64_t > m_Generation{ 1 };
-  std::shared_ptr< ZEK::VMultiCallback< void() > > m_pChanged = std::make_shared< ZEK::VMultiCallback< void() > >();
-};
+inline void InitShaders()
+{
+  CoreGraphics::InitBasicShaderResources();
+  CoreGraphics::InitSceneShaderResources();
+}
 
 inline ZEK::VSelectionItem Recon( std::uint32_t i_Index )
 {
@@ -104,77 +68,56 @@ public:
   mutable std::atomic< int > Asked{ 0 };
 };
 
-/// Single pixels of the frame, y up: each bears an id in the selection mode, the last of equal places on top.
-class VTestPixels final : public IRenderType
+/// Draws what its function draws.
+class VTestDraw final : public IRenderType
 {
 public:
-  struct VPixel
+  using VFunction = std::function< void( CoreGraphics::VRenderContext&, const VSceneOptions&, std::uint32_t ) >;
+  void Render( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions,
+               std::uint32_t i_Pass ) override
   {
-    int X, Y;
-    std::uint32_t Id;
-  };
-  explicit VTestPixels( const VMoxelScene& i_rScene )
-    : m_rScene( i_rScene )
-  {
-  }
-  void Render( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions&, std::uint32_t i_Pass ) override
-  {
-    const bool bPicking = io_rContext.RenderMode() == ERenderModeSelection;
-    if ( i_Pass != ERenderPassOpaque || !bPicking )
+    if ( Function )
     {
-      return;
+      Function( io_rContext, i_rOptions, i_Pass );
     }
-    const QRect Window = io_rContext.Scissor();
-    for ( const VPixel& rPixel : Pixels )
-    {
-      if ( Window.contains( rPixel.X, rPixel.Y ) && !m_rScene.IgnoreId( rPixel.Id, ERenderModeSelection ) )
-      {
-        io_rContext.SetScissor( { rPixel.X, rPixel.Y, 1, 1 } );
-        io_rContext.SetClearColour(
-            QColor( rPixel.Id & 0xFF, ( rPixel.Id >> 8 ) & 0xFF, ( rPixel.Id >> 16 ) & 0xFF, 1 ) );
-        io_rContext.Clear( true, false );
-      }
-    }
-    io_rContext.SetScissor( Window );
   }
-  std::vector< VPixel > Pixels;
-
-private:
-  const VMoxelScene& m_rScene;
+  VFunction Function;
 };
+
+/// Fills a rectangle of the frame, y up.
+inline void Fill( CoreGraphics::VRenderContext& io_rContext, const QRect& i_rRect, const QColor& i_rColour )
+{
+  const QRect Window = io_rContext.Scissor();
+  io_rContext.SetScissor( i_rRect );
+  io_rContext.SetClearColour( i_rColour );
+  io_rContext.Clear( true, false );
+  io_rContext.SetScissor( Window );
+}
 
 /// A red square of 20 pixels in the lower left corner of the frame.
-class VTestCorner final : public IRenderType
+inline void DrawCorner( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions&, std::uint32_t i_Pass )
 {
-public:
-  void Render( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions&, std::uint32_t i_Pass ) override
+  if ( i_Pass == ERenderPassOverlay && io_rContext.RenderMode() == ERenderModeNormal )
   {
-    if ( i_Pass == ERenderPassOverlay && io_rContext.RenderMode() == ERenderModeNormal && bShown )
-    {
-      const QRect Window = io_rContext.Scissor();
-      io_rContext.SetScissor( { 0, 0, 20, 20 } );
-      io_rContext.SetClearColour( Qt::red );
-      io_rContext.Clear( true, false );
-      io_rContext.SetScissor( Window );
-    }
+    Fill( io_rContext, { 0, 0, 20, 20 }, Qt::red );
   }
-  bool bShown = false;
-};
+}
 
 /// A scene of points on a floor. Points are set on the GUI thread before the first frame, or with `Change`.
 class VTestScene : public VMoxelScene
 {
 public:
-  explicit VTestScene( std::shared_ptr< HarrowPluginInterface::IRenderResources > i_pResources = nullptr )
-    : VTestScene( std::move( i_pResources ), std::make_shared< VTestSelection >() )
+  /// A pixel of the frame, y up, that bears an id in the selection mode; the last of equal places is on top.
+  struct VPixel
   {
-  }
-  VTestScene( std::shared_ptr< HarrowPluginInterface::IRenderResources > i_pResources,
-              std::shared_ptr< VTestSelection > i_pSelection )
-    : VMoxelScene( std::move( i_pResources ), i_pSelection, nullptr, nullptr, false )
-    , pSelection( std::move( i_pSelection ) )
-    , pCorner( std::make_shared< VTestCorner >() )
-    , pPixels( std::make_shared< VTestPixels >( *this ) )
+    int X, Y;
+    std::uint32_t Id;
+  };
+
+  explicit VTestScene( std::shared_ptr< HarrowPluginInterface::IRenderResources > i_pResources = nullptr )
+    : VMoxelScene( std::move( i_pResources ), std::make_shared< HostServices::VSelectionService >(), nullptr, nullptr,
+                   false )
+    , pSelection( SelectionService() )
   {
   }
 
@@ -184,15 +127,21 @@ public:
     ++Initialised;
     if ( m_RenderList.empty() && CanDraw() )
     {
-      pFloor = std::make_shared< VRenderFloorGrid >( Resources() );
+      const auto pPixels = std::make_shared< VTestDraw >();
+      pPixels->Function = [this]( CoreGraphics::VRenderContext& io_rOn, const VSceneOptions&, std::uint32_t i_Pass )
+      {
+        DrawPixels( io_rOn, i_Pass );
+      };
       pRecons = std::make_shared< VRenderReconstructions >( *this );
-      m_RenderList = { pFloor, pRecons, pPixels, pCorner, std::make_shared< VRenderAxis >( Resources() ) };
+      m_RenderList = { std::make_shared< VRenderFloorGrid >( Resources() ), pRecons, pPixels, pExtra,
+                       std::make_shared< VRenderAxis >( Resources() ) };
       pOutlines = std::make_shared< VRenderOutlines >( *this );
-      m_PostList.push_back( pOutlines );
+      m_PostList = { pOutlines, pPost };
     }
   }
   bool ProcessPending() override
   {
+    pThread = QThread::currentThread();
     const bool bRan = VMoxelScene::ProcessPending();
     if ( TakeDirty() && pRecons )
     {
@@ -228,24 +177,43 @@ public:
     }
     MarkDirty();
   }
+  void Select( ZEK::VSelection i_Items ) { pSelection->Set( ZEK::ISelectionService::EPrimary, std::move( i_Items ) ); }
+  void Preselect( ZEK::VSelection i_Items )
+  {
+    pSelection->Set( ZEK::ISelectionService::ESecondary, std::move( i_Items ) );
+  }
 
-  std::shared_ptr< VTestSelection > pSelection;
-  std::shared_ptr< VTestCorner > pCorner;
-  std::shared_ptr< VTestPixels > pPixels;
-  std::shared_ptr< VRenderFloorGrid > pFloor;
+  const std::shared_ptr< ZEK::ISelectionService > pSelection;
+  const std::shared_ptr< VTestDraw > pExtra = std::make_shared< VTestDraw >(); ///< with the world
+  const std::shared_ptr< VTestDraw > pPost = std::make_shared< VTestDraw >();  ///< after the outlines
   std::shared_ptr< VRenderReconstructions > pRecons;
   std::shared_ptr< VRenderOutlines > pOutlines;
+  std::vector< VPixel > Pixels;
   VTestPoints Resolver;
   std::function< void() > BeforePoints; ///< runs after the registry's reset
   std::atomic< int > Initialised{ 0 };
+  std::atomic< QThread* > pThread{ nullptr }; ///< on which the scene was last brought up to date
 
 private:
+  void DrawPixels( CoreGraphics::VRenderContext& io_rContext, std::uint32_t i_Pass ) const
+  {
+    if ( i_Pass != ERenderPassOpaque || io_rContext.RenderMode() != ERenderModeSelection )
+    {
+      return;
+    }
+    for ( const auto& [X, Y, Id] : Pixels )
+    {
+      if ( io_rContext.Scissor().contains( X, Y ) && !IgnoreId( Id, ERenderModeSelection ) )
+      {
+        Fill( io_rContext, { X, Y, 1, 1 }, QColor( Id & 0xFF, ( Id >> 8 ) & 0xFF, ( Id >> 16 ) & 0xFF, 1 ) );
+      }
+    }
+  }
   void Take()
   {
-    if ( m_bNew )
+    if ( std::exchange( m_bNew, false ) )
     {
       Resolver.Points = m_NewPoints;
-      m_bNew = false;
       pRecons->SetReconstructions( Resolver.Points );
     }
     Registry().Reset();
@@ -271,12 +239,13 @@ private:
   std::vector< std::uint8_t > m_Flags;
 };
 
-/// A context of its own, shared with everybody's, and one frame in it.
+/// A context of its own, shared with everybody's, and the frame that is drawn in it.
 class VOffscreen
 {
 public:
   explicit VOffscreen( bool i_bShared = true, const QSurfaceFormat& i_rFormat = QSurfaceFormat::defaultFormat() )
   {
+    InitShaders();
     m_Surface.setFormat( i_rFormat );
     m_Context.setFormat( i_rFormat );
     m_Surface.create();
@@ -288,10 +257,7 @@ public:
     MakeCurrent();
   }
   bool IsES() const { return m_Context.isOpenGLES(); }
-  QSurfaceFormat Format() const { return m_Context.format(); }
   void MakeCurrent() { ASSERT_TRUE( m_Context.makeCurrent( &m_Surface ) ); }
-
-  /// Draws one frame without multisampling and gives what is to be seen.
   QImage Draw( VSceneFrame& io_rFrame, QSize i_Size )
   {
     if ( !m_pTarget || m_pTarget->size() != i_Size )
@@ -313,7 +279,7 @@ private:
 
 /// Where the first pose of the camera shows a point, in pixels from the top left. Written out, so that it does not
 /// lean on the matrices that draw.
-inline QPointF ScreenPoint( const VScenePoint& i_rPoint, QSizeF i_Size )
+inline QPointF ScreenPoint( const VScenePoint& i_rPoint, QSizeF i_Size = Size )
 {
   const double Degree = std::acos( -1.0 ) / 180.0;
   const double Azimuth = 45 * Degree, Tilt = -60 * Degree;
@@ -323,12 +289,6 @@ inline QPointF ScreenPoint( const VScenePoint& i_rPoint, QSizeF i_Size )
   const double Away = 7000 - ( std::sin( Tilt ) * Y + std::cos( Tilt ) * i_rPoint.Z );
   const double Pixels = i_Size.height() / 2 / std::tan( 22.5 * Degree );
   return { i_Size.width() / 2 + X / Away * Pixels, i_Size.height() / 2 - Up / Away * Pixels };
-}
-
-inline void InitShaders()
-{
-  CoreGraphics::InitBasicShaderResources();
-  CoreGraphics::InitSceneShaderResources();
 }
 
 } // namespace MoxelGraphics
