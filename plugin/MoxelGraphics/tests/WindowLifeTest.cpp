@@ -263,7 +263,7 @@ TEST_F( VWindowLife, ViewsOfOneWindowDrawPickAndLoseNoGestureWhileDataArrive )
       std::this_thread::sleep_for( std::chrono::microseconds( Random() % 3000 ) );
     }
   }
-  ASSERT_TRUE( View.Frames( 2 ) );
+  ASSERT_TRUE( View.Frames( 30 ) );
   const QVariantMap Drawn = View.pItem->frameReport()["camera"].toMap();
   const CoreGraphics::VCameraFields& rExpected = Expected.Fields();
   EXPECT_EQ( Drawn["viewType"], CoreGraphics::ViewTypeName( rExpected.viewType ) );
