@@ -1,5 +1,7 @@
 #include <MoxelGraphics/VMoxelScene.h>
 
+
+#include "HandOver.h"
 #include "VGlobalContext.h"
 
 #include <MoxelGraphics/VSceneOptions.h>
@@ -54,6 +56,13 @@ VMoxelScene::~VMoxelScene()
   m_pBackdrop.reset();
   m_RenderList.clear();
   m_pSphereHelper.reset();
+}
+
+bool VMoxelScene::event( QEvent* i_pEvent )
+{
+  // A view that ended on its own thread hands its reference back in an event.
+  TakeOver( this );
+  return QObject::event( i_pEvent );
 }
 
 void VMoxelScene::Initialise( CoreGraphics::VRenderContext& )

@@ -1,5 +1,6 @@
 #include <MoxelGraphics/VSceneFrame.h>
 
+#include "HandOver.h"
 #include "HighlightUnit.h"
 #include "Log.h"
 
@@ -74,8 +75,10 @@ VSceneFrame::~VSceneFrame()
   // A scene is an object of the GUI thread: where this is another one, the last reference must not end here.
   if ( qGuiApp && m_pScene->thread() != QThread::currentThread() )
   {
+    VMoxelScene* const pScene = m_pScene.get();
     QMetaObject::invokeMethod(
-        qGuiApp, [pScene = std::move( m_pScene )] {}, Qt::QueuedConnection );
+        pScene, [pKept = std::move( m_pScene )] {}, Qt::QueuedConnection );
+    HandOver( pScene );
   }
 }
 

@@ -157,6 +157,8 @@ public:
   const std::shared_ptr< ZEK::IPostalService >& PostalService() const { return m_pPostalService; }
   bool DeveloperMode() const { return m_bDeveloperMode; }
 
+  bool event( QEvent* i_pEvent ) override;
+
 signals:
   /// Emitted on the render thread after the render types took a new state.
   void Updated();
