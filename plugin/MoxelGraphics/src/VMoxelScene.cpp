@@ -1,6 +1,5 @@
 #include <MoxelGraphics/VMoxelScene.h>
 
-
 #include "HandOver.h"
 #include "VGlobalContext.h"
 

@@ -93,7 +93,7 @@ void VSceneFramebufferObject::FollowWindow( QQuickWindow* i_pWindow )
                                     i_pWindow, &QQuickWindow::afterAnimating, this,
                                     [this]
                                     {
-                                      HandOver( m_pSynced.get() );
+                                      HandOver( this );
                                     },
                                     Qt::DirectConnection )
                               : QMetaObject::Connection();
@@ -111,7 +111,7 @@ void VSceneFramebufferObject::itemChange( ItemChange i_Change, const ItemChangeD
 bool VSceneFramebufferObject::event( QEvent* i_pEvent )
 {
   // An event may end the item; the place is then no more than a number.
-  const void* const pPlace = m_pSynced.get();
+  const void* const pPlace = this;
   TakeOver( pPlace );
   const bool bTaken = QQuickFramebufferObject::event( i_pEvent );
   HandOver( pPlace );
@@ -125,9 +125,9 @@ QQuickFramebufferObject::Renderer* VSceneFramebufferObject::createRenderer() con
 
 QSGNode* VSceneFramebufferObject::updatePaintNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData )
 {
-  TakeOver( m_pSynced.get() );
+  TakeOver( this );
   QSGNode* const pNode = MakeNode( i_pNode, i_pData );
-  HandOver( m_pSynced.get() );
+  HandOver( this );
   return pNode;
 }
 
@@ -266,6 +266,7 @@ void VSceneFramebufferObject::SetOptions( const VSceneOptions& i_rOptions )
 
 void VSceneFramebufferObject::OnSceneOptionsMapChanged( const QString& i_rKey, const QVariant& )
 {
+  TakeOver( this );
   ReadSceneOptions( *m_pOptionsMap, m_Options );
   if ( m_pScene && i_rKey == QLatin1String( "YUp" ) )
   {
@@ -276,7 +277,7 @@ void VSceneFramebufferObject::OnSceneOptionsMapChanged( const QString& i_rKey, c
 
 QVariantMap VSceneFramebufferObject::frameReport() const
 {
-  TakeOver( m_pSynced.get() );
+  TakeOver( this );
   const VFrameFigures& rFigures = m_pSynced->Figures;
   QVariantMap Report{ { "camera", CameraReport( m_pSynced->Camera ) },
                       { "timings", QVariantMap{ { "update_ms", rFigures.UpdateMs },
@@ -290,7 +291,7 @@ QVariantMap VSceneFramebufferObject::frameReport() const
                       { "labels", Texts( m_PreselectionLabels ) },
                       { "picked_labels", Texts( m_PickedLabels ) },
                       { "notice", m_Notice } };
-  HandOver( m_pSynced.get() );
+  HandOver( this );
   return Report;
 }
 
