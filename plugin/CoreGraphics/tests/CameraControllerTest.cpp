@@ -4,6 +4,7 @@
 #include <CoreGraphics/VInteractionMapper.h>
 
 #include <QtGui/QMouseEvent>
+#include <QtGui/QQuaternion>
 #include <QtGui/QWheelEvent>
 
 #include <cmath>
@@ -13,63 +14,30 @@ using namespace CoreGraphics;
 namespace
 {
 constexpr double Degree = 3.14159265358979323846 / 180.0;
+const QVector3D AxisX( 1, 0, 0 ), AxisY( 0, 1, 0 ), AxisZ( 0, 0, 1 );
 
-struct VPoint
+QVector3D Turned( const QVector3D& i_rPoint, const QVector3D& i_rAxis, float i_Degrees )
 {
-  double X, Y, Z;
-};
-
-// Turns by hand, independent of the matrix class.
-VPoint AboutX( VPoint i_P, double i_Degrees )
-{
-  const double C = std::cos( i_Degrees * Degree ), S = std::sin( i_Degrees * Degree );
-  return { i_P.X, i_P.Y * C - i_P.Z * S, i_P.Y * S + i_P.Z * C };
-}
-VPoint AboutY( VPoint i_P, double i_Degrees )
-{
-  const double C = std::cos( i_Degrees * Degree ), S = std::sin( i_Degrees * Degree );
-  return { i_P.X * C + i_P.Z * S, i_P.Y, -i_P.X * S + i_P.Z * C };
-}
-VPoint AboutZ( VPoint i_P, double i_Degrees )
-{
-  const double C = std::cos( i_Degrees * Degree ), S = std::sin( i_Degrees * Degree );
-  return { i_P.X * C - i_P.Y * S, i_P.X * S + i_P.Y * C, i_P.Z };
+  return QQuaternion::fromAxisAndAngle( i_rAxis, i_Degrees ).rotatedVector( i_rPoint );
 }
 
-// A world point in view space, as the rotations are told: the one named last turns the point first.
-VPoint InView( const VCameraFields& i_rFields, QVector3D i_World )
+// A world point in view space, by turns one after the other.
+QVector3D InView( const VCameraFields& i_rFields, const QVector3D& i_rWorld )
 {
-  VPoint P{ i_World.x() - i_rFields.centre.x(), i_World.y() - i_rFields.centre.y(),
-            i_World.z() - i_rFields.centre.z() };
+  static const std::pair< QVector3D, float > Sides[] = { { AxisX, 0 },  { AxisX, 0 },  { AxisY, 180 }, { AxisY, -90 },
+                                                         { AxisY, 90 }, { AxisX, 90 }, { AxisX, -90 } };
+  const QVector3D Offset = i_rWorld - i_rFields.centre;
   if ( i_rFields.viewType == EViewPerspective )
   {
-    P = i_rFields.yUp ? AboutX( P, 90 ) : P;
-    P = AboutX( AboutZ( P, i_rFields.azimuth ), i_rFields.tilt );
-    return { P.X, P.Y, P.Z - i_rFields.distance };
+    const QVector3D Upright = Turned( Offset, AxisX, i_rFields.yUp ? 90 : 0 );
+    const QVector3D Seen = Turned( Turned( Upright, AxisZ, i_rFields.azimuth ), AxisX, i_rFields.tilt );
+    return Seen - QVector3D( 0, 0, i_rFields.distance );
   }
-  P = i_rFields.yUp ? P : AboutX( AboutZ( P, 180 ), -90 );
-  switch ( i_rFields.viewType )
-  {
-  case EViewBack:
-    P = AboutY( P, 180 );
-    break;
-  case EViewLeft:
-    P = AboutY( P, -90 );
-    break;
-  case EViewRight:
-    P = AboutY( P, 90 );
-    break;
-  case EViewTop:
-    P = AboutX( P, 90 );
-    break;
-  case EViewBottom:
-    P = AboutX( P, -90 );
-    break;
-  default:
-    break;
-  }
-  return { P.X, P.Y, P.Z - i_rFields.farPlane * 0.5 };
+  const QVector3D Upright = i_rFields.yUp ? Offset : Turned( Turned( Offset, AxisZ, 180 ), AxisX, -90 );
+  const auto& [rAxis, Degrees] = Sides[i_rFields.viewType];
+  return Turned( Upright, rAxis, Degrees ) - QVector3D( 0, 0, i_rFields.farPlane * 0.5f );
 }
+} // namespace
 
 class CameraControllerTest : public testing::Test
 {
@@ -81,68 +49,52 @@ public:
   }
   ~CameraControllerTest() override { SetInteractionMapper( nullptr ); }
 
+  static QMouseEvent Mouse( QEvent::Type i_Type, const QPointF& i_rPlace, Qt::MouseButtons i_Buttons )
+  {
+    return { i_Type, i_rPlace, i_rPlace, Qt::LeftButton, i_Buttons, {} };
+  }
   void Press( double i_X, double i_Y, Qt::MouseButtons i_Buttons, double i_Ratio = 1 )
   {
-    const QMouseEvent Event( QEvent::MouseButtonPress, { i_X, i_Y }, { i_X, i_Y }, Qt::LeftButton, i_Buttons, {} );
-    Camera.OnMousePress( Event, i_Ratio );
+    Camera.OnMousePress( Mouse( QEvent::MouseButtonPress, { i_X, i_Y }, i_Buttons ), i_Ratio );
   }
   void Move( double i_X, double i_Y, Qt::MouseButtons i_Buttons, double i_Ratio = 1 )
   {
-    const QMouseEvent Event( QEvent::MouseMove, { i_X, i_Y }, { i_X, i_Y }, Qt::NoButton, i_Buttons, {} );
-    Camera.OnMouseMove( Event, i_Ratio );
+    Camera.OnMouseMove( Mouse( QEvent::MouseMove, { i_X, i_Y }, i_Buttons ), i_Ratio );
   }
   void Release( Qt::MouseButtons i_Buttons )
   {
-    const QMouseEvent Event( QEvent::MouseButtonRelease, QPointF(), QPointF(), Qt::LeftButton, i_Buttons, {} );
-    Camera.OnMouseRelease( Event, 1 );
-  }
-  void Wheel( int i_Delta )
-  {
-    Camera.OnWheel( QWheelEvent( {}, {}, {}, { 0, i_Delta }, {}, {}, Qt::NoScrollPhase, false ) );
+    Camera.OnMouseRelease( Mouse( QEvent::MouseButtonRelease, {}, i_Buttons ), 1 );
   }
   // Where a world point lies on the screen, device pixels from the top left.
-  QPointF Screen( const QVector3D& i_rWorld )
+  QVector2D Screen( const QVector3D& i_rWorld )
   {
     Camera.Step();
-    const VCameraFields& rFields = Camera.Fields();
-    const QVector3D Clip = ( rFields.projection * rFields.view ).map( i_rWorld );
-    return { ( Clip.x() * 0.5 + 0.5 ) * rFields.viewportSize.width(),
-             ( 0.5 - Clip.y() * 0.5 ) * rFields.viewportSize.height() };
+    const QVector3D Clip = ( Fields.projection * Fields.view ).map( i_rWorld );
+    return { ( Clip.x() * 0.5f + 0.5f ) * float( Fields.viewportSize.width() ),
+             ( 0.5f - Clip.y() * 0.5f ) * float( Fields.viewportSize.height() ) };
   }
 
   VCameraController Camera;
+  const VCameraFields& Fields = Camera.Fields();
 };
-} // namespace
 
 TEST_F( CameraControllerTest, TheViewOfEveryTypeAndUpAxis )
 {
-  for ( const bool bYUp : { false, true } )
+  const std::array< QVector4D, 1 > Focus = { QVector4D( 100, -200, 300, 0 ) };
+  for ( int Case = 0; Case < ViewTypeCount * 2; ++Case )
   {
-    for ( int Type = 0; Type < ViewTypeCount; ++Type )
+    const int Type = Case / 2;
+    Camera.SetYUp( Case % 2 );
+    Camera.SetViewType( Type );
+    Camera.SetFocusPoints( Focus, false );
+    Camera.Step();
+    for ( const QVector3D World : { QVector3D( 0, 0, 0 ), QVector3D( 1000, 0, 0 ), QVector3D( 0, 500, 2000 ) } )
     {
-      Camera.SetYUp( bYUp );
-      Camera.SetViewType( Type );
-      const std::array< QVector4D, 1 > Focus = { QVector4D( 100, -200, 300, 0 ) };
-      Camera.SetFocusPoints( Focus, false );
-      Camera.Step();
-      for ( const QVector3D World : { QVector3D( 0, 0, 0 ), QVector3D( 1000, 0, 0 ), QVector3D( 0, 500, 2000 ) } )
-      {
-        const QVector3D Seen = Camera.Fields().view.map( World );
-        const VPoint Wanted = InView( Camera.Fields(), World );
-        EXPECT_NEAR( Seen.x(), Wanted.X, 0.02 ) << ViewTypeName( Type ) << bYUp;
-        EXPECT_NEAR( Seen.y(), Wanted.Y, 0.02 ) << ViewTypeName( Type ) << bYUp;
-        EXPECT_NEAR( Seen.z(), Wanted.Z, 0.02 ) << ViewTypeName( Type ) << bYUp;
-      }
-      // In a view from the side, up in the world is up on the screen.
-      if ( Type < EViewTop )
-      {
-        const QVector3D Up = bYUp ? QVector3D( 0, 1, 0 ) : QVector3D( 0, 0, 1 );
-        EXPECT_LT( Screen( Camera.Fields().centre + Up * 100 ).y(), 299 ) << ViewTypeName( Type ) << bYUp;
-      }
-      const QPointF Middle = Screen( Camera.Fields().centre );
-      EXPECT_NEAR( Middle.x(), 400, 0.01 );
-      EXPECT_NEAR( Middle.y(), 300, 0.01 );
+      EXPECT_LT( ( Fields.view.map( World ) - InView( Fields, World ) ).length(), 0.03f ) << Case;
     }
+    // In a view from the side, up in the world is up on the screen.
+    const QVector3D Up = Fields.yUp ? AxisY : AxisZ;
+    EXPECT_TRUE( Type >= EViewTop || Screen( Fields.centre + Up * 100 ).y() < 299 ) << Case;
   }
   Camera.SetViewType( 99 );
   Camera.SetViewType( -1 );
@@ -153,41 +105,43 @@ TEST_F( CameraControllerTest, TheViewOfEveryTypeAndUpAxis )
 
 TEST_F( CameraControllerTest, ProjectionsFollowSizeTypeAndScale )
 {
-  const auto Near = []( double i_A, double i_B )
-  {
-    return std::abs( i_A - i_B ) < 1e-5 * std::max( 1.0, std::abs( i_B ) );
-  };
   const double Cotangent = 1.0 / std::tan( 22.5 * Degree );
-  EXPECT_TRUE( Near( Camera.Fields().projection( 1, 1 ), Cotangent ) );
-  EXPECT_TRUE( Near( Camera.Fields().projection( 0, 0 ), Cotangent * 600 / 800 ) );
-  Camera.SetViewType( EViewTop );
-  EXPECT_TRUE( Near( Camera.Fields().projection( 0, 0 ), 2.0 / ( 800 * 4.0 ) ) );
-  EXPECT_TRUE( Near( Camera.Fields().projection( 1, 1 ), 2.0 / ( 600 * 4.0 ) ) );
-  Camera.SetSize( { 400, 200 } );
-  EXPECT_TRUE( Near( Camera.Fields().projection( 1, 1 ), 2.0 / ( 200 * 4.0 ) ) );
-  Camera.SetViewType( EViewPerspective );
-  Camera.SetSize( { 400, 0 } );
-  EXPECT_TRUE( std::isfinite( Camera.Fields().projection( 0, 0 ) ) );
+  const std::tuple< int, QSize, double, double > Cases[] = {
+      { EViewPerspective, { 400, 0 }, Cotangent / 400, Cotangent },
+      { EViewPerspective, { 800, 600 }, Cotangent * 600 / 800, Cotangent },
+      { EViewTop, { 800, 600 }, 2.0 / ( 800 * 4.0 ), 2.0 / ( 600 * 4.0 ) },
+      { EViewTop, { 400, 200 }, 2.0 / ( 400 * 4.0 ), 2.0 / ( 200 * 4.0 ) } };
+  for ( const auto& [Type, Size, X, Y] : Cases )
+  {
+    Camera.SetViewType( Type );
+    Camera.SetSize( Size );
+    EXPECT_NEAR( Fields.projection( 0, 0 ), X, X * 1e-5 );
+    EXPECT_NEAR( Fields.projection( 1, 1 ), Y, Y * 1e-5 );
+  }
+  VRenderContext Render;
+  Camera.Step();
+  Camera.Apply( Render );
+  EXPECT_EQ( Render.Projection(), Fields.projection );
+  EXPECT_EQ( Render.View(), Fields.view );
+  EXPECT_EQ( Render.Viewport(), QRect( 0, 0, 400, 200 ) );
+  EXPECT_EQ( Render.FrameSize(), QSize( 400, 200 ) );
 }
 
 TEST_F( CameraControllerTest, APanCarriesThePointUnderThePointerAlong )
 {
   for ( const int Type : { EViewPerspective, EViewFront, EViewTop } )
   {
-    for ( const double Ratio : { 1.0, 2.0, 1.5 } )
+    for ( const float Ratio : { 1.0f, 2.0f, 1.5f } )
     {
       Camera.SetViewType( Type );
-      const QVector3D Point = Camera.Fields().centre;
-      const QPointF Before = Screen( Point );
+      const QVector3D Point = Fields.centre;
+      const QVector2D Before = Screen( Point );
       Press( 100, 100, Qt::LeftButton | Qt::RightButton, Ratio );
-      EXPECT_TRUE( Camera.Fields().panning );
-      EXPECT_FALSE( Camera.Fields().orbiting );
+      EXPECT_TRUE( Fields.panning && !Fields.orbiting );
       Move( 140, 70, Qt::LeftButton | Qt::RightButton, Ratio );
-      const QPointF After = Screen( Point );
-      EXPECT_NEAR( After.x() - Before.x(), 40 * Ratio, 0.05 ) << ViewTypeName( Type );
-      EXPECT_NEAR( After.y() - Before.y(), -30 * Ratio, 0.05 ) << ViewTypeName( Type );
+      EXPECT_LT( ( Screen( Point ) - Before - QVector2D( 40, -30 ) * Ratio ).length(), 0.07f ) << Type;
       Release( {} );
-      EXPECT_FALSE( Camera.Fields().panning );
+      EXPECT_FALSE( Fields.panning );
     }
   }
 }
@@ -195,146 +149,118 @@ TEST_F( CameraControllerTest, APanCarriesThePointUnderThePointerAlong )
 TEST_F( CameraControllerTest, OrbitAndZoomByDragging )
 {
   Press( 10.9, 20.9, Qt::LeftButton );
-  EXPECT_EQ( Camera.Fields().lastPosition, QPoint( 10, 20 ) ) << "a press truncates";
+  EXPECT_EQ( Fields.lastPosition, QPoint( 10, 20 ) ) << "a press truncates";
   Move( 20.5, 14.4, Qt::LeftButton );
-  EXPECT_EQ( Camera.Fields().lastPosition, QPoint( 21, 14 ) ) << "a move rounds";
-  EXPECT_FLOAT_EQ( Camera.Fields().azimuth, 45 + 11 * 0.2f );
-  EXPECT_FLOAT_EQ( Camera.Fields().tilt, -60 - 6 * 0.2f );
+  EXPECT_EQ( Fields.lastPosition, QPoint( 21, 14 ) ) << "a move rounds";
+  EXPECT_FLOAT_EQ( Fields.azimuth, 45 + 11 * 0.2f );
+  EXPECT_FLOAT_EQ( Fields.tilt, -60 - 6 * 0.2f );
   Move( 21, 2014, Qt::LeftButton );
-  EXPECT_FLOAT_EQ( Camera.Fields().tilt, -60 - 6 * 0.2f + 400 ) << "over the pole";
+  EXPECT_FLOAT_EQ( Fields.tilt, -60 - 6 * 0.2f + 400 ) << "over the pole";
   Release( {} );
   Move( 500, 500, {} );
-  EXPECT_FLOAT_EQ( Camera.Fields().azimuth, 45 + 11 * 0.2f ) << "no gesture";
+  EXPECT_FLOAT_EQ( Fields.azimuth, 45 + 11 * 0.2f ) << "no gesture";
 
   Press( 0, 0, Qt::RightButton );
   Move( 0, 10, Qt::RightButton );
-  EXPECT_FLOAT_EQ( Camera.Fields().distance, 7000 + 150 );
+  EXPECT_FLOAT_EQ( Fields.distance, 7000 + 150 );
   Release( {} );
   Camera.SetViewType( EViewLeft );
   Press( 0, 0, Qt::LeftButton );
-  EXPECT_FALSE( Camera.Fields().orbiting || Camera.Fields().zooming ) << "nothing to orbit";
+  EXPECT_FALSE( Fields.orbiting || Fields.zooming ) << "nothing to orbit";
   Press( 0, 0, Qt::RightButton );
   Move( 0, 20, Qt::RightButton );
-  EXPECT_FLOAT_EQ( Camera.Fields().orthoScale, 4 * ( 1 + 20 * 0.0025f ) );
-  EXPECT_NEAR( Camera.Fields().projection( 1, 1 ), 2.0 / ( 600 * 4.2 ), 1e-8 );
+  EXPECT_FLOAT_EQ( Fields.orthoScale, 4 * ( 1 + 20 * 0.0025f ) );
+  EXPECT_NEAR( Fields.projection( 1, 1 ), 2.0 / ( 600 * 4.2 ), 1e-8 );
   Move( 0, -5000, Qt::RightButton );
-  EXPECT_GT( Camera.Fields().orthoScale, 0.0f ) << "a jump cannot turn the view inside out";
+  EXPECT_GT( Fields.orthoScale, 0.0f ) << "a jump cannot turn the view inside out";
 }
 
 TEST_F( CameraControllerTest, ButtonsThatChangeDuringAGesture )
 {
   Press( 10, 10, Qt::LeftButton );
   Press( 50, 50, Qt::LeftButton | Qt::MiddleButton );
-  EXPECT_TRUE( Camera.Fields().panning );
-  EXPECT_FALSE( Camera.Fields().orbiting );
-  EXPECT_EQ( Camera.Fields().lastPosition, QPoint( 10, 10 ) ) << "kept from the first press";
+  EXPECT_TRUE( Fields.panning && !Fields.orbiting );
+  EXPECT_EQ( Fields.lastPosition, QPoint( 10, 10 ) ) << "kept from the first press";
   Release( Qt::LeftButton );
-  EXPECT_TRUE( Camera.Fields().orbiting ) << "the left button is still down";
+  EXPECT_TRUE( Fields.orbiting ) << "the left button is still down";
   Press( 0, 0, Qt::MiddleButton );
-  EXPECT_FALSE( Camera.Fields().panning || Camera.Fields().orbiting || Camera.Fields().zooming );
+  EXPECT_FALSE( Fields.panning || Fields.orbiting || Fields.zooming );
   SetInteractionMapper( nullptr );
   Press( 0, 0, Qt::LeftButton );
-  EXPECT_FALSE( Camera.Fields().orbiting );
+  EXPECT_FALSE( Fields.orbiting );
 }
 
 TEST_F( CameraControllerTest, WheelKeysAndReset )
 {
-  Wheel( 120 );
-  EXPECT_FLOAT_EQ( Camera.Fields().distance, 6300 );
-  Wheel( 0 );
-  EXPECT_FLOAT_EQ( Camera.Fields().distance, 5670 );
-  Wheel( -120 );
-  EXPECT_FLOAT_EQ( Camera.Fields().distance, 6237 );
+  for ( const auto& [Delta, Distance] : { std::pair( 120, 6300.0f ), { 0, 5670.0f }, { -120, 6237.0f } } )
+  {
+    Camera.OnWheel( QWheelEvent( {}, {}, {}, { 0, Delta }, {}, {}, Qt::NoScrollPhase, false ) );
+    EXPECT_FLOAT_EQ( Fields.distance, Distance );
+  }
   const std::array< QVector4D, 1 > Focus = { QVector4D( 10, 20, 30, 5 ) };
-  Camera.SetFocusPoints( Focus, false );
   QMatrix4x4 Pose;
   Pose.translate( 1, 2, 3 );
+  Camera.SetFocusPoints( Focus, false );
   Camera.SetLockPose( Pose );
   EXPECT_FALSE( Camera.OnKeyPress( Qt::Key_End ) );
-  EXPECT_FLOAT_EQ( Camera.Fields().distance, 6237 );
+  EXPECT_FLOAT_EQ( Fields.distance, 6237 );
   EXPECT_TRUE( Camera.OnKeyPress( Qt::Key_Home ) );
-  EXPECT_EQ( Camera.Fields().centre, QVector3D( 0, 20, 0 ) );
-  EXPECT_TRUE( Camera.Fields().lockPose.isIdentity() );
-  EXPECT_EQ( Camera.Fields().distance, 7000 );
-  EXPECT_EQ( Camera.Fields().tilt, -60 );
+  EXPECT_EQ( Fields.centre, QVector3D( 0, 20, 0 ) );
+  EXPECT_TRUE( Fields.lockPose.isIdentity() );
+  EXPECT_EQ( QVector3D( Fields.distance, Fields.tilt, Fields.azimuth ), QVector3D( 7000, -60, 45 ) );
   Camera.Reset( true );
-  EXPECT_EQ( Camera.Fields().distance, 1000 );
-  EXPECT_EQ( Camera.Fields().tilt, -90 );
-  EXPECT_EQ( Camera.Fields().azimuth, 0 );
+  EXPECT_EQ( QVector3D( Fields.distance, Fields.tilt, Fields.azimuth ), QVector3D( 1000, -90, 0 ) );
 }
 
 TEST_F( CameraControllerTest, ALockedViewMovesWithItsPose )
 {
   const QVector3D Point( 200, 100, 50 );
-  const QPointF Before = Screen( Point );
+  const QVector2D Before = Screen( Point );
   QMatrix4x4 Pose;
   Pose.translate( 1000, -500, 700 );
   Pose.rotate( 30, 0, 0, 1 );
   Camera.SetLockPose( Pose );
-  const QPointF After = Screen( Pose.map( Point ) );
-  EXPECT_NEAR( After.x(), Before.x(), 0.01 );
-  EXPECT_NEAR( After.y(), Before.y(), 0.01 );
+  EXPECT_LT( ( Screen( Pose.map( Point ) ) - Before ).length(), 0.02f );
 }
 
-TEST_F( CameraControllerTest, AFocusCentresOnTheBoxOfTheSpheres )
+TEST_F( CameraControllerTest, AFocusCentresOnTheBoxAndAFitShowsEverySphereWithItsMargin )
 {
   const std::array< QVector4D, 3 > Spheres = { QVector4D( 0, 0, 0, 100 ), QVector4D( 1000, 50, -20, 10 ),
                                                QVector4D( std::nanf( "" ), 0, 0, 1 ) };
   Camera.SetFocusPoints( Spheres, false );
-  EXPECT_EQ( Camera.Fields().centre, QVector3D( 455, 0, 0 ) );
-  EXPECT_EQ( Camera.Fields().distance, 7000 );
   Camera.SetFocusPoints( {}, true );
   Camera.SetFocusPoints( std::span( Spheres ).subspan( 2 ), true );
-  EXPECT_EQ( Camera.Fields().centre, QVector3D( 455, 0, 0 ) );
-  EXPECT_EQ( Camera.Fields().distance, 7000 );
-}
-
-TEST_F( CameraControllerTest, AFitShowsEverySphereWithItsMargin )
-{
+  EXPECT_EQ( Fields.centre, QVector3D( 455, 0, 0 ) );
+  EXPECT_EQ( Fields.distance, 7000 );
   const std::array< QVector4D, 1 > One = { QVector4D( 10, 20, 30, 0 ) };
   Camera.SetFocusPoints( One, true );
-  EXPECT_EQ( Camera.Fields().centre, QVector3D( 10, 20, 30 ) );
-  EXPECT_NEAR( Camera.Fields().distance, 250 / std::sin( 22.5 * Degree ), 0.01 );
+  EXPECT_EQ( Fields.centre, QVector3D( 10, 20, 30 ) );
+  EXPECT_NEAR( Fields.distance, 250 / std::sin( 22.5 * Degree ), 0.01 );
   Camera.SetViewType( EViewFront );
   Camera.SetFocusPoints( One, true );
-  EXPECT_FLOAT_EQ( Camera.Fields().orthoScale, 500.0f / 600.0f );
+  EXPECT_FLOAT_EQ( Fields.orthoScale, 500.0f / 600.0f );
 
-  const std::array< QVector4D, 4 > Spheres = { QVector4D( -900, 0, 0, 100 ), QVector4D( 300, 1200, 40, 5 ),
-                                               QVector4D( 0, 0, 1800, 50 ), QVector4D( 500, -700, 900, 0 ) };
-  for ( const bool bYUp : { false, true } )
+  const std::array< QVector4D, 4 > Many = { QVector4D( -900, 0, 0, 100 ), QVector4D( 300, 1200, 40, 5 ),
+                                            QVector4D( 0, 0, 1800, 50 ), QVector4D( 500, -700, 900, 0 ) };
+  for ( int Case = 0; Case < ViewTypeCount * 2; ++Case )
   {
-    for ( int Type = 0; Type < ViewTypeCount; ++Type )
+    // At 1:1 the side planes are exact; the closest sphere then touches its plane.
+    const bool bPerspective = Case / 2 == EViewPerspective;
+    Camera.SetSize( bPerspective ? QSize( 700, 700 ) : QSize( 800, 600 ) );
+    Camera.SetYUp( Case % 2 );
+    Camera.SetViewType( Case / 2 );
+    Camera.SetFocusPoints( Many, true );
+    double Tightest = 1e9;
+    for ( const QVector4D& rSphere : Many )
     {
-      // At 1:1 the side planes are exact; the closest sphere then touches its plane.
-      Camera.SetSize( Type == EViewPerspective ? QSize( 700, 700 ) : QSize( 800, 600 ) );
-      Camera.SetYUp( bYUp );
-      Camera.SetViewType( Type );
-      Camera.SetFocusPoints( Spheres, true );
-      double Tightest = 1e9;
-      for ( const QVector4D& rSphere : Spheres )
+      const QVector3D P = InView( Fields, rSphere.toVector3D() );
+      for ( const auto& [Half, Place] : { std::pair( 300, std::abs( P.y() ) ), { 400, std::abs( P.x() ) } } )
       {
-        const VPoint P = InView( Camera.Fields(), rSphere.toVector3D() );
-        const double Radius = rSphere.w() + 250;
-        const double S = std::sin( 22.5 * Degree ), C = std::cos( 22.5 * Degree );
-        const VCameraFields& rFields = Camera.Fields();
-        const double Vertical =
-            Type == EViewPerspective ? -P.Z * S - std::abs( P.Y ) * C : rFields.orthoScale * 300.0 - std::abs( P.Y );
-        const double Horizontal =
-            Type == EViewPerspective ? -P.Z * S - std::abs( P.X ) * C : rFields.orthoScale * 400.0 - std::abs( P.X );
-        Tightest = std::min( { Tightest, Vertical - Radius, Horizontal - Radius } );
+        const double Room = bPerspective ? -P.z() * std::sin( 22.5 * Degree ) - Place * std::cos( 22.5 * Degree )
+                                         : Fields.orthoScale * float( Half ) - Place;
+        Tightest = std::min( Tightest, Room - rSphere.w() - 250 );
       }
-      EXPECT_NEAR( Tightest, 0.0, 0.05 ) << ViewTypeName( Type ) << bYUp;
     }
+    EXPECT_NEAR( Tightest, 0.0, 0.05 ) << Case;
   }
-}
-
-TEST_F( CameraControllerTest, ApplyHandsOverEverything )
-{
-  VRenderContext Render;
-  Camera.Step();
-  Camera.Apply( Render );
-  EXPECT_EQ( Render.Projection(), Camera.Fields().projection );
-  EXPECT_EQ( Render.View(), Camera.Fields().view );
-  EXPECT_EQ( Render.Viewport(), QRect( 0, 0, 800, 600 ) );
-  EXPECT_EQ( Render.FrameSize(), QSize( 800, 600 ) );
 }

@@ -8,84 +8,58 @@ using namespace CoreGraphics;
 
 namespace
 {
-constexpr int Left = Qt::LeftButton, Right = Qt::RightButton, Middle = Qt::MiddleButton;
+// What each set of held buttons (index: bits left 1, right 2, middle 4) asks for: p, o, z, b or nothing.
+using VAsked = std::array< std::string, 8 >;
+const VAsked Navigating = { "", "o", "z", "p", "", "p", "", "p" };
+const VAsked Selecting = { "", "b", "", "b", "", "b", "", "b" };
 
-// The action of each set of held buttons (index: bits left 1, right 2, middle 4) while navigating: p, o, z or none.
-constexpr char Navigation[] = "-oz-----";
-
-char NavigationOf( int i_Buttons )
+VAsked Asked( const VInteractionMapper& i_rMapper, Qt::KeyboardModifiers i_Modifiers )
 {
-  const bool bPan = ( i_Buttons & Left ) && ( i_Buttons & ( Right | Middle ) );
-  return bPan ? 'p' : Navigation[i_Buttons];
-}
-
-std::string Actions( const VInteractionMapper& i_rMapper, int i_Buttons, Qt::KeyboardModifiers i_Modifiers )
-{
-  std::string Text;
-  for ( int Action = -1; Action <= 4; ++Action )
+  VAsked Texts;
+  for ( int Case = 0; Case < 8 * 6; ++Case )
   {
-    if ( i_rMapper.IsAction( Action, i_Buttons, int( i_Modifiers.toInt() ) ) )
+    const int Buttons = Case / 6, Action = Case % 6 - 1;
+    if ( i_rMapper.IsAction( Action, Buttons, int( i_Modifiers.toInt() ) ) )
     {
-      Text += Action >= 0 && Action < 4 ? "pozb"[Action] : '?';
+      Texts[std::size_t( Buttons )] += Action >= 0 && Action < 4 ? "pozb"[Action] : '?';
     }
   }
-  return Text;
-}
-
-std::string Expected( char i_Action )
-{
-  return i_Action == '-' ? std::string() : std::string( 1, i_Action );
+  return Texts;
 }
 } // namespace
 
-TEST( Mapper, TheBaseNavigatesWithoutModifiersAndSelectsWithAltAlone )
+TEST( Mapper, AltSelectsOrElseNavigatesAsItIsPreferred )
 {
-  const VInteractionMapper Mapper;
-  for ( int Buttons = 0; Buttons < 8; ++Buttons )
+  const Qt::KeyboardModifiers None, Shift( Qt::ShiftModifier ), Control( Qt::ControlModifier ), Alt( Qt::AltModifier );
+  const VInteractionMapper Base;
+  EXPECT_EQ( Asked( Base, None ), Navigating );
+  EXPECT_EQ( Asked( Base, Qt::KeypadModifier ), Navigating );
+  EXPECT_EQ( Asked( Base, Alt ), ( VAsked{ "", "b", "b", "b", "b", "b", "b", "b" } ) );
+  for ( const Qt::KeyboardModifiers Others : { Shift, Control, Alt | Shift, Alt | Control } )
   {
-    EXPECT_EQ( Actions( Mapper, Buttons, Qt::NoModifier ), Expected( NavigationOf( Buttons ) ) ) << Buttons;
-    EXPECT_EQ( Actions( Mapper, Buttons, Qt::KeypadModifier ), Expected( NavigationOf( Buttons ) ) ) << Buttons;
-    EXPECT_EQ( Actions( Mapper, Buttons, Qt::AltModifier ), Buttons ? "b" : "" ) << Buttons;
-    for ( const Qt::KeyboardModifiers Modifiers :
-          { Qt::KeyboardModifiers( Qt::ShiftModifier ), Qt::KeyboardModifiers( Qt::ControlModifier ),
-            Qt::AltModifier | Qt::ShiftModifier, Qt::AltModifier | Qt::ControlModifier } )
-    {
-      EXPECT_EQ( Actions( Mapper, Buttons, Modifiers ), "" ) << Buttons;
-    }
+    EXPECT_EQ( Asked( Base, Others ), VAsked{} );
   }
-}
-
-TEST( Mapper, ThePreferenceSwapsNavigationAndSelection )
-{
   const auto pMapper = ZEK::MakeShared< VHarrowInteractionMapper >( nullptr, nullptr );
   EXPECT_TRUE( pMapper->AltToSelect() );
   for ( const bool bFlag : { true, false, true } )
   {
     pMapper->SetAltToSelect( bFlag );
-    for ( int Buttons = 0; Buttons < 8; ++Buttons )
+    // Shift and Control never stand in the way.
+    for ( const Qt::KeyboardModifiers Others : { None, Shift, Shift | Control } )
     {
-      // Shift and Control never stand in the way.
-      for ( const Qt::KeyboardModifiers Others : { Qt::KeyboardModifiers(), Qt::KeyboardModifiers( Qt::ShiftModifier ),
-                                                   Qt::ShiftModifier | Qt::ControlModifier } )
-      {
-        const std::string Navigating = Expected( NavigationOf( Buttons ) );
-        const std::string Selecting = Buttons & Left ? "b" : "";
-        EXPECT_EQ( Actions( *pMapper, Buttons, Others ), bFlag ? Navigating : Selecting ) << Buttons;
-        EXPECT_EQ( Actions( *pMapper, Buttons, Others | Qt::AltModifier ), bFlag ? Selecting : Navigating ) << Buttons;
-      }
+      EXPECT_EQ( Asked( *pMapper, Others ), bFlag ? Navigating : Selecting );
+      EXPECT_EQ( Asked( *pMapper, Others | Alt ), bFlag ? Selecting : Navigating );
     }
   }
 }
 
 TEST( Mapper, WithNoneInTheProcessEveryAnswerIsNo )
 {
-  SetInteractionMapper( nullptr );
-  EXPECT_EQ( InteractionMapper(), nullptr );
-  EXPECT_FALSE( IsInteraction( EInteractionOrbit, Left, 0 ) );
   const auto pMapper = std::make_shared< VInteractionMapper >();
-  SetInteractionMapper( pMapper );
-  EXPECT_EQ( InteractionMapper(), pMapper );
-  EXPECT_TRUE( IsInteraction( EInteractionOrbit, Left, 0 ) );
-  SetInteractionMapper( nullptr );
-  EXPECT_FALSE( IsInteraction( EInteractionOrbit, Left, 0 ) );
+  for ( const bool bThere : { false, true, false } )
+  {
+    SetInteractionMapper( bThere ? pMapper : nullptr );
+    EXPECT_EQ( InteractionMapper(), bThere ? pMapper : nullptr );
+    EXPECT_EQ( IsInteraction( EInteractionOrbit, Qt::LeftButton, 0 ), bThere );
+  }
 }

@@ -5,6 +5,7 @@
 #include <atomic>
 #include <cstdlib>
 #include <fstream>
+#include <map>
 #include <new>
 
 static std::atomic< std::uint64_t > s_Allocations{ 0 };
@@ -40,6 +41,8 @@ namespace
 // A driver's cache may call a broken source good because it has seen it before.
 const bool s_bCacheOff = qputenv( "MESA_SHADER_CACHE_DISABLE", "true" );
 
+auto* const s_pScenes = TUntilTheEnd< std::map< EContextKind, VTestScene > >::Make();
+
 QSurfaceFormat FormatOf( EContextKind i_Kind, bool i_bDebug )
 {
   QSurfaceFormat Format; // with nothing asked for, a desktop driver gives its compatibility profile
@@ -57,6 +60,13 @@ QSurfaceFormat FormatOf( EContextKind i_Kind, bool i_bDebug )
   return Format;
 }
 } // namespace
+
+CoreGraphics::VMesh MakeQuad()
+{
+  return { CoreGraphics::PositionLayout(),
+           std::vector< QVector3D >{ { 0, 0, 0 }, { 1, 0, 0 }, { 1, 1, 0 }, { 0, 1, 0 } },
+           { 0, 1, 2, 0, 2, 3 } };
+}
 
 VTestContext::VTestContext( EContextKind i_Kind, QOpenGLContext* i_pShare, bool i_bDebug )
 {
@@ -96,6 +106,19 @@ void VTestContext::Begin( int i_Mode )
   pRender->Clear( true, true );
 }
 
+bool VTestContext::Fill( CoreGraphics::VMesh& i_rQuad,
+                         const std::shared_ptr< CoreGraphics::VShaderProgram >& i_rpProgram,
+                         const QVector4D& i_rColour )
+{
+  if ( !pRender->UseProgram( i_rpProgram ) || !pRender->SetVertexBuffer( i_rQuad.Stream() ) )
+  {
+    return false;
+  }
+  i_rpProgram->SetUniform( i_rpProgram->UniformLocation( "u_Colour" ), i_rColour );
+  pRender->DrawElements( GL_TRIANGLES, i_rQuad );
+  return true;
+}
+
 std::vector< std::uint32_t > VTestContext::Pixels()
 {
   std::vector< std::uint32_t > Words( Side * Side );
@@ -114,6 +137,19 @@ int VTestContext::Covered()
   return Count;
 }
 
+VTestScene::VTestScene( EContextKind i_Kind )
+  : VTestContext( i_Kind )
+{
+  EXPECT_TRUE( Resources.Prepare() );
+}
+
+VTestScene& SharedScene( EContextKind i_Kind )
+{
+  VTestScene& rScene = s_pScenes->Object().try_emplace( i_Kind, i_Kind ).first->second;
+  EXPECT_TRUE( rScene.MakeCurrent() );
+  return rScene;
+}
+
 void WriteText( const std::filesystem::path& i_rPath, const std::string& i_rText )
 {
   std::filesystem::create_directories( i_rPath.parent_path() );
@@ -124,6 +160,11 @@ std::string KindName( const testing::TestParamInfo< EContextKind >& i_rInfo )
 {
   static const std::array< std::string, 3 > Names = { "Core", "Compatibility", "ES" };
   return Names[i_rInfo.param];
+}
+
+bool IsOldContext()
+{
+  return qEnvironmentVariable( "HARROW_TEST_OLD_CONTEXT" ) == "1";
 }
 
 std::uint64_t AllocationCount()
