@@ -132,10 +132,10 @@ TEST( SelectionService, BadTextsNameNothing )
 TEST( SelectionService, OnlyTheFourKindsTakeASubIndex )
 {
   using FSetter = bool ( * )( VSelectionItem&, std::uint32_t );
-  const std::pair< std::uint32_t, FSetter > Setters[] = { { 2, &HostServices::SetCentroidIndex },
-                                                          { 3, &HostServices::SetMaskCellIndex },
+  const std::pair< std::uint32_t, FSetter > Setters[] = { { 3, &HostServices::SetCentroidIndex },
+                                                          { 30, &HostServices::SetMaskCellIndex },
                                                           { 5, &HostServices::SetReconstructionIndex },
-                                                          { 30, &HostServices::SetGreyscaleBlobIndex } };
+                                                          { 2, &HostServices::SetGreyscaleBlobIndex } };
   for ( std::uint32_t Kind = 0; Kind < 40; ++Kind )
   {
     bool bAny = false;
