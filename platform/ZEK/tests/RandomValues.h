@@ -45,7 +45,8 @@ public:
       for ( std::uint64_t Index = 0; Index <= Below( 4 ); ++Index )
       {
         const auto Value = static_cast< std::int8_t >( Below( 256 ) );
-        Description.m_EnumValues.emplace_back( "E" + Text( 5 ) + std::to_string( Index ), Value );
+        Description.m_EnumValues.emplace_back( std::string( "E" ).append( Text( 5 ) ).append( std::to_string( Index ) ),
+                                               Value );
       }
     }
     else if ( Kind >= 15 )

@@ -229,5 +229,5 @@ TEST( TypedValue, BytesAreCopiedMovedAndGrownWhole )
       ASSERT_EQ( Slots[A] == Slots[Slot], Model[A] == Model[Slot] ) << Step;
     }
   }
-  EXPECT_THROW( Slots[0].Append( nullptr, std::size_t{ 1 } << 32 ), std::length_error );
+  EXPECT_THROW( Slots[0].Append( Slots[1].begin(), std::size_t{ 1 } << 32 ), std::length_error );
 }

@@ -21,7 +21,7 @@ struct VCommit : testing::Test
     for ( const char* const pPath : i_Paths )
     {
       m_Handlers.push_back( i_bPattern ? m_Store.OnPattern( pPath ) : m_Store.OnEntry( pPath ) );
-      m_Handlers.back()->AddImmediateCallback( m_Heard.As( ( i_bPattern ? "~" : "" ) + std::string( pPath ) ),
+      m_Handlers.back()->AddImmediateCallback( m_Heard.As( std::string( i_bPattern ? "~" : "" ) + pPath ),
                                                ChangeMask::All );
     }
   }

@@ -18,8 +18,8 @@ constexpr std::uint64_t Replaced = Bit( 49 ) | Bit( 52 );
 
 std::string Encode( const VTypedValue& i_rValue )
 {
-  return std::string( 1, static_cast< char >( 'A' + static_cast< int >( i_rValue.Schema()->m_Type ) ) ) +
-         std::string( i_rValue.m_Data.begin(), i_rValue.m_Data.end() );
+  std::string Text( 1, static_cast< char >( 'A' + static_cast< int >( i_rValue.Schema()->m_Type ) ) );
+  return Text.append( i_rValue.m_Data.begin(), i_rValue.m_Data.end() );
 }
 
 bool HasBytes( const VModelField& i_rField )

@@ -134,7 +134,7 @@ TEST_F( VWriter, UsingDefaultFollowsTheSetters )
                                { true, 1, false },
                                { true, 2, false } } )
   {
-    const std::string Path = "e" + std::to_string( rCase.Setter ) + ( rCase.bVerify ? "v" : "" );
+    const std::string Path = std::string( rCase.bVerify ? "v" : "e" ) + std::to_string( rCase.Setter );
     VStoreEntry* const pEntry = m_Store[Path.c_str()];
     m_Store.Write(
         [&]( IStoreWriter& io_rWriter )
