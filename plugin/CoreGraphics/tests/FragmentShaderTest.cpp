@@ -135,6 +135,7 @@ TEST_F( FragmentShaderTest, WhatIsClippedAndWhereAlphaChanges )
     const std::tuple< const char*, float, VValue > Heights[] = { { "ClipFloor", -0.1f, Untouched },
                                                                  { "ClipFloor", 0.1f, Plain },
                                                                  { "CameraCoverageFurstum", -0.1f, Untouched },
+                                                                 { "CameraCoverageFurstum", 0.1f, { 1, 0, 1, 1 } },
                                                                  { "CameraCoverageFurstum", 9.9f, { 1, 0, 1, 1 } },
                                                                  { "CameraCoverageFurstum", 10.1f, Plain } };
     for ( const auto& [pName, Height, rExpected] : Heights )
@@ -169,24 +170,29 @@ TEST_F( FragmentShaderTest, WhatIsClippedAndWhereAlphaChanges )
 
 TEST_F( FragmentShaderTest, PointsOfASensorsView )
 {
-  const VValues Colour = { { "v_colour", { 0.5f, 0.25f, 32 / 255.0f, 0.8f } }, { "v_size", 14 } };
-  // A disc of 14 pixels: cross through the middle, border of 2, in between paler; outside nothing.
+  constexpr float Size = 22.4f;
+  const VValues Colour = { { "v_colour", { 0.5f, 0.25f, 32 / 255.0f, 0.8f } }, { "v_size", Size } };
+  // A disc: cross through the middle, border of 2, in between paler; outside nothing.
   const VShaderBench::VImage Disc = Bench.Fragment( "Centroid2D", Colour, 14 );
   const VShaderBench::VImage Wand = Bench.Fragment( "WandWave2D", Colour, 14 );
-  for ( int Y = 1; Y < Side - 1; ++Y )
+  const VShaderBench::VImage Hard = Bench.Fragment( "Centroid2DSelection", Colour, 14 );
+  for ( int Pixel = 0; Pixel < 14 * 14; ++Pixel )
   {
-    for ( int X = 1; X < Side - 1; ++X )
-    {
-      const float Dx = std::abs( float( X ) + 0.5f - 8 ), Dy = std::abs( float( Y ) + 0.5f - 8 );
-      const float Inner = 7 - std::hypot( Dx, Dy );
-      const float Share = Inner < 2 || std::min( Dx, Dy ) < 0.75f ? 0.8f : 0.8f * 0.3f;
-      const float Alpha = Share * std::clamp( Inner + 0.5f, 0.0f, 1.0f );
-      EXPECT_TRUE( IsNear( Disc.At( X, Y ), { 0.5f, 0.25f, 32 / 255.0f, Alpha }, 2e-3f ) ) << X << ' ' << Y;
-      EXPECT_NEAR( Wand.At( X, Y ).w(), 0.8f * std::max( 0.0f, Inner / 7 ), 1e-3f );
-    }
+    const int X = 1 + Pixel % 14, Y = 1 + Pixel / 14;
+    const float Dx = std::abs( float( X ) - 7.5f ) * Size / 14, Dy = std::abs( float( Y ) - 7.5f ) * Size / 14;
+    const float Inner = Size / 2 - std::hypot( Dx, Dy );
+    const float Share = Inner < 2 || std::min( Dx, Dy ) < 0.75f ? 0.8f : 0.8f * 0.3f;
+    const float Alpha = Share * std::clamp( Inner + 0.5f, 0.0f, 1.0f );
+    EXPECT_TRUE( IsNear( Disc.At( X, Y ), { 0.5f, 0.25f, 32 / 255.0f, Alpha }, 4e-3f ) ) << X << ' ' << Y;
+    EXPECT_NEAR( Wand.At( X, Y ).w(), 0.8f * std::max( 0.0f, Inner / Size * 2 ), 1e-3f ) << X << ' ' << Y;
+    EXPECT_EQ( Hard.At( X, Y ) == Untouched, Inner < 0 ) << X << ' ' << Y;
   }
-  EXPECT_EQ( Bench.Fragment( "Centroid2D", With( Colour, { { "v_size", 2 } } ), 2 ).At( 7, 7 ).w(), 0.8f );
-  EXPECT_EQ( Bench.Fragment( "Centroid2DSelection", Colour, 14 ).At( 1, 1 ), Untouched );
+  for ( const auto& [Small, bSquare] : { std::pair( 2.0f, true ), { 2.1f, false } } )
+  {
+    const VValues Values = With( Colour, { { "v_size", Small } } );
+    EXPECT_EQ( Bench.Fragment( "Centroid2DSelection", Values, 14 ).At( 1, 1 ) == Untouched, !bSquare );
+    EXPECT_TRUE( !bSquare || Bench.Fragment( "Centroid2D", Values, 14 ).At( 7, 7 ).w() == 0.8f );
+  }
   // What is not selected vanishes where only the selection is to be shown.
   for ( const char* pName : { "Centroid2DSelection", "Greyscale2DSelection", "MaskSelection" } )
   {

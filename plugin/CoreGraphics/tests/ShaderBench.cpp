@@ -79,7 +79,7 @@ testing::AssertionResult IsNear( const VValue& i_rFound, const VValue& i_rExpect
     Distance = std::hypot( Distance, double( i_rFound[Index] ) - double( i_rExpected[Index] ) );
     Size = std::hypot( Size, i_rExpected[Index] );
   }
-  if ( i_rFound.size() == i_rExpected.size() && Distance <= double( i_Tolerance ) + 1e-6 * Size )
+  if ( i_rFound.size() == i_rExpected.size() && Distance <= double( i_Tolerance ) + 4e-7 * Size )
   {
     return testing::AssertionSuccess();
   }
