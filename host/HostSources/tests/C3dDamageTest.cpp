@@ -150,7 +150,7 @@ TEST( C3dDamage, WhatIsOddIsNotedAndAsksForNoMoreThanTheFileHolds )
   File = WholeFile();
   for ( int Index = 0; Index < 70000; ++Index )
   {
-    File.SetParameter( { "POINT", "N" + std::to_string( Index ), 1, {}, { 1 }, {} } );
+    File.SetParameter( { "POINT", std::string( "N" ).append( std::to_string( Index ) ), 1, {}, { 1 }, {} } );
   }
   R = MustReadC3d( File );
   EXPECT_EQ( R.FrameCount, 10 );
