@@ -3,6 +3,8 @@
 #include <Store/Store.h>
 #include <ZEK/StoreFlags.h>
 
+#include <vector>
+
 namespace Store
 {
 
@@ -81,29 +83,23 @@ void CopyExtras( const IStoreReader& i_rFrom, Entry i_pFrom, IStoreWriter& io_rT
   io_rTo.SetAttributesText( i_pTo, i_rFrom.Attributes( i_pFrom ) );
 }
 
-void CopyTree( const IStoreReader& i_rFrom, Entry i_pFrom, IStoreWriter& io_rTo, bool i_bPersistentOnly,
-               IResult& io_rResult )
+void CopyEntry( const IStoreReader& i_rFrom, Entry i_pFrom, IStoreWriter& io_rTo, bool i_bPersistentOnly,
+                IResult& io_rResult )
 {
   const VEntryPath& rPath = i_rFrom.GetStore()->EntryPath( i_pFrom );
   if ( i_bPersistentOnly && ( i_rFrom.Flags( i_pFrom ) & EPersistent ) == 0 )
   {
     Log( StoreCategory(), ELogDetail, "Skipping non-persistable entry '%s'.", rPath.Text() );
+    return;
   }
-  else
+  const Entry pTo = io_rTo.GetStore()->GetEntry( rPath );
+  const IResult Typed = io_rTo.SetSchema( pTo, i_rFrom.Schema( i_pFrom ) );
+  Note( Typed, io_rResult );
+  if ( Typed.IsOk() )
   {
-    const Entry pTo = io_rTo.GetStore()->GetEntry( rPath );
-    const IResult Typed = io_rTo.SetSchema( pTo, i_rFrom.Schema( i_pFrom ) );
-    Note( Typed, io_rResult );
-    if ( Typed.IsOk() )
-    {
-      CopyValues( i_rFrom, i_pFrom, io_rTo, pTo, io_rResult );
-      CopyPresentation( i_rFrom, i_pFrom, io_rTo, pTo, io_rResult );
-      CopyExtras( i_rFrom, i_pFrom, io_rTo, pTo );
-    }
-  }
-  for ( const Entry pChild : i_rFrom.Children( i_pFrom ) )
-  {
-    CopyTree( i_rFrom, pChild, io_rTo, i_bPersistentOnly, io_rResult );
+    CopyValues( i_rFrom, i_pFrom, io_rTo, pTo, io_rResult );
+    CopyPresentation( i_rFrom, i_pFrom, io_rTo, pTo, io_rResult );
+    CopyExtras( i_rFrom, i_pFrom, io_rTo, pTo );
   }
 }
 } // namespace
@@ -112,9 +108,18 @@ IResult CopyEntries( const IStoreReader& i_rFrom, IStoreWriter& io_rTo, bool i_b
 {
   IResult Result;
   const Entry pRoot = i_rFrom.GetStore()->GetRootEntry();
+  std::vector< Entry > Left;
   if ( i_rFrom.Exists( pRoot ) )
   {
-    CopyTree( i_rFrom, pRoot, io_rTo, i_bPersistentOnly, Result );
+    Left.push_back( pRoot );
+  }
+  while ( !Left.empty() )
+  {
+    const Entry pEntry = Left.back();
+    Left.pop_back();
+    CopyEntry( i_rFrom, pEntry, io_rTo, i_bPersistentOnly, Result );
+    const std::vector< Entry > Children = i_rFrom.Children( pEntry );
+    Left.insert( Left.end(), Children.rbegin(), Children.rend() );
   }
   return Result;
 }

@@ -22,7 +22,7 @@ using VHandlerList = std::vector< VHandlerCallback* >;
 
 struct VEntryValues
 {
-  std::uint32_t m_Flags = 0;
+  std::uint32_t m_Flags = 0; // first, so that a record has it in one cache line with the verified value
   ZEK::VTypedValue m_Verified;
   ZEK::VTypedValue m_Proposed;
   ZEK::VTypedValue m_Default;
@@ -53,30 +53,32 @@ struct VEntryExtras
 /// is left. The handler list alone is guarded by the store mutex.
 struct VEntryState
 {
-  std::vector< VStoreEntry* > m_Children; ///< in child order
   ZEK::VChangeIds m_Changes;
+  VHandlerList m_Handlers;                ///< those whose patterns match; found again when a state is made
+  std::vector< VStoreEntry* > m_Children; ///< in child order
   std::unique_ptr< VEntryPresentation > m_pPresentation;
   std::unique_ptr< VEntryExtras > m_pExtras;
-  const ZEK::IO::ISchema* m_pSchema = nullptr;
-  VHandlerList m_Handlers; ///< those whose patterns match; found again when a state is made
 };
 
 /// What the open write scope has written of an entry. Records are pooled and keep old contents: a field counts only
-/// when the mask has its bit.
-struct VEntryChange
+/// when the mask has its bit. Most have neither children nor more than a verified value, and are one cache line then.
+struct alignas( 64 ) VEntryChange
 {
   std::uint64_t m_Mask = 0;
   const ZEK::IO::ISchema* m_pSchema = nullptr;
-  std::size_t m_Place = 0; ///< in the pending children of the parent
-  VPendingChildren m_Children;
-  bool m_bChoices = false; ///< the three lists of choices may hold something
+  std::uint32_t m_Place = 0; ///< in the pending children of the parent
+  bool m_bParent = false;    ///< the pending children may not be empty
+  bool m_bChoices = false;   ///< the three lists of choices may hold something
+  bool m_bWasThere = false;  ///< before the merge
   VEntryValues m_Values;
+  VPendingChildren m_Children;
   /// Made on first need and kept with the record: most records never have them, and are small.
   VEntryPresentation& Presentation() { return Made( m_pPresentation ); }
   VEntryExtras& Extras() { return Made( m_pExtras ); }
 
   std::unique_ptr< VEntryPresentation > m_pPresentation;
   std::unique_ptr< VEntryExtras > m_pExtras;
+  std::uint64_t m_Told = 0; ///< by the merge so far
 
 private:
   template < typename TGroup >
@@ -92,25 +94,26 @@ private:
 
 /// A node of the tree. Made on first use of a path and kept as long as the store; it is there, for clients, when it
 /// has a state.
-class VStoreEntry
+class alignas( 64 ) VStoreEntry
 {
 public:
   VStoreEntry( ZEK::VEntryPath i_Path, VStoreEntry* i_pParent )
     : m_LeafKey( LeafKey( i_Path.LeafView() ) )
-    , m_Path( std::move( i_Path ) )
     , m_pParent( i_pParent )
+    , m_Path( std::move( i_Path ) )
   {
   }
 
-  /// Part of what is committed, and here so that a read of a value looks at one place; empty without a state.
-  VEntryValues m_Values;
-  std::unique_ptr< VEntryState > m_pState; ///< null while the entry is not there
-  VEntryChange* m_pChange = nullptr;       ///< the thread of the write scope, or the store mutex
-  const std::uint64_t m_LeafKey;           ///< orders most siblings without their names
   std::atomic< VStoreEntry* > m_pBucketLink{ nullptr };
+  const std::uint64_t m_LeafKey; ///< orders most siblings without their names
+  VStoreEntry* const m_pParent;  ///< null for the root only
+  VHandlerList m_Handlers;       ///< those registered by handle; store mutex
+  // Part of what is committed, and here so that a read or a write of a value looks at one place; empty without a state.
+  const ZEK::IO::ISchema* m_pSchema = nullptr; ///< null until there is a typed value or a schema
+  VEntryChange* m_pChange = nullptr;           ///< the thread of the write scope, or the store mutex
+  std::unique_ptr< VEntryState > m_pState;     ///< null while the entry is not there
+  VEntryValues m_Values;
   const ZEK::VEntryPath m_Path;
-  VStoreEntry* const m_pParent; ///< null for the root only
-  VHandlerList m_Handlers;      ///< those registered by handle; store mutex
 };
 
 /// The groups of fields by type, so that one routine serves them all.

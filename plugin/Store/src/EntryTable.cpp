@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <bit>
+#include <utility>
 
 namespace Store
 {
@@ -29,29 +30,28 @@ VStoreEntry& VEntryTable::FindOrMake( const ZEK::VEntryPath& i_rPath )
   {
     return *pEntry;
   }
-  // Not by recursion: a path may have any number of components.
-  std::vector< ZEK::VEntryPath > Missing{ i_rPath };
-  VStoreEntry* pParent = nullptr;
+  // Not by recursion: a path may have any number of components. Only the sizes of what is missing are kept, as the
+  // texts together may be large.
+  std::vector< std::size_t > Missing{ i_rPath.Text().size() };
+  ZEK::VEntryPath Parent = i_rPath.Parent();
+  VStoreEntry* pParent = Find( Parent );
   while ( pParent == nullptr )
   {
-    ZEK::VEntryPath Parent = Missing.back().Parent();
+    Missing.push_back( Parent.Text().size() );
+    Parent = Parent.Parent();
     pParent = Find( Parent );
-    if ( pParent == nullptr )
-    {
-      Missing.push_back( std::move( Parent ) );
-    }
   }
   for ( ; !Missing.empty(); Missing.pop_back() )
   {
-    pParent = &Make( Missing.back(), pParent );
+    pParent = &Make( ZEK::VEntryPath( i_rPath.Text().substr( 0, Missing.back() ) ), pParent );
   }
   return *pParent;
 }
 
-VStoreEntry& VEntryTable::Make( const ZEK::VEntryPath& i_rPath, VStoreEntry* i_pParent )
+VStoreEntry& VEntryTable::Make( ZEK::VEntryPath i_Path, VStoreEntry* i_pParent )
 {
-  VStoreEntry& rEntry = m_Entries.emplace_back( i_rPath, i_pParent );
-  std::atomic< VStoreEntry* >& rBucket = m_Buckets[BucketOf( i_rPath.Hash() )];
+  VStoreEntry& rEntry = m_Entries.emplace_back( std::move( i_Path ), i_pParent );
+  std::atomic< VStoreEntry* >& rBucket = m_Buckets[BucketOf( rEntry.m_Path.Hash() )];
   rEntry.m_pBucketLink.store( rBucket.load( std::memory_order_relaxed ), std::memory_order_relaxed );
   rBucket.store( &rEntry, std::memory_order_release );
   return rEntry;

@@ -33,7 +33,7 @@ private:
   {
     return static_cast< std::size_t >( m_bPowerOfTwo ? i_Hash & ( m_Buckets.size() - 1 ) : i_Hash % m_Buckets.size() );
   }
-  VStoreEntry& Make( const ZEK::VEntryPath& i_rPath, VStoreEntry* i_pParent );
+  VStoreEntry& Make( ZEK::VEntryPath i_Path, VStoreEntry* i_pParent );
 
   std::vector< std::atomic< VStoreEntry* > > m_Buckets;
   bool m_bPowerOfTwo;

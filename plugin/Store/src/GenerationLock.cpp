@@ -9,6 +9,23 @@
 
 namespace Store
 {
+namespace
+{
+/// Scopes are mostly over before a thread could fall asleep and be woken: so often it lets others run and looks again.
+template < typename TDone >
+bool IsSoon( const TDone& i_rDone )
+{
+  for ( int Look = 0; Look < 200; ++Look )
+  {
+    if ( i_rDone() )
+    {
+      return true;
+    }
+    std::this_thread::yield();
+  }
+  return false;
+}
+} // namespace
 
 std::unique_lock< std::mutex > LockOrDie( std::mutex& io_rMutex )
 {
@@ -23,103 +40,72 @@ std::unique_lock< std::mutex > LockOrDie( std::mutex& io_rMutex )
   }
 }
 
-void VGenerationLock::BeginCounted( VThreadState& io_rThread )
+/// Announces the reader for the phase that is, or for the one after the commit under way. False when the commit of
+/// that very phase may have looked at the lines before.
+bool VGenerationLock::Announce( VReaderLine& io_rLine )
 {
-  std::unique_lock Lock = LockOrDie( m_Mutex );
-  io_rThread.m_bCounted = true;
-  const std::uint64_t Current = m_Current.load( std::memory_order_relaxed );
-  if ( m_Fifo.empty() )
-  {
-    m_Fifo.push_back( { Current, 1 } );
-    m_bWriterQueued = false;
-    return;
-  }
-  if ( !m_bCommitting )
-  {
-    ++m_Fifo.front().m_Count;
-    return;
-  }
-  if ( m_Fifo.size() > 1 )
-  {
-    ++m_Fifo[1].m_Count;
-  }
-  else
-  {
-    m_Fifo.push_back( { Current + 1, 1 } );
-    // Else the next writer would open a generation behind this one, which its readers take away without a commit:
-    // the writer would wait for a number that never comes.
-    m_bWriterQueued = false;
-  }
-  m_Advance.wait( Lock,
-                  [this, Current]
-                  {
-                    return m_Current.load( std::memory_order_relaxed ) == Current + 1;
-                  } );
+  const std::uint64_t Phase = m_Phase.load();
+  const std::uint64_t Target = Phase + ( IsCommit( Phase ) ? 1 : 0 );
+  io_rLine.m_Phase.store( Target );
+  return m_Phase.load() <= Target;
 }
 
-void VGenerationLock::EndCounted()
+void VGenerationLock::BeginLate( VReaderLine& io_rLine )
 {
-  std::unique_lock Lock = LockOrDie( m_Mutex );
-  if ( --m_Fifo.front().m_Count != 0 )
+  const bool bAnnounced = Announce( io_rLine );
+  // The line may have held a commit up until now.
+  if ( m_bDrainWaits.load() )
   {
-    return;
+    WakeDrain();
   }
-  if ( m_bCommitting )
+  if ( !bAnnounced )
   {
-    Lock.unlock();
+    // Commits come too fast. While the mutex is held none is merged, so that a second try is the last.
+    const std::unique_lock Lock = LockOrDie( m_Mutex );
+    while ( !Announce( io_rLine ) )
+    {
+    }
     m_Drain.notify_all();
-    return;
   }
-  DebugServices::Check( m_Fifo.size() == 1, "m_Fifo.size() == 1", __FILE__, __LINE__ );
-  m_Fifo.erase( m_Fifo.begin() );
+  AwaitPhase( io_rLine.m_Phase.load( std::memory_order_relaxed ) );
 }
 
-void VGenerationLock::BeginWrite()
+/// Returns in that phase; for a reader, who has announced it, in that or in the commit that waits for the reader.
+void VGenerationLock::AwaitPhase( std::uint64_t i_Phase )
 {
+  const auto IsThere = [this, i_Phase]
+  {
+    return m_Phase.load( std::memory_order_acquire ) >= i_Phase;
+  };
+  if ( !IsSoon( IsThere ) )
+  {
+    std::unique_lock Lock = LockOrDie( m_Mutex );
+    m_Advance.wait( Lock, IsThere );
+  }
+}
+
+std::unique_lock< std::mutex > VGenerationLock::BeginCommit()
+{
+  const std::uint64_t Phase = m_Phase.load( std::memory_order_relaxed ) + 1;
+  m_Phase.store( Phase );
+  const auto IsDrained = [this, Phase]
+  {
+    return !m_pLines->AnyBefore( Phase );
+  };
+  // Without the mutex: readers may need it for handles before they leave.
+  const bool bDrained = IsSoon( IsDrained );
   std::unique_lock Lock = LockOrDie( m_Mutex );
-  std::uint64_t Target = m_Current.load( std::memory_order_relaxed ) + m_Fifo.size();
-  if ( !m_Fifo.empty() && !m_bWriterQueued )
-  {
-    --Target;
-    ++m_Fifo.back().m_Count;
-  }
-  else
-  {
-    m_Fifo.push_back( { Target, 1 } );
-  }
-  m_bWriterQueued = true;
-  m_Advance.wait( Lock,
-                  [this, Target]
-                  {
-                    return m_Current.load( std::memory_order_relaxed ) == Target;
-                  } );
-}
-
-std::uint64_t VGenerationLock::BeginCommit( std::unique_lock< std::mutex >& io_rLock )
-{
-  --m_Fifo.front().m_Count;
-  m_bCommitting = true;
-  m_bCommit.store( true );
-  // Readers that are in no hurry to be counted are mostly gone before a thread could fall asleep.
-  for ( int Look = 0; Look < 100 && m_Fifo.front().m_Count == 0 && m_pLines->AnyReading(); ++Look )
-  {
-    std::this_thread::yield();
-  }
-  if ( !IsDrained() )
+  if ( !bDrained )
   {
     m_bDrainWaits.store( true );
     // Whoever leaves wakes it; should its look have missed the sleeper, the commit is late by so much and no more.
     while ( !IsDrained() )
     {
-      m_Drain.wait_for( io_rLock, std::chrono::milliseconds( 1 ) );
+      m_Drain.wait_for( Lock, std::chrono::milliseconds( 1 ) );
     }
     m_bDrainWaits.store( false );
   }
-  m_Fifo.erase( m_Fifo.begin() );
-  m_bCommitting = false;
-  const std::uint64_t Number = m_Current.load( std::memory_order_relaxed );
-  m_Current.store( Number + 1, std::memory_order_relaxed );
-  return Number;
+  return Lock;
 }
 
 void VGenerationLock::WakeDrain()
@@ -131,8 +117,8 @@ void VGenerationLock::WakeDrain()
 
 bool VGenerationLock::IsAtRest() const
 {
-  const std::unique_lock Lock = LockOrDie( m_Mutex );
-  return m_Fifo.empty() && !m_bCommitting && !m_bCommit.load() && !m_pLines->AnyReading();
+  const std::uint64_t Phase = m_Phase.load();
+  return !IsCommit( Phase ) && m_NextWriter.load() == Phase / 2 && !m_pLines->AnyBefore( ~std::uint64_t( 0 ) );
 }
 
 } // namespace Store

@@ -7,7 +7,9 @@
 #include <ZEK/StoreFlags.h>
 
 #include <algorithm>
+#include <span>
 #include <utility>
+#include <vector>
 
 namespace Store
 {
@@ -102,11 +104,16 @@ void ApplyExtras( VEntryExtras& io_rOld, VEntryExtras& io_rNew, std::uint64_t i_
 
 /// Brings children that came or went into a list in child order. Few of them are moved in one by one, many by one
 /// pass over the whole list.
-void UpdateChildren( std::vector< VStoreEntry* >& io_rChildren, const std::vector< VStoreEntry* >& i_rAdded,
-                     const std::vector< VStoreEntry* >& i_rGone )
+void UpdateChildren( std::vector< VStoreEntry* >& io_rChildren, std::span< const VPendingChild > i_Moved )
 {
   constexpr std::size_t Few = 8;
-  if ( i_rGone.size() > Few )
+  std::vector< VStoreEntry* > Added;
+  std::vector< VStoreEntry* > Gone;
+  for ( const VPendingChild& rChild : i_Moved )
+  {
+    ( rChild.m_pEntry->m_pState ? Added : Gone ).push_back( rChild.m_pEntry );
+  }
+  if ( Gone.size() > Few )
   {
     std::erase_if( io_rChildren,
                    []( const VStoreEntry* i_pChild )
@@ -116,48 +123,106 @@ void UpdateChildren( std::vector< VStoreEntry* >& io_rChildren, const std::vecto
   }
   else
   {
-    for ( VStoreEntry* const pChild : i_rGone )
+    for ( VStoreEntry* const pChild : Gone )
     {
       io_rChildren.erase( std::lower_bound( io_rChildren.begin(), io_rChildren.end(), pChild, ChildLess ) );
     }
   }
-  if ( i_rAdded.size() > Few )
+  if ( Added.size() > Few )
   {
     const auto Old = static_cast< std::ptrdiff_t >( io_rChildren.size() );
-    io_rChildren.insert( io_rChildren.end(), i_rAdded.begin(), i_rAdded.end() );
+    io_rChildren.insert( io_rChildren.end(), Added.begin(), Added.end() );
     std::inplace_merge( io_rChildren.begin(), io_rChildren.begin() + Old, io_rChildren.end(), ChildLess );
     return;
   }
-  for ( VStoreEntry* const pChild : i_rAdded )
+  for ( VStoreEntry* const pChild : Added )
   {
     io_rChildren.insert( std::lower_bound( io_rChildren.begin(), io_rChildren.end(), pChild, ChildLess ), pChild );
   }
 }
 } // namespace
 
-std::uint64_t VMerge::MergeEntry( VStoreEntry& io_rEntry )
+void VMerge::MergeFrom( VStoreEntry& io_rRoot )
+{
+  // Children first, by the records and not by recursion: a path may have any number of components.
+  VStoreEntry* pEntry = &io_rRoot;
+  Begin( *pEntry );
+  for ( ;; )
+  {
+    VEntryChange& rChange = *pEntry->m_pChange;
+    if ( VStoreEntry* const pChild = MergeLeaves( rChange ) )
+    {
+      pEntry = pChild;
+      continue;
+    }
+    if ( !rChange.m_Children.Moved().empty() )
+    {
+      UpdateChildren( pEntry->m_pState->m_Children, rChange.m_Children.Moved() );
+    }
+    End( *pEntry );
+    if ( pEntry == &io_rRoot )
+    {
+      break;
+    }
+    pEntry = pEntry->m_pParent;
+  }
+  m_rPending.ReleaseAll();
+}
+
+/// Merges the next children of the record. Returns the first that has pending children itself and has only begun;
+/// null at the end.
+VStoreEntry* VMerge::MergeLeaves( VEntryChange& io_rParent )
+{
+  while ( VStoreEntry* const pChild = io_rParent.m_Children.Next() )
+  {
+    Begin( *pChild );
+    if ( pChild->m_pChange->m_bParent )
+    {
+      return pChild;
+    }
+    End( *pChild );
+  }
+  return nullptr;
+}
+
+void VMerge::Begin( VStoreEntry& io_rEntry )
 {
   VEntryChange& rChange = *io_rEntry.m_pChange;
   DebugServices::Check( ( rChange.m_Mask & ChangeMask::Replaced ) != ChangeMask::Replaced, "Added or Removed", __FILE__,
                         __LINE__ );
-  std::uint64_t Flags = 0;
+  rChange.m_bWasThere = io_rEntry.m_pState != nullptr;
+  rChange.m_Told = 0;
   if ( ( rChange.m_Mask & EAdded ) != 0 )
   {
-    MakeState( io_rEntry, Flags );
+    MakeState( io_rEntry, rChange.m_Told );
   }
-  if ( !rChange.m_Children.IsEmpty() )
+  if ( rChange.m_bParent )
   {
-    Flags |= MergeChildren( io_rEntry );
+    rChange.m_Children.Sorted();
   }
-  Apply( io_rEntry, rChange, rChange.m_Mask, Flags );
-  Touch( io_rEntry.m_Handlers, Flags );
+}
+
+void VMerge::End( VStoreEntry& io_rEntry )
+{
+  VEntryChange& rChange = *io_rEntry.m_pChange;
+  Apply( io_rEntry, rChange, rChange.m_Mask, rChange.m_Told );
+  Touch( io_rEntry.m_Handlers, rChange.m_Told );
   if ( ( rChange.m_Mask & ERemoved ) != 0 )
   {
     io_rEntry.m_Values = VEntryValues();
+    io_rEntry.m_pSchema = nullptr;
     io_rEntry.m_pState.reset();
   }
+  if ( io_rEntry.m_pParent != nullptr )
+  {
+    VEntryChange& rParent = *io_rEntry.m_pParent->m_pChange;
+    rParent.m_Told |= Promote( rChange.m_Told );
+    if ( rChange.m_bWasThere != ( io_rEntry.m_pState != nullptr ) )
+    {
+      rParent.m_Children.KeepMoved( io_rEntry );
+    }
+  }
   m_rPending.Release( io_rEntry );
-  return Flags;
 }
 
 void VMerge::MakeState( VStoreEntry& io_rEntry, std::uint64_t& io_rFlags )
@@ -172,35 +237,13 @@ void VMerge::MakeState( VStoreEntry& io_rEntry, std::uint64_t& io_rFlags )
   }
   // Removed and added again: what the scope did not set is gone.
   VEntryState& rState = *io_rEntry.m_pState;
-  rState.m_pSchema = rChange.m_pSchema;
+  io_rEntry.m_pSchema = rChange.m_pSchema;
   std::uint64_t Cleared = ~rChange.m_Mask & ChangeMask::Fields;
   Cleared &= rState.m_pPresentation ? ~std::uint64_t( 0 ) : ~ChangeMask::Presentation;
   Cleared &= rState.m_pExtras ? ~std::uint64_t( 0 ) : ~ChangeMask::Extras;
   VEntryChange Empty;
   Apply( io_rEntry, Empty, Cleared, io_rFlags );
   io_rFlags |= ( rChange.m_Mask & EReAdd ) != 0 ? std::uint64_t( EAdded ) : 0;
-}
-
-std::uint64_t VMerge::MergeChildren( VStoreEntry& io_rEntry )
-{
-  VEntryChange& rChange = *io_rEntry.m_pChange;
-  std::uint64_t Flags = 0;
-  std::vector< VStoreEntry* > Added;
-  std::vector< VStoreEntry* > Gone;
-  for ( VStoreEntry* const pChild : rChange.m_Children.Sorted() )
-  {
-    const bool bWasThere = pChild->m_pState != nullptr;
-    Flags |= Promote( MergeEntry( *pChild ) );
-    if ( bWasThere != ( pChild->m_pState != nullptr ) )
-    {
-      ( bWasThere ? Gone : Added ).push_back( pChild );
-    }
-  }
-  if ( !Added.empty() || !Gone.empty() )
-  {
-    UpdateChildren( io_rEntry.m_pState->m_Children, Added, Gone );
-  }
-  return Flags;
 }
 
 void VMerge::Apply( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
@@ -215,7 +258,7 @@ void VMerge::Apply( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint6
   // Before the fields are looked at: a new entry may have a schema and nothing else.
   if ( ( i_Mask & TakesSchema ) != 0 && io_rChange.m_pSchema != nullptr )
   {
-    rState.m_pSchema = io_rChange.m_pSchema;
+    io_rEntry.m_pSchema = io_rChange.m_pSchema;
   }
   if ( ( i_Mask & ChangeMask::Values ) != 0 )
   {
@@ -278,21 +321,23 @@ void VMerge::Expand( const VEntryTable& i_rTable, const VQueuedRequest& i_rReque
 
 void VMerge::TouchSubtree( const VStoreEntry& i_rEntry, std::uint64_t i_Flags )
 {
-  const std::uint64_t Flags = i_Flags != 0 ? i_Flags
-                              : IsVerificationPending( Committed< VEntryValues >( &i_rEntry ) )
-                                  ? std::uint64_t( EVerificationNeeded )
-                                  : 0;
-  if ( i_rEntry.m_pState )
+  std::vector< const VStoreEntry* > Left{ &i_rEntry };
+  while ( !Left.empty() )
   {
-    Touch( i_rEntry.m_pState->m_Handlers, Flags );
-  }
-  Touch( i_rEntry.m_Handlers, Flags );
-  if ( i_rEntry.m_pState )
-  {
-    for ( const VStoreEntry* const pChild : i_rEntry.m_pState->m_Children )
+    const VStoreEntry& rEntry = *Left.back();
+    Left.pop_back();
+    std::uint64_t Flags = i_Flags;
+    if ( Flags == 0 && IsVerificationPending( rEntry.m_Values ) )
     {
-      TouchSubtree( *pChild, i_Flags );
+      Flags = EVerificationNeeded;
     }
+    if ( rEntry.m_pState )
+    {
+      Touch( rEntry.m_pState->m_Handlers, Flags );
+      // The first child is the next.
+      Left.insert( Left.end(), rEntry.m_pState->m_Children.rbegin(), rEntry.m_pState->m_Children.rend() );
+    }
+    Touch( rEntry.m_Handlers, Flags );
   }
 }
 

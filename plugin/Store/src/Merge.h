@@ -35,14 +35,16 @@ public:
   {
   }
 
-  /// Merges the entry and all below it that have records, and gives the record back. Returns the flags.
-  std::uint64_t MergeEntry( VStoreEntry& io_rEntry );
+  /// Merges all entries that have records, from the root on, and gives the records back.
+  void MergeFrom( VStoreEntry& io_rRoot );
   /// Once all is merged.
   void Expand( const VEntryTable& i_rTable, const VQueuedRequest& i_rRequest );
 
 private:
+  void Begin( VStoreEntry& io_rEntry );
+  VStoreEntry* MergeLeaves( VEntryChange& io_rParent );
+  void End( VStoreEntry& io_rEntry );
   void MakeState( VStoreEntry& io_rEntry, std::uint64_t& io_rFlags );
-  std::uint64_t MergeChildren( VStoreEntry& io_rEntry );
   void Apply( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags );
   void Stamp( VEntryState& io_rState, std::uint64_t i_Flags ) const;
   void Touch( const VHandlerList& i_rHandlers, std::uint64_t i_Flags );

@@ -2,6 +2,8 @@
 
 #include "Resolve.h"
 
+#include <utility>
+
 namespace Store
 {
 namespace
@@ -31,24 +33,46 @@ void VPatternTree::Add( const ZEK::VEntryPath& i_rPattern, VHandlerCallback& i_r
 
 void VPatternTree::Remove( const ZEK::VEntryPath& i_rPattern, const VHandlerCallback& i_rHandler )
 {
-  RemoveBelow( m_Root, Components( i_rPattern.Text() ), i_rHandler );
+  // The nodes on the way, each with the name that leads on.
+  std::vector< std::pair< VNode*, std::string_view > > Way;
+  VNode* pNode = &m_Root;
+  for ( auto Rest = Components( i_rPattern.Text() ); Rest; )
+  {
+    const std::string_view Name = TakeComponent( Rest );
+    const auto It = pNode->m_Children.find( Name );
+    if ( It == pNode->m_Children.end() )
+    {
+      return;
+    }
+    Way.emplace_back( pNode, Name );
+    pNode = It->second.get();
+  }
+  std::erase( pNode->m_Handlers, &i_rHandler );
+  for ( ; !Way.empty() && pNode->IsUnused(); Way.pop_back() )
+  {
+    pNode = Way.back().first;
+    pNode->m_Children.erase( pNode->m_Children.find( Way.back().second ) );
+  }
 }
 
-bool VPatternTree::RemoveBelow( VNode& io_rNode, std::optional< std::string_view > i_Rest,
-                                const VHandlerCallback& i_rHandler )
+VPatternTree::~VPatternTree()
 {
-  if ( !i_Rest )
+  // From the root on, so that no node ends with nodes below it: they would end in one another.
+  std::vector< std::unique_ptr< VNode > > Left;
+  const auto Take = [&Left]( VNode& io_rNode )
   {
-    std::erase( io_rNode.m_Handlers, &i_rHandler );
-  }
-  else if ( const auto It = io_rNode.m_Children.find( TakeComponent( i_Rest ) ); It != io_rNode.m_Children.end() )
-  {
-    if ( RemoveBelow( *It->second, i_Rest, i_rHandler ) )
+    for ( auto& [rName, rpChild] : io_rNode.m_Children )
     {
-      io_rNode.m_Children.erase( It );
+      Left.push_back( std::move( rpChild ) );
     }
+  };
+  Take( m_Root );
+  while ( !Left.empty() )
+  {
+    const std::unique_ptr< VNode > pNode = std::move( Left.back() );
+    Left.pop_back();
+    Take( *pNode );
   }
-  return io_rNode.IsUnused();
 }
 
 void VPatternTree::Match( const VStoreEntry& i_rEntry, VHandlerList& io_rHandlers ) const
@@ -67,11 +91,11 @@ void VPatternTree::Match( const VStoreEntry& i_rEntry, VHandlerList& io_rHandler
   if ( Names.starts_with( '/' ) )
   {
     Names.remove_prefix( 1 );
-    MatchPattern( m_Root, Names, false, io_rHandlers );
+    MatchPatterns( Names, io_rHandlers );
   }
   else
   {
-    MatchPattern( m_Root, Components( Names ), false, io_rHandlers );
+    MatchPatterns( Components( Names ), io_rHandlers );
   }
 }
 
@@ -91,25 +115,37 @@ const VPatternTree::VNode* VPatternTree::FindName( const ZEK::VEntryPath& i_rPat
   return pNode;
 }
 
-void VPatternTree::MatchPattern( const VNode& i_rNode, std::optional< std::string_view > i_Rest, bool i_bStar,
-                                 VHandlerList& io_rHandlers )
+void VPatternTree::MatchPatterns( std::optional< std::string_view > i_Names, VHandlerList& io_rHandlers ) const
 {
-  if ( !i_Rest )
+  struct VPlace
   {
-    if ( i_bStar )
+    const VNode* m_pNode;
+    std::optional< std::string_view > m_Rest;
+    bool m_bStar; ///< there was one on the way
+  };
+  std::vector< VPlace > Left{ { &m_Root, i_Names, false } };
+  while ( !Left.empty() )
+  {
+    VPlace Place = Left.back();
+    Left.pop_back();
+    const VNode& rNode = *Place.m_pNode;
+    if ( !Place.m_Rest )
     {
-      io_rHandlers.insert( io_rHandlers.end(), i_rNode.m_Handlers.begin(), i_rNode.m_Handlers.end() );
+      if ( Place.m_bStar )
+      {
+        io_rHandlers.insert( io_rHandlers.end(), rNode.m_Handlers.begin(), rNode.m_Handlers.end() );
+      }
+      continue;
     }
-    return;
-  }
-  const std::string_view Name = TakeComponent( i_Rest );
-  if ( const auto It = i_rNode.m_Children.find( Name ); Name != "*" && It != i_rNode.m_Children.end() )
-  {
-    MatchPattern( *It->second, i_Rest, i_bStar, io_rHandlers );
-  }
-  if ( const auto It = i_rNode.m_Children.find( std::string_view( "*" ) ); It != i_rNode.m_Children.end() )
-  {
-    MatchPattern( *It->second, i_Rest, true, io_rHandlers );
+    const std::string_view Name = TakeComponent( Place.m_Rest );
+    if ( const auto It = rNode.m_Children.find( std::string_view( "*" ) ); It != rNode.m_Children.end() )
+    {
+      Left.push_back( { It->second.get(), Place.m_Rest, true } );
+    }
+    if ( const auto It = rNode.m_Children.find( Name ); Name != "*" && It != rNode.m_Children.end() )
+    {
+      Left.push_back( { It->second.get(), Place.m_Rest, Place.m_bStar } );
+    }
   }
 }
 

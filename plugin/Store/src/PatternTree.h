@@ -18,6 +18,11 @@ namespace Store
 class VPatternTree
 {
 public:
+  VPatternTree() = default;
+  VPatternTree( const VPatternTree& ) = delete;
+  VPatternTree& operator=( const VPatternTree& ) = delete;
+  ~VPatternTree();
+
   void Add( const ZEK::VEntryPath& i_rPattern, VHandlerCallback& i_rHandler );
   /// Takes the handler off that pattern once for all times it was added, and nodes that are of no use with it.
   void Remove( const ZEK::VEntryPath& i_rPattern, const VHandlerCallback& i_rHandler );
@@ -34,10 +39,7 @@ private:
     VHandlerList m_Handlers;
   };
 
-  static bool RemoveBelow( VNode& io_rNode, std::optional< std::string_view > i_Rest,
-                           const VHandlerCallback& i_rHandler );
-  static void MatchPattern( const VNode& i_rNode, std::optional< std::string_view > i_Rest, bool i_bStar,
-                            VHandlerList& io_rHandlers );
+  void MatchPatterns( std::optional< std::string_view > i_Names, VHandlerList& io_rHandlers ) const;
   const VNode* FindName( const ZEK::VEntryPath& i_rPath ) const;
 
   VNode m_Root;

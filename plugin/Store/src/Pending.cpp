@@ -26,9 +26,9 @@ const IO::ISchema* OverlaidSchema( const VStoreEntry* i_pEntry )
     {
       pSchema = i_pEntry->m_pChange->m_pSchema;
     }
-    if ( pSchema == nullptr && !IsReplaced( *i_pEntry ) && i_pEntry->m_pState )
+    if ( pSchema == nullptr && !IsReplaced( *i_pEntry ) )
     {
-      pSchema = i_pEntry->m_pState->m_pSchema;
+      pSchema = i_pEntry->m_pSchema;
     }
   }
   return pSchema != nullptr ? pSchema : IO::GetUniquePodSchema( IO::EType::Void );
@@ -49,19 +49,32 @@ void ClearChoices( VEntryChange& io_rChange )
 }
 } // namespace
 
-VEntryChange& VPending::Take()
+VEntryChange& VPending::Take( std::uint64_t i_Mask )
 {
-  if ( m_Free.empty() )
+  VEntryChange* pChange = nullptr;
+  if ( !m_Free.empty() )
   {
-    m_Free.push_back( &m_Records.emplace_back() );
+    pChange = m_Free.back();
+    m_Free.pop_back();
   }
-  VEntryChange& rChange = *m_Free.back();
-  m_Free.pop_back();
-  rChange.m_Mask = 0;
-  rChange.m_pSchema = nullptr;
-  rChange.m_Children.Clear();
-  ClearChoices( rChange );
-  return rChange;
+  else
+  {
+    if ( m_Taken == m_Blocks.size() * BlockSize )
+    {
+      m_Blocks.push_back( std::make_unique< VEntryChange[] >( BlockSize ) );
+    }
+    pChange = &m_Blocks[m_Taken / BlockSize][m_Taken % BlockSize];
+    ++m_Taken;
+  }
+  pChange->m_Mask = i_Mask;
+  pChange->m_pSchema = nullptr;
+  if ( pChange->m_bParent )
+  {
+    pChange->m_bParent = false;
+    pChange->m_Children.Clear();
+  }
+  ClearChoices( *pChange );
+  return *pChange;
 }
 
 void VPending::Release( VStoreEntry& io_rEntry )
@@ -76,8 +89,19 @@ void VPending::Release( VStoreEntry& io_rEntry )
   io_rEntry.m_pChange->Extras().m_OptionalText = "stale";
   io_rEntry.m_pChange->Extras().m_Number1 = ~std::uint32_t( 0 );
 #endif
-  m_Free.push_back( io_rEntry.m_pChange );
   io_rEntry.m_pChange = nullptr;
+}
+
+void VPending::ReleaseAll()
+{
+  m_Taken = 0;
+  m_Free.clear();
+}
+
+void VPending::GiveBack( VStoreEntry& io_rEntry )
+{
+  m_Free.push_back( io_rEntry.m_pChange );
+  Release( io_rEntry );
 }
 
 VEntryChange& VPending::Acquire( VStoreEntry& io_rEntry )
@@ -89,11 +113,11 @@ VEntryChange& VPending::Acquire( VStoreEntry& io_rEntry )
     const bool bHad = pEntry->m_pChange != nullptr;
     if ( !bHad )
     {
-      pEntry->m_pChange = &Take();
-      pEntry->m_pChange->m_Mask = pEntry->m_pState ? 0 : std::uint64_t( EAdded );
+      pEntry->m_pChange = &Take( pEntry->m_pState ? 0 : std::uint64_t( EAdded ) );
     }
     if ( pBelow != nullptr )
     {
+      pEntry->m_pChange->m_bParent = true;
       pEntry->m_pChange->m_Children.Add( *pBelow );
     }
     if ( bHad )
@@ -128,10 +152,7 @@ IResult VPending::Remove( VStoreEntry& io_rEntry, bool i_bForce )
   // What was made in this scope goes without a trace, as nobody else has seen it.
   if ( io_rEntry.m_pChange != nullptr )
   {
-    for ( VStoreEntry* const pChild : io_rEntry.m_pChange->m_Children.Sorted() )
-    {
-      ReleaseUnlessMarked( *pChild );
-    }
+    ReleaseUnlessOld( *io_rEntry.m_pChange );
     io_rEntry.m_pChange->m_Children.Clear();
   }
   if ( io_rEntry.m_pState )
@@ -152,31 +173,59 @@ IResult VPending::Remove( VStoreEntry& io_rEntry, bool i_bForce )
   return IResult::Ok;
 }
 
-void VPending::ReleaseUnlessMarked( VStoreEntry& io_rEntry )
+/// Below the record: those without a state go, the others keep no children.
+void VPending::ReleaseUnlessOld( const VEntryChange& i_rChange )
 {
-  for ( VStoreEntry* const pChild : io_rEntry.m_pChange->m_Children.Sorted() )
+  std::vector< VStoreEntry* > Left;
+  const auto Append = [&Left]( const VEntryChange& i_rParent )
   {
-    ReleaseUnlessMarked( *pChild );
-  }
-  io_rEntry.m_pChange->m_Children.Clear();
-  if ( !io_rEntry.m_pState )
+    for ( const VPendingChild& rChild : i_rParent.m_Children.Items() )
+    {
+      if ( rChild.m_pEntry != nullptr )
+      {
+        Left.push_back( rChild.m_pEntry );
+      }
+    }
+  };
+  Append( i_rChange );
+  while ( !Left.empty() )
   {
-    Release( io_rEntry );
+    VStoreEntry& rEntry = *Left.back();
+    Left.pop_back();
+    Append( *rEntry.m_pChange );
+    rEntry.m_pChange->m_Children.Clear();
+    if ( !rEntry.m_pState )
+    {
+      GiveBack( rEntry );
+    }
   }
 }
 
 void VPending::MarkRemoved( VStoreEntry& io_rEntry, bool i_bForce )
 {
-  VEntryChange& rChange = Acquire( io_rEntry );
-  rChange.m_Mask = ( rChange.m_Mask & ChangeMask::Kept ) | ERemoved | ( i_bForce ? std::uint64_t( EForce ) : 0 );
-  rChange.m_pSchema = nullptr;
-  // Should the entry be written again, its lists are not filled from here or from the state.
-  ClearChoices( rChange );
-  for ( VStoreEntry* const pChild : io_rEntry.m_pState->m_Children )
+  Acquire( io_rEntry );
+  std::vector< VStoreEntry* > Left{ &io_rEntry };
+  while ( !Left.empty() )
   {
-    MarkRemoved( *pChild, i_bForce );
+    VStoreEntry& rEntry = *Left.back();
+    Left.pop_back();
+    VEntryChange& rChange = *rEntry.m_pChange;
+    rChange.m_Mask = ( rChange.m_Mask & ChangeMask::Kept ) | ERemoved | ( i_bForce ? std::uint64_t( EForce ) : 0 );
+    rChange.m_pSchema = nullptr;
+    // Should the entry be written again, its lists are not filled from here or from the state.
+    ClearChoices( rChange );
+    const std::vector< VStoreEntry* >& rChildren = rEntry.m_pState->m_Children;
+    for ( VStoreEntry* const pChild : rChildren )
+    {
+      if ( pChild->m_pChange == nullptr )
+      {
+        pChild->m_pChange = &Take( 0 );
+      }
+    }
+    rChange.m_bParent = true;
+    rChange.m_Children.Assign( rChildren );
+    Left.insert( Left.end(), rChildren.begin(), rChildren.end() );
   }
-  rChange.m_Children.Assign( io_rEntry.m_pState->m_Children );
 }
 
 void VPending::Unlink( VStoreEntry& io_rEntry )
@@ -185,7 +234,7 @@ void VPending::Unlink( VStoreEntry& io_rEntry )
   {
     io_rEntry.m_pParent->m_pChange->m_Children.Remove( io_rEntry );
   }
-  Release( io_rEntry );
+  GiveBack( io_rEntry );
 }
 
 } // namespace Store

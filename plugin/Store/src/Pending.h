@@ -7,7 +7,7 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <deque>
+#include <memory>
 #include <vector>
 
 namespace Store
@@ -62,20 +62,26 @@ public:
   VEntryChange& ObtainForWrite( VStoreEntry& io_rEntry );
   /// Removes the entry and all below it. `NotFound` when the scope does not see it.
   ZEK::IResult Remove( VStoreEntry& io_rEntry, bool i_bForce );
-  /// Gives the record back after its merge.
+  /// The merge is through with the record of this entry.
   void Release( VStoreEntry& io_rEntry );
+  /// The merge is through with all entries: records are taken from the first again, in the order of their memory.
+  void ReleaseAll();
   /// The number of records in use.
-  std::size_t InUse() const { return m_Records.size() - m_Free.size(); }
+  std::size_t InUse() const { return m_Taken - m_Free.size(); }
 
 private:
+  static constexpr std::size_t BlockSize = 32;
+
   VEntryChange& Acquire( VStoreEntry& io_rEntry );
-  VEntryChange& Take();
+  VEntryChange& Take( std::uint64_t i_Mask );
+  void GiveBack( VStoreEntry& io_rEntry );
   void MarkRemoved( VStoreEntry& io_rEntry, bool i_bForce );
-  void ReleaseUnlessMarked( VStoreEntry& io_rEntry );
+  void ReleaseUnlessOld( const VEntryChange& i_rChange );
   void Unlink( VStoreEntry& io_rEntry );
 
-  std::deque< VEntryChange > m_Records;
-  std::vector< VEntryChange* > m_Free;
+  std::vector< std::unique_ptr< VEntryChange[] > > m_Blocks;
+  std::size_t m_Taken = 0;             ///< so many at the front were taken
+  std::vector< VEntryChange* > m_Free; ///< of those, given back within the scope
 };
 
 } // namespace Store

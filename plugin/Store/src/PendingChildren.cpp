@@ -43,42 +43,39 @@ int CompareLeaf( const VStoreEntry* i_pEntry, std::string_view i_Name )
   return CompareBytes( i_pEntry->m_Path.LeafView(), i_Name );
 }
 
-VChildRange FindChildren( const std::vector< VStoreEntry* >& i_rSorted, std::string_view i_Name )
+namespace
 {
-  const auto Begin = std::lower_bound( i_rSorted.begin(), i_rSorted.end(), i_Name,
-                                       []( const VStoreEntry* i_pEntry, std::string_view i_Wanted )
-                                       {
-                                         return CompareLeaf( i_pEntry, i_Wanted ) < 0;
-                                       } );
-  auto End = Begin;
-  while ( End != i_rSorted.end() && CompareLeaf( *End, i_Name ) == 0 )
-  {
-    ++End;
-  }
-  return { i_rSorted.data() + ( Begin - i_rSorted.begin() ), i_rSorted.data() + ( End - i_rSorted.begin() ) };
+bool PendingLess( const VPendingChild& i_rA, const VPendingChild& i_rB )
+{
+  return i_rA.m_Key != i_rB.m_Key ? i_rA.m_Key < i_rB.m_Key : ChildLess( i_rA.m_pEntry, i_rB.m_pEntry );
 }
+} // namespace
 
 void VPendingChildren::Add( VStoreEntry& io_rChild )
 {
-  io_rChild.m_pChange->m_Place = m_Items.size();
-  m_Items.push_back( &io_rChild );
+  const std::size_t Place = m_Items.size();
+  io_rChild.m_pChange->m_Place = static_cast< std::uint32_t >( Place );
+  // Many come in order, or alone.
+  m_Sorted += m_Sorted == Place && ( Place == 0 || m_Items.back().m_Key < io_rChild.m_LeafKey ) ? 1 : 0;
+  m_Items.push_back( { io_rChild.m_LeafKey, &io_rChild } );
 }
 
 void VPendingChildren::Remove( VStoreEntry& io_rChild )
 {
-  m_Items[io_rChild.m_pChange->m_Place] = nullptr;
+  m_Items[io_rChild.m_pChange->m_Place].m_pEntry = nullptr;
   ++m_Gone;
 }
 
 void VPendingChildren::Assign( const std::vector< VStoreEntry* >& i_rSorted )
 {
-  m_Items = i_rSorted;
-  m_Sorted = m_Items.size();
-  m_Gone = 0;
-  for ( std::size_t Place = 0; Place < m_Items.size(); ++Place )
+  Clear();
+  m_Items.reserve( i_rSorted.size() );
+  for ( VStoreEntry* const pChild : i_rSorted )
   {
-    m_Items[Place]->m_pChange->m_Place = Place;
+    pChild->m_pChange->m_Place = static_cast< std::uint32_t >( m_Items.size() );
+    m_Items.push_back( { pChild->m_LeafKey, pChild } );
   }
+  m_Sorted = static_cast< std::uint32_t >( m_Items.size() );
 }
 
 void VPendingChildren::Clear()
@@ -86,33 +83,34 @@ void VPendingChildren::Clear()
   m_Items.clear();
   m_Sorted = 0;
   m_Gone = 0;
+  m_Next = 0;
+  m_Moved = 0;
 }
 
-const std::vector< VStoreEntry* >& VPendingChildren::Sorted()
+void VPendingChildren::Sort()
 {
-  if ( m_Gone == 0 && m_Sorted == m_Items.size() )
+  const auto IsGone = []( const VPendingChild& i_rChild )
   {
-    return m_Items;
-  }
+    return i_rChild.m_pEntry == nullptr;
+  };
   const auto Middle = m_Items.begin() + static_cast< std::ptrdiff_t >( m_Sorted );
-  const std::ptrdiff_t Sorted = Middle - m_Items.begin() - std::count( m_Items.begin(), Middle, nullptr );
-  std::erase( m_Items, nullptr );
-  // Often everything is new, and often in order.
-  if ( !std::is_sorted( m_Items.begin() + Sorted, m_Items.end(), ChildLess ) )
+  const std::ptrdiff_t Sorted = Middle - m_Items.begin() - std::count_if( m_Items.begin(), Middle, IsGone );
+  if ( m_Gone != 0 )
   {
-    std::sort( m_Items.begin() + Sorted, m_Items.end(), ChildLess );
+    std::erase_if( m_Items, IsGone );
   }
+  std::sort( m_Items.begin() + Sorted, m_Items.end(), PendingLess );
   if ( Sorted != 0 )
   {
-    std::inplace_merge( m_Items.begin(), m_Items.begin() + Sorted, m_Items.end(), ChildLess );
+    std::inplace_merge( m_Items.begin(), m_Items.begin() + Sorted, m_Items.end(), PendingLess );
   }
-  m_Sorted = m_Items.size();
+  m_Sorted = static_cast< std::uint32_t >( m_Items.size() );
   m_Gone = 0;
-  for ( std::size_t Place = 0; Place < m_Items.size(); ++Place )
+  std::uint32_t Place = 0;
+  for ( const VPendingChild& rChild : m_Items )
   {
-    m_Items[Place]->m_pChange->m_Place = Place;
+    rChild.m_pEntry->m_pChange->m_Place = Place++;
   }
-  return m_Items;
 }
 
 } // namespace Store

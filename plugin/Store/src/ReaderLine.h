@@ -6,11 +6,11 @@
 namespace Store
 {
 
-/// Where one thread says that it is inside a read scope of one store. Nobody else writes the word, and no other word
-/// shares its cache line.
+/// Where one thread says that it is inside a read scope of one store, or waits to be. Nobody else writes the word, and
+/// no other word shares its cache line.
 struct alignas( 64 ) VReaderLine
 {
-  std::atomic< std::uint32_t > m_Reading{ 0 };
+  std::atomic< std::uint64_t > m_Phase{ 0 }; ///< the phase of the lock that it reads in; 0 outside
   std::atomic< bool > m_bTaken{ true };
   VReaderLine* m_pNext = nullptr; ///< fixed before the line is linked
 };
@@ -53,11 +53,13 @@ public:
   }
   static void GiveBack( VReaderLine& io_rLine ) { io_rLine.m_bTaken.store( false, std::memory_order_release ); }
 
-  bool AnyReading() const
+  /// Somebody reads, or will, in a phase before that one.
+  bool AnyBefore( std::uint64_t i_Phase ) const
   {
     for ( const VReaderLine* pLine = m_pHead.load(); pLine != nullptr; pLine = pLine->m_pNext )
     {
-      if ( pLine->m_Reading.load() != 0 )
+      // Outside, 0 becomes the greatest number.
+      if ( pLine->m_Phase.load() - 1 < i_Phase - 1 )
       {
         return true;
       }

@@ -4,6 +4,9 @@
 
 #include <ZEK/StoreFlags.h>
 
+#include <algorithm>
+#include <span>
+
 namespace Store
 {
 namespace
@@ -12,71 +15,104 @@ using ZEK::ChangeMask::Replaced;
 using VRest = std::optional< std::string_view >;
 using VFound = std::vector< VStoreEntry* >;
 
-void WalkCommitted( VStoreEntry& i_rEntry, VRest i_Rest, VFound& io_rFound )
+/// A place that a walk has still to go to.
+struct VPlace
 {
-  if ( !i_rEntry.m_pState )
+  VStoreEntry* m_pEntry;
+  VRest m_Rest;
+  std::uint64_t m_Skip; ///< an entry whose pending record has one of these bits ends its branch
+};
+using VPlaces = std::vector< VPlace >;
+
+VFound WalkCommitted( VStoreEntry& i_rRoot, VRest i_Rest )
+{
+  VFound Found;
+  VPlaces Left{ { &i_rRoot, i_Rest, 0 } };
+  while ( !Left.empty() )
   {
-    return;
+    VPlace Place = Left.back();
+    Left.pop_back();
+    if ( !Place.m_pEntry->m_pState )
+    {
+      continue;
+    }
+    if ( !Place.m_Rest )
+    {
+      Found.push_back( Place.m_pEntry );
+      continue;
+    }
+    const VFound& rChildren = Place.m_pEntry->m_pState->m_Children;
+    const std::string_view Name = TakeComponent( Place.m_Rest );
+    const std::span< VStoreEntry* const > Next = Name == "*" ? rChildren : FindChildren( rChildren, Name );
+    // The first is the next.
+    for ( std::size_t Child = Next.size(); Child-- != 0; )
+    {
+      Left.push_back( { Next[Child], Place.m_Rest, 0 } );
+    }
   }
-  if ( !i_Rest )
-  {
-    io_rFound.push_back( &i_rEntry );
-    return;
-  }
-  const VFound& rChildren = i_rEntry.m_pState->m_Children;
-  const std::string_view Name = TakeComponent( i_Rest );
-  const VChildRange Range = Name == "*" ? VChildRange{ rChildren.data(), rChildren.data() + rChildren.size() }
-                                        : FindChildren( rChildren, Name );
-  for ( VStoreEntry* const pChild : Range )
-  {
-    WalkCommitted( *pChild, i_Rest, io_rFound );
-  }
+  return Found;
 }
 
-/// An entry whose pending record has a bit of `i_Skip` ends its branch.
-void WalkOverlaid( VStoreEntry& i_rEntry, VRest i_Rest, std::uint64_t i_Skip, VFound& io_rFound )
+void AppendOverlaid( const VPlace& i_rFrom, std::string_view i_Name, VPlaces& io_rLeft )
 {
-  VEntryChange* const pChange = i_rEntry.m_pChange;
-  if ( pChange != nullptr && ( pChange->m_Mask & i_Skip ) != 0 )
-  {
-    return;
-  }
-  if ( !i_Rest )
-  {
-    io_rFound.push_back( &i_rEntry );
-    return;
-  }
-  static const VFound None;
-  const VFound& rCommitted = i_rEntry.m_pState ? i_rEntry.m_pState->m_Children : None;
-  const VFound& rPending = pChange != nullptr ? pChange->m_Children.Sorted() : None;
-  const std::string_view Name = TakeComponent( i_Rest );
-  if ( Name == "*" )
+  static const VFound NoneCommitted;
+  static const std::vector< VPendingChild > NonePending;
+  const VStoreEntry& rEntry = *i_rFrom.m_pEntry;
+  const VFound& rCommitted = rEntry.m_pState ? rEntry.m_pState->m_Children : NoneCommitted;
+  const auto& rPending = rEntry.m_pChange != nullptr ? rEntry.m_pChange->m_Children.Sorted() : NonePending;
+  if ( i_Name == "*" )
   {
     // Entries that are added again are in both lists, and are visited in the second.
     for ( VStoreEntry* const pChild : rCommitted )
     {
-      WalkOverlaid( *pChild, i_Rest, Replaced, io_rFound );
+      io_rLeft.push_back( { pChild, i_rFrom.m_Rest, Replaced } );
     }
-    for ( VStoreEntry* const pChild : rPending )
+    for ( const VPendingChild& rChild : rPending )
     {
-      if ( ( pChild->m_pChange->m_Mask & ZEK::EAdded ) != 0 )
+      if ( ( rChild.m_pEntry->m_pChange->m_Mask & ZEK::EAdded ) != 0 )
       {
-        WalkOverlaid( *pChild, i_Rest, ZEK::ERemoved, io_rFound );
+        io_rLeft.push_back( { rChild.m_pEntry, i_rFrom.m_Rest, ZEK::ERemoved } );
       }
     }
     return;
   }
-  for ( VStoreEntry* const pChild : FindChildren( rCommitted, Name ) )
+  for ( VStoreEntry* const pChild : FindChildren( rCommitted, i_Name ) )
   {
-    WalkOverlaid( *pChild, i_Rest, ZEK::ERemoved, io_rFound );
+    io_rLeft.push_back( { pChild, i_rFrom.m_Rest, ZEK::ERemoved } );
   }
-  for ( VStoreEntry* const pChild : FindChildren( rPending, Name ) )
+  for ( const VPendingChild& rChild : FindChildren( rPending, i_Name ) )
   {
-    if ( !pChild->m_pState )
+    if ( !rChild.m_pEntry->m_pState )
     {
-      WalkOverlaid( *pChild, i_Rest, ZEK::ERemoved, io_rFound );
+      io_rLeft.push_back( { rChild.m_pEntry, i_rFrom.m_Rest, ZEK::ERemoved } );
     }
   }
+}
+
+VFound WalkOverlaid( VStoreEntry& i_rRoot, VRest i_Rest )
+{
+  VFound Found;
+  VPlaces Left{ { &i_rRoot, i_Rest, ZEK::ERemoved } };
+  while ( !Left.empty() )
+  {
+    VPlace Place = Left.back();
+    Left.pop_back();
+    const VEntryChange* const pChange = Place.m_pEntry->m_pChange;
+    if ( pChange != nullptr && ( pChange->m_Mask & Place.m_Skip ) != 0 )
+    {
+      continue;
+    }
+    if ( !Place.m_Rest )
+    {
+      Found.push_back( Place.m_pEntry );
+      continue;
+    }
+    const std::string_view Name = TakeComponent( Place.m_Rest );
+    const auto Old = static_cast< std::ptrdiff_t >( Left.size() );
+    AppendOverlaid( Place, Name, Left );
+    std::reverse( Left.begin() + Old, Left.end() );
+  }
+  return Found;
 }
 } // namespace
 
@@ -110,12 +146,12 @@ std::string_view TakeComponent( VRest& io_rRest )
 
 std::vector< VStoreEntry* > FindCommitted( const VEntryTable& i_rTable, const ZEK::VEntryPath& i_rPath )
 {
-  VFound Found;
   if ( IsPattern( i_rPath ) )
   {
-    WalkCommitted( const_cast< VStoreEntry& >( i_rTable.Root() ), i_rPath.Text(), Found );
+    return WalkCommitted( const_cast< VStoreEntry& >( i_rTable.Root() ), i_rPath.Text() );
   }
-  else if ( VStoreEntry* const pEntry = i_rTable.Find( i_rPath ); pEntry != nullptr && pEntry->m_pState )
+  VFound Found;
+  if ( VStoreEntry* const pEntry = i_rTable.Find( i_rPath ); pEntry != nullptr && pEntry->m_pState )
   {
     Found.push_back( pEntry );
   }
@@ -124,12 +160,12 @@ std::vector< VStoreEntry* > FindCommitted( const VEntryTable& i_rTable, const ZE
 
 std::vector< VStoreEntry* > FindOverlaid( const VEntryTable& i_rTable, const ZEK::VEntryPath& i_rPath )
 {
-  VFound Found;
   if ( IsPattern( i_rPath ) )
   {
-    WalkOverlaid( const_cast< VStoreEntry& >( i_rTable.Root() ), i_rPath.Text(), ZEK::ERemoved, Found );
+    return WalkOverlaid( const_cast< VStoreEntry& >( i_rTable.Root() ), i_rPath.Text() );
   }
-  else if ( VStoreEntry* const pEntry = i_rTable.Find( i_rPath ); pEntry != nullptr && IsThere( *pEntry ) )
+  VFound Found;
+  if ( VStoreEntry* const pEntry = i_rTable.Find( i_rPath ); pEntry != nullptr && IsThere( *pEntry ) )
   {
     Found.push_back( pEntry );
   }

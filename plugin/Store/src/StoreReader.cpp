@@ -55,8 +55,8 @@ IStoreReader::Entry VStoreReader::Child( Entry i_pEntry, const std::string& i_rN
   {
     return nullptr;
   }
-  const VChildRange Range = FindChildren( i_pEntry->m_pState->m_Children, i_rName );
-  return Range.begin() != Range.end() ? *Range.begin() : nullptr;
+  const auto Found = FindChildren( i_pEntry->m_pState->m_Children, i_rName );
+  return Found.empty() ? nullptr : Found.front();
 }
 
 bool VStoreReader::Exists( Entry i_pEntry ) const
@@ -66,7 +66,7 @@ bool VStoreReader::Exists( Entry i_pEntry ) const
 
 const IO::ISchema* VStoreReader::Schema( Entry i_pEntry ) const
 {
-  const IO::ISchema* const pSchema = VStoreReader::Exists( i_pEntry ) ? i_pEntry->m_pState->m_pSchema : nullptr;
+  const IO::ISchema* const pSchema = i_pEntry != nullptr ? i_pEntry->m_pSchema : nullptr;
   return pSchema != nullptr ? pSchema : IO::GetUniquePodSchema( IO::EType::Void );
 }
 

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <span>
 #include <utility>
 
 // The reading side: the scope's own writes over what is committed.
@@ -23,26 +24,24 @@ const std::vector< VStoreEntry* >& CommittedChildren( const VStoreEntry& i_rEntr
   return i_rEntry.m_pState ? i_rEntry.m_pState->m_Children : None;
 }
 
-const std::vector< VStoreEntry* >& PendingChildren( const VStoreEntry& i_rEntry )
+const std::vector< VPendingChild >& PendingChildren( const VStoreEntry& i_rEntry )
 {
-  static const std::vector< VStoreEntry* > None;
+  static const std::vector< VPendingChild > None;
   return i_rEntry.m_pChange != nullptr ? i_rEntry.m_pChange->m_Children.Sorted() : None;
 }
 
-bool IsAdded( const VStoreEntry* i_pEntry )
-{
-  return ( i_pEntry->m_pChange->m_Mask & EAdded ) != 0;
-}
-
 /// The first of those that the scope sees.
-VStoreEntry* FirstThere( const VChildRange& i_rRange )
+template < typename TChild >
+VStoreEntry* FirstThere( std::span< const TChild > i_Children )
 {
-  const auto It = std::find_if( i_rRange.begin(), i_rRange.end(),
-                                []( const VStoreEntry* i_pEntry )
-                                {
-                                  return IsThere( *i_pEntry );
-                                } );
-  return It != i_rRange.end() ? *It : nullptr;
+  for ( const TChild& rChild : i_Children )
+  {
+    if ( IsThere( *EntryOf( rChild ) ) )
+    {
+      return EntryOf( rChild );
+    }
+  }
+  return nullptr;
 }
 } // namespace
 
@@ -83,13 +82,13 @@ std::size_t VStoreWriter::ChildCount( Entry i_pEntry ) const
     return 0;
   }
   std::size_t Count = CommittedChildren( *i_pEntry ).size();
-  for ( const VStoreEntry* const pChild : PendingChildren( *i_pEntry ) )
+  for ( const VPendingChild& rChild : PendingChildren( *i_pEntry ) )
   {
-    if ( !IsThere( *pChild ) )
+    if ( !IsThere( *rChild.m_pEntry ) )
     {
       --Count;
     }
-    else if ( !pChild->m_pState )
+    else if ( !rChild.m_pEntry->m_pState )
     {
       ++Count;
     }
@@ -111,8 +110,13 @@ std::vector< IStoreReader::Entry > VStoreWriter::Children( Entry i_pEntry ) cons
                   return !IsReplaced( *i_pChild );
                 } );
   const auto Old = static_cast< std::ptrdiff_t >( Kept.size() );
-  std::copy_if( PendingChildren( *i_pEntry ).begin(), PendingChildren( *i_pEntry ).end(), std::back_inserter( Kept ),
-                IsAdded );
+  for ( const VPendingChild& rChild : PendingChildren( *i_pEntry ) )
+  {
+    if ( ( rChild.m_pEntry->m_pChange->m_Mask & EAdded ) != 0 )
+    {
+      Kept.push_back( rChild.m_pEntry );
+    }
+  }
   std::inplace_merge( Kept.begin(), Kept.begin() + Old, Kept.end(), ChildLess );
   return Kept;
 }

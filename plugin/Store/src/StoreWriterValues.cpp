@@ -26,11 +26,7 @@ bool Fits( const VStoreEntry& i_rEntry, const IO::ISchema* i_pSchema )
   {
     return pChange->m_pSchema == i_pSchema;
   }
-  if ( IsReplaced( i_rEntry ) || !i_rEntry.m_pState || i_rEntry.m_pState->m_pSchema == nullptr )
-  {
-    return true;
-  }
-  return i_rEntry.m_pState->m_pSchema == i_pSchema;
+  return i_rEntry.m_pSchema == nullptr || i_rEntry.m_pSchema == i_pSchema || IsReplaced( i_rEntry );
 }
 
 void SetVerified( VEntryChange& io_rChange, VTypedValue&& i_rValue )

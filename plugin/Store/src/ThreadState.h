@@ -19,8 +19,8 @@ struct VThreadState
   std::uint64_t m_Serial = 0;   ///< of the store; another one's leavings are never taken for its own
   std::uint32_t m_Depth = 0;    ///< open scopes
   bool m_bWriter = false;       ///< the outermost one writes
-  bool m_bCounted = false;      ///< the outermost one reads, and is counted in the FIFO
   bool m_bDraining = false;     ///< deferred functions are being run
+  bool m_bSpareTaken = false;   ///< by a commit whose end is not over
   std::uint32_t m_Dispatch = 0; ///< commits of this thread whose callbacks are being called
   std::deque< std::function< void() > > m_Deferred;
   VOutbox m_Outbox;

@@ -56,8 +56,7 @@ VStore::~VStore()
 
 std::shared_ptr< VStore > VStore::Self() const
 {
-  return std::const_pointer_cast< VStore >(
-      std::static_pointer_cast< const VStore >( VShared::weak_from_this().lock() ) );
+  return std::static_pointer_cast< VStore >( const_cast< VStore* >( this )->VShared::weak_from_this().lock() );
 }
 
 const VEntryPath& VStore::GetEntryPath( const VEntryPath& i_rPath )
@@ -102,7 +101,7 @@ IStoreReader* VStore::BeginRead()
     return rThread.m_bWriter ? static_cast< IStoreReader* >( &m_Writer ) : &m_Reader;
   }
   rThread.m_bWriter = false;
-  m_Lock.BeginRead( rThread );
+  m_Lock.BeginRead( *rThread.m_pLine );
   return &m_Reader;
 }
 
@@ -121,12 +120,12 @@ void VStore::EndRead()
   rThread.m_Depth = 0;
   if ( rThread.m_Deferred.empty() )
   {
-    m_Lock.EndRead( rThread );
+    m_Lock.EndRead( *rThread.m_pLine );
     return;
   }
   // A deferred function may release the store.
   const std::shared_ptr< VStore > pSelf = Self();
-  m_Lock.EndRead( rThread );
+  m_Lock.EndRead( *rThread.m_pLine );
   VFirstFailure Failure;
   RunDeferred( rThread, Failure );
   Failure.Rethrow();
@@ -161,37 +160,45 @@ void VStore::EndWrite()
   {
     return;
   }
+  // A commit within a callback of another has a delivery of its own.
+  VDelivery Inner;
+  const bool bSpare = !std::exchange( rThread.m_bSpareTaken, true );
+  VDelivery& rDelivery = bSpare ? rThread.m_Spare : Inner;
+  const ChangeId Id = Commit( rDelivery );
   // Callbacks and deferred functions may release the store.
-  const std::shared_ptr< VStore > pSelf = Self();
-  VFirstFailure Failure;
-  VDelivery Delivery = std::move( rThread.m_Spare );
-  ChangeId Id;
-  const bool bDeliver = Commit( Delivery, Id );
+  const bool bCalls = !rDelivery.m_Touched.empty() || !rThread.m_Deferred.empty();
+  const std::shared_ptr< VStore > pSelf = bCalls ? Self() : nullptr;
   m_Lock.Advance();
-  if ( bDeliver )
+  VFirstFailure Failure;
+  if ( bCalls )
   {
-    Deliver( rThread, Delivery, Id, Failure );
+    Deliver( rThread, rDelivery, Id, Failure );
+    rDelivery.Clear();
+    RunDeferred( rThread, Failure );
   }
-  Delivery.Clear();
-  rThread.m_Spare = std::move( Delivery );
-  RunDeferred( rThread, Failure );
+  if ( bSpare )
+  {
+    rThread.m_bSpareTaken = false;
+  }
   Failure.Rethrow();
 }
 
-bool VStore::Commit( VDelivery& io_rDelivery, ChangeId& o_rId )
+ChangeId VStore::Commit( VDelivery& io_rDelivery )
 {
-  std::vector< VQueuedRequest > Requests;
-  std::unique_lock Lock = LockOrDie( m_Lock.Mutex() );
-  o_rId = ChangeId( m_Lock.BeginCommit( Lock ) );
-  VMerge Merge( m_Registry, m_Pending, io_rDelivery, o_rId );
+  const std::unique_lock Lock = m_Lock.BeginCommit();
+  const ChangeId Id( m_Lock.Commit() );
+  VMerge Merge( m_Registry, m_Pending, io_rDelivery, Id );
   if ( m_Table.Root().m_pChange != nullptr )
   {
-    Merge.MergeEntry( m_Table.Root() );
+    Merge.MergeFrom( m_Table.Root() );
   }
-  Requests.swap( m_Requests );
-  for ( const VQueuedRequest& rRequest : Requests )
+  if ( !m_Requests.empty() )
   {
-    Merge.Expand( m_Table, rRequest );
+    for ( const VQueuedRequest& rRequest : m_Requests )
+    {
+      Merge.Expand( m_Table, rRequest );
+    }
+    m_Requests.clear();
   }
   for ( const std::shared_ptr< VHandlerCallback >& rpHandler : io_rDelivery.m_Touched )
   {
@@ -201,11 +208,11 @@ bool VStore::Commit( VDelivery& io_rDelivery, ChangeId& o_rId )
     }
     else
     {
-      rpHandler->Collect( o_rId, io_rDelivery );
+      rpHandler->Collect( Id, io_rDelivery );
     }
   }
   m_Lock.EndCommit();
-  return !m_bClosing;
+  return Id;
 }
 
 void VStore::Deliver( VThreadState& io_rThread, VDelivery& io_rDelivery, ChangeId i_Id, VFirstFailure& io_rFailure )

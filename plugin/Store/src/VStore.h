@@ -59,8 +59,8 @@ private:
 
   VThreadState& Thread() const { return m_Slot.Get( m_Lock.Lines() ); }
   std::shared_ptr< VHandlerCallback > MakeHandler( const ZEK::VEntryPatternSet& i_rSet );
-  /// Merges under the mutex. False when nothing is to be delivered.
-  bool Commit( VDelivery& io_rDelivery, ZEK::ChangeId& o_rId );
+  /// Merges under the mutex.
+  ZEK::ChangeId Commit( VDelivery& io_rDelivery );
   void Deliver( VThreadState& io_rThread, VDelivery& io_rDelivery, ZEK::ChangeId i_Id, VFirstFailure& io_rFailure );
   static void RunDeferred( VThreadState& io_rThread, VFirstFailure& io_rFailure );
 
