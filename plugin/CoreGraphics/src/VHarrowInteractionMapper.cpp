@@ -7,9 +7,28 @@ namespace CoreGraphics
 
 VHarrowInteractionMapper::VHarrowInteractionMapper( std::shared_ptr< ZEK::IPostalService > i_pPostal,
                                                     std::shared_ptr< ZEK::IStore > i_pStore )
-  : m_pStore( std::move( i_pStore ) )
+  : m_Preferences( std::move( i_pStore ) )
   , m_pPostal( std::move( i_pPostal ) )
 {
+}
+
+void VHarrowInteractionMapper::Start()
+{
+  if ( m_pPostal )
+  {
+    // Before the value is read: a change in between is told, and one before is read. Without the entry the default
+    // holds.
+    m_Connection = m_Preferences.AltToSelect().Connect(
+        [pWeak = Weak( this )]( ZEK::IBitFlags< ZEK::EChangeFlags >, ZEK::ChangeId )
+        {
+          if ( const auto pSelf = pWeak.lock() )
+          {
+            (void)pSelf->m_Preferences.AltToSelect().Read( pSelf->m_bAltToSelect );
+          }
+        },
+        m_pPostal, ZEK::EChangeVerified | ZEK::ERemoved );
+  }
+  (void)m_Preferences.AltToSelect().Read( m_bAltToSelect );
 }
 
 bool VHarrowInteractionMapper::IsAction( int i_Action, int i_Buttons, int i_Modifiers ) const

@@ -1,7 +1,7 @@
 #include <HarrowGraphics/VQMLSceneWidget.h>
 
-#include <CoreGraphics/VHarrowInteractionMapper.h>
 #include <MoxelGraphics/VMoxelScene.h>
+#include <ZEK/CoreUserPreferences.h>
 
 #include <QtCore/QMimeData>
 #include <QtGui/QDragEnterEvent>
@@ -39,6 +39,10 @@ VQMLSceneWidget::VQMLSceneWidget( VSceneWidgetArguments i_Arguments )
   : VQuickWidget( i_Arguments.pQuickHost )
   , m_Arguments( std::move( i_Arguments ) )
 {
+  if ( m_Arguments.pStore )
+  {
+    m_pPreferences = std::make_shared< ZEK::ICoreUserPreferencesLayout >( m_Arguments.pStore );
+  }
   InitSceneDocuments();
   PublishContext();
   connect( this, &QQuickWidget::statusChanged, this, &VQMLSceneWidget::FindSceneItem );
@@ -142,17 +146,23 @@ void VQMLSceneWidget::OnFocus()
 
 bool VQMLSceneWidget::altToSelect() const
 {
-  const auto pMapper =
-      std::dynamic_pointer_cast< CoreGraphics::VHarrowInteractionMapper >( CoreGraphics::InteractionMapper() );
-  return pMapper && pMapper->AltToSelect();
+  bool bAltSelects = false;
+  if ( m_pPreferences )
+  {
+    (void)m_pPreferences->AltToSelect().Read( bAltSelects );
+  }
+  return bAltSelects;
 }
 
 void VQMLSceneWidget::setAltToSelect( bool i_bOn )
 {
-  if ( const auto pMapper =
-           std::dynamic_pointer_cast< CoreGraphics::VHarrowInteractionMapper >( CoreGraphics::InteractionMapper() ) )
+  if ( m_pPreferences )
   {
-    pMapper->SetAltToSelect( i_bOn );
+    ZEK::VStoreWriteScope Scope( *m_pPreferences->Store() );
+    if ( Scope )
+    {
+      (void)Scope->SetValue( m_pPreferences->AltToSelect().Entry(), ZEK::IO::MakeValue( i_bOn ) );
+    }
   }
 }
 

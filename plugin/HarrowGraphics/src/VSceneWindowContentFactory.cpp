@@ -32,6 +32,7 @@ void VSceneWindowContentFactory::Create(
   Arguments.pPostal = m_rApplication.PostalService();
   Arguments.pWidgetService = m_rApplication.WidgetService();
   Arguments.pActivityMode = m_rApplication.ActivityMode();
+  Arguments.pStore = m_rApplication.Store();
   Arguments.Kind = m_Kind;
   m_rApplication.FeatureFlagSource()->GetFlags( Arguments.FeatureFlags );
   Arguments.bVolumeManipulator = m_rApplication.VolumeManipulator() != nullptr;

@@ -4,7 +4,6 @@
 #include <HarrowGraphics/VSceneWindowContent.h>
 #include <HarrowGraphics/VSceneWindowContentFactory.h>
 
-#include <CoreGraphics/VHarrowInteractionMapper.h>
 #include <HostServices/VHost.h>
 #include <HostServices/VStateJson.h>
 #include <TestSupport/LogGuard.h>

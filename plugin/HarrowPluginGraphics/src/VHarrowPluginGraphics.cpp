@@ -1,5 +1,7 @@
 #include "VHarrowPluginGraphics.h"
 
+#include "VFolderPreferenceWatcher.h"
+
 #include <CoreGraphics/VHarrowInteractionMapper.h>
 #include <HarrowGraphics/VSceneManager.h>
 #include <HarrowGraphics/VSceneWindowContentFactory.h>
@@ -32,9 +34,15 @@ bool VHarrowPluginGraphics::CreateWorkspaceContent( HarrowPluginInterface::IHarr
                                                     HarrowPluginInterface::IHarrowWorkspace& io_rWorkspace )
 {
   const auto pFactories = io_rWorkspace.ContentFactories();
-  const auto pResources = io_rWorkspace.RenderResources();
   std::uint32_t Flags = 0;
   io_rApplication.FeatureFlagSource()->GetFlags( Flags );
+  const auto pResources = io_rWorkspace.RenderResources();
+
+  if ( const auto pMeshCache = io_rWorkspace.MeshCache() )
+  {
+    m_pFolderWatcher = WatchFolderPreferences( io_rApplication.Store(), io_rApplication.PostalService(),
+                                               FindMeshBaseFolders( *io_rApplication.Paths(), Flags ), pMeshCache );
+  }
 
   const auto pSceneManager = std::make_shared< HarrowGraphics::VSceneManager >( io_rApplication, io_rWorkspace );
   pFactories->AddFactory(
@@ -71,6 +79,7 @@ bool VHarrowPluginGraphics::CreateWorkspaceContent( HarrowPluginInterface::IHarr
 
 void VHarrowPluginGraphics::ReleaseGraphics()
 {
+  m_pFolderWatcher.reset();
   CoreGraphics::SetInteractionMapper( nullptr );
 }
 

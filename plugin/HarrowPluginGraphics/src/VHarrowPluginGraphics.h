@@ -1,6 +1,9 @@
 #pragma once
 
 #include <HarrowPluginInterface/IPlugin.h>
+#include <ZEK/Shared.h>
+
+#include <memory>
 
 namespace HarrowPluginGraphics
 {
@@ -13,6 +16,9 @@ public:
   bool CreateWorkspaceContent( HarrowPluginInterface::IHarrowApplication& io_rApplication,
                                HarrowPluginInterface::IHarrowWorkspace& io_rWorkspace ) override;
   void ReleaseGraphics() override;
+
+private:
+  std::shared_ptr< ZEK::VShared > m_pFolderWatcher; ///< none without a mesh cache
 };
 
 } // namespace HarrowPluginGraphics

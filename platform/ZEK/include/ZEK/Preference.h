@@ -7,6 +7,7 @@
 #include <ZEK/Store.h>
 #include <ZEK/StoreValue.h>
 
+#include <cstdint>
 #include <memory>
 #include <utility>
 
@@ -77,16 +78,17 @@ public:
   /// The value of the entry, or a `VStoreException`; the default is not asked.
   T Get( const IStoreReader& i_rReader ) const { return GetValue< T >( i_rReader, Entry() ); }
 
-  /// Tells of new values, also when the entry comes and goes: once for several that are waiting. The service is that
-  /// of `IHandlerCallbackProxy::Connect`; without a store nothing is connected.
-  [[nodiscard]] VConnection Connect( ChangeFunction i_Function, std::shared_ptr< IPostalService > i_pService ) const
+  /// Tells of new values, or of what the mask names: once for several that are waiting. That an entry was removed is
+  /// no new value. The service is that of `IHandlerCallbackProxy::Connect`; without a store nothing is connected.
+  [[nodiscard]] VConnection Connect( ChangeFunction i_Function, std::shared_ptr< IPostalService > i_pService,
+                                     std::uint64_t i_Mask = EChangeVerified ) const
   {
     if ( m_pStore == nullptr )
     {
       return {};
     }
     return m_pStore->RegisterHandler( { { Entry() }, {} } )
-        ->CreateProxy( EChangeVerified, IHandlerCallback::LatestOnly )
+        ->CreateProxy( i_Mask, IHandlerCallback::LatestOnly )
         .Connect( std::move( i_Function ), std::move( i_pService ) );
   }
 

@@ -16,6 +16,11 @@ namespace MoxelGraphics
 class VMoxelScene;
 }
 
+namespace ZEK
+{
+class ICoreUserPreferencesLayout;
+}
+
 namespace HarrowGraphics
 {
 
@@ -36,6 +41,7 @@ struct VSceneWidgetArguments
   std::shared_ptr< ZEK::IPostalService > pPostal;
   std::shared_ptr< HarrowPluginInterface::IWidgetService > pWidgetService; ///< may be null
   std::shared_ptr< HarrowPluginInterface::IActivityMode > pActivityMode;   ///< may be null
+  std::shared_ptr< ZEK::IStore > pStore;                                   ///< may be null
   EWindowKind Kind = EWindowKind3D;
   std::uint32_t FeatureFlags = 0;
   bool bVolumeManipulator = false;
@@ -70,8 +76,9 @@ public slots:
   void OnViewSettingsToggled( bool i_bChecked );
   void OnCameraTypeChanged( int i_Index );
   void OnFocus();
+  /// The preference; false without a store.
   bool altToSelect() const;
-  /// Swaps navigation and selection between the plain mouse and Alt, in every view.
+  /// Sets the preference: navigation and selection swap between the plain mouse and Alt, in every view.
   void setAltToSelect( bool i_bOn );
   bool selectionHasBounds() const;
   bool selectionHasPose() const;
@@ -95,6 +102,7 @@ private:
   void ScaleManipulator( float i_Factor );
 
   VSceneWidgetArguments m_Arguments;
+  std::shared_ptr< ZEK::ICoreUserPreferencesLayout > m_pPreferences; ///< null without a store
   QTimer m_UpdateTimer;
   QPointer< MoxelGraphics::VSceneFramebufferObject > m_pSceneItem;
   uint m_PoseIndex = 0;
