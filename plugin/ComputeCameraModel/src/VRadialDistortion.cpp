@@ -66,6 +66,10 @@ VRadialDistortion::VRadialDistortion( VLensCalibration i_LensCalibration )
 
 void VRadialDistortion::FindDomain()
 {
+  if ( !std::isfinite( m_K[0] + m_K[1] + m_K[2] ) )
+  {
+    return;
+  }
   if ( std::none_of( m_K.begin(), m_K.end(),
                      []( double i_K )
                      {
