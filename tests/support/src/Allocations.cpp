@@ -1,0 +1,34 @@
+#include <TestSupport/Allocations.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <new>
+
+static std::atomic< std::uint64_t > s_Allocations{ 0 };
+
+#if !defined( __SANITIZE_ADDRESS__ ) && !defined( __SANITIZE_THREAD__ )
+void* operator new( std::size_t i_Size )
+{
+  s_Allocations.fetch_add( 1, std::memory_order_relaxed );
+  if ( void* const pMemory = std::malloc( i_Size ? i_Size : 1 ) )
+  {
+    return pMemory;
+  }
+  throw std::bad_alloc();
+}
+
+void operator delete( void* i_pMemory ) noexcept
+{
+  std::free( i_pMemory );
+}
+
+void operator delete( void* i_pMemory, std::size_t ) noexcept
+{
+  std::free( i_pMemory );
+}
+#endif
+
+std::uint64_t TestSupport::AllocationCount()
+{
+  return s_Allocations.load( std::memory_order_relaxed );
+}
