@@ -154,18 +154,6 @@ bool VQMLSceneWidget::altToSelect() const
   return bAltSelects;
 }
 
-void VQMLSceneWidget::setAltToSelect( bool i_bOn )
-{
-  if ( m_pPreferences )
-  {
-    ZEK::VStoreWriteScope Scope( *m_pPreferences->Store() );
-    if ( Scope )
-    {
-      (void)Scope->SetValue( m_pPreferences->AltToSelect().Entry(), ZEK::IO::MakeValue( i_bOn ) );
-    }
-  }
-}
-
 bool VQMLSceneWidget::selectionHasBounds() const
 {
   return !m_Arguments.pScene->GetSelectionPositions( m_Arguments.pSelection->Get( ZEK::ISelectionService::EPrimary ) )

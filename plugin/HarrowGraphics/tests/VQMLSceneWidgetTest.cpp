@@ -7,6 +7,7 @@
 #include <HostServices/VHost.h>
 #include <HostServices/VStateJson.h>
 #include <TestSupport/LogGuard.h>
+#include <ZEK/CoreUserPreferences.h>
 
 #include <QtCore/QCoreApplication>
 #include <QtCore/QElapsedTimer>
@@ -140,6 +141,25 @@ TEST_F( SceneWindow, CommandsAnswerForTheirConditions )
   EXPECT_FLOAT_EQ( rWidget.SceneItem()->Options().ManipulatorScale, 10.0F );
   EXPECT_TRUE( pContent->ExecuteCommand( "Workspace3d:ToggleSelectedMarkerCount" ) );
   EXPECT_TRUE( rWidget.SceneItem()->Options().SelectedReconCount );
+}
+
+TEST_F( SceneWindow, AltToSelectIsThePreferenceOfTheStore )
+{
+  const ZEK::ICoreUserPreferencesLayout Layout( Host.Application().Store() );
+  const auto pContent = Open();
+  auto& rWidget = pContent->SceneWidget();
+  EXPECT_TRUE( rWidget.altToSelect() );
+  {
+    ZEK::VStoreWriteScope Scope( *Layout.Store() );
+    ASSERT_TRUE( Scope->SetValue( Layout.AltToSelect().Entry(), ZEK::IO::MakeValue( false ) ).IsOk() );
+  }
+  EXPECT_FALSE( rWidget.altToSelect() );
+  HarrowGraphics::VSceneWidgetArguments Arguments;
+  Arguments.pScene = pManager->ForContext( Host.Contexts()->Find( "Live" ) );
+  Arguments.pQuickHost = Host.Workspace().QuickHost();
+  Arguments.pSelection = Host.Selection();
+  HarrowGraphics::VQMLSceneWidget Alone( Arguments );
+  EXPECT_FALSE( Alone.altToSelect() ) << "there is no layout without a store";
 }
 
 TEST_F( SceneWindow, OptionsSurviveSavingAndOddOnesAreLeftOut )

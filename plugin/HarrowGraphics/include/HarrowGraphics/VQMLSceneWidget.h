@@ -76,10 +76,8 @@ public slots:
   void OnViewSettingsToggled( bool i_bChecked );
   void OnCameraTypeChanged( int i_Index );
   void OnFocus();
-  /// The preference; false without a store.
+  /// The preference: whether Alt selects and the plain mouse navigates. False without a store.
   bool altToSelect() const;
-  /// Sets the preference: navigation and selection swap between the plain mouse and Alt, in every view.
-  void setAltToSelect( bool i_bOn );
   bool selectionHasBounds() const;
   bool selectionHasPose() const;
   void setTracking( MoxelGraphics::ETracking i_Tracking );
