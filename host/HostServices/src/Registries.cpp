@@ -247,33 +247,50 @@ void VRenderResources::Reload()
 
 namespace
 {
+constexpr int MergedCommand = 1;
+
 class VFunctionCommand final : public QUndoCommand
 {
 public:
-  VFunctionCommand( const QString& i_rText, std::function< void() > i_Redo, std::function< void() > i_Undo )
+  VFunctionCommand( const QString& i_rText, std::function< void() > i_Redo, std::function< void() > i_Undo,
+                    const QString& i_rMergeKey )
     : QUndoCommand( i_rText )
     , m_Redo( std::move( i_Redo ) )
     , m_Undo( std::move( i_Undo ) )
+    , m_MergeKey( i_rMergeKey )
   {
   }
 
+  int id() const override { return m_MergeKey.isEmpty() ? -1 : MergedCommand; }
+  bool mergeWith( const QUndoCommand* i_pNewer ) override
+  {
+    const auto* const pNewer = static_cast< const VFunctionCommand* >( i_pNewer );
+    if ( pNewer->m_MergeKey != m_MergeKey )
+    {
+      return false;
+    }
+    m_Redo = pNewer->m_Redo;
+    return true;
+  }
   void redo() override { m_Redo(); }
   void undo() override { m_Undo(); }
 
 private:
   std::function< void() > m_Redo;
   std::function< void() > m_Undo;
+  QString m_MergeKey;
 };
 } // namespace
 
-void VUndoStack::Push( const QString& i_rText, std::function< void() > i_Redo, std::function< void() > i_Undo )
+void VUndoStack::Push( const QString& i_rText, std::function< void() > i_Redo, std::function< void() > i_Undo,
+                       const QString& i_rMergeKey )
 {
   if ( !i_Redo || !i_Undo )
   {
     ZEK::Log( Category(), ZEK::ELogWarning, "Step %1% cannot be undone or redone", i_rText.toStdString() );
     return;
   }
-  m_Stack.push( new VFunctionCommand( i_rText, std::move( i_Redo ), std::move( i_Undo ) ) );
+  m_Stack.push( new VFunctionCommand( i_rText, std::move( i_Redo ), std::move( i_Undo ), i_rMergeKey ) );
 }
 
 } // namespace HostServices

@@ -1,6 +1,9 @@
 #include <HostServices/VHost.h>
 
+#include <HostServices/VUserPreferences.h>
+
 #include <HostFlow/VFlowFramework.h>
+#include <Store/Store.h>
 
 #include <ZEK/Log.h>
 
@@ -10,6 +13,9 @@ namespace HostServices
 {
 namespace
 {
+/// About the number of settings to come.
+constexpr std::size_t StoreBuckets = 4096;
+
 std::filesystem::path PreferencesPath( const VHostOptions& i_rOptions )
 {
   if ( !i_rOptions.Preferences.empty() )
@@ -52,7 +58,7 @@ struct VHost::VState final : public HarrowPluginInterface::IHarrowApplication,
 
   // What a plug-in asks the application for; what this host does not have is null.
   std::shared_ptr< HarrowPluginInterface::IHarrowPaths > Paths() override { return pPaths; }
-  std::shared_ptr< ZEK::IStore > Store() override { return nullptr; }
+  std::shared_ptr< ZEK::IStore > Store() override { return pStore; }
   std::shared_ptr< HarrowPluginInterface::IWidgetService > WidgetService() override { return pWidgets; }
   std::shared_ptr< ZEK::IPostalService > PostalService() override { return pPostal; }
   ZEK::VFlowStoreRef SubjectFlowContext() override { return ItemStore; }
@@ -83,6 +89,7 @@ struct VHost::VState final : public HarrowPluginInterface::IHarrowApplication,
 
   const bool bDeveloperMode;
   const std::shared_ptr< VPostalService > pPostal = std::make_shared< VPostalService >();
+  const std::shared_ptr< ZEK::IStore > pStore = ::Store::CreateStore( pPostal, StoreBuckets );
   VPreferencesFile Preferences;
   const std::shared_ptr< VPaths > pPaths;
   const std::shared_ptr< VFeatureFlags > pFeatures;
@@ -101,11 +108,13 @@ struct VHost::VState final : public HarrowPluginInterface::IHarrowApplication,
   std::shared_ptr< HarrowPluginInterface::IWidgetService > pWidgets;
   std::shared_ptr< HarrowPluginInterface::VMeshSceneCache > pMeshes;
   VUndoStack Undo;
+  VPreferenceEditor Editor{ pStore, Undo };
 };
 
 VHost::VHost( const VHostOptions& i_rOptions )
   : m_pState( std::make_unique< VState >( i_rOptions ) )
 {
+  (void)DeclareUserPreferences( *m_pState->pStore );
 }
 
 VHost::~VHost()
@@ -114,6 +123,7 @@ VHost::~VHost()
   // Objects of the plug-in may hold references to services beyond this point; these answer, and do nothing.
   m_pState->pPostal->Close();
   m_pState->pQuick->Shutdown();
+  (void)m_pState->pStore->Shutdown();
 }
 
 HarrowPluginInterface::IHarrowApplication& VHost::Application()
@@ -189,6 +199,16 @@ VPreferencesFile& VHost::Preferences()
 VUndoStack& VHost::Undo()
 {
   return m_pState->Undo;
+}
+
+const std::shared_ptr< ZEK::IStore >& VHost::Store() const
+{
+  return m_pState->pStore;
+}
+
+VPreferenceEditor& VHost::PreferenceEditor()
+{
+  return m_pState->Editor;
 }
 
 ZEK::VFlowStateFactoryRef VHost::StateFactory() const

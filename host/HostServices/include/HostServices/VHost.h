@@ -8,6 +8,7 @@
 #include <HostServices/VPaths.h>
 #include <HostServices/VPlaybackClock.h>
 #include <HostServices/VPostalService.h>
+#include <HostServices/VPreferenceEditor.h>
 #include <HostServices/VPreferencesFile.h>
 #include <HostServices/VQuickHost.h>
 #include <HostServices/VRenderResources.h>
@@ -60,6 +61,9 @@ public:
   const std::shared_ptr< VQuickHost >& Quick() const;
   VPreferencesFile& Preferences();
   VUndoStack& Undo();
+  /// The settings, with the entries of all preferences. Shut down after everything else, as this object ends.
+  const std::shared_ptr< ZEK::IStore >& Store() const;
+  VPreferenceEditor& PreferenceEditor();
   ZEK::VFlowStateFactoryRef StateFactory() const;
   ZEK::VFlowStoreRef ItemStore() const;
   const std::shared_ptr< ZEK::IFlowStateCacheManager >& CacheManager() const;
