@@ -39,7 +39,7 @@ CallbackId VCallbackList::Add( VCallbackRecord i_Record )
   *pNew = *m_pRecords;
   pNew->push_back( std::move( i_Record ) );
   // All records of the old array are in the new one, so that no handler ends here.
-  m_pRecords = std::move( pNew );
+  Replace( std::move( pNew ) );
   return Id;
 }
 
@@ -60,8 +60,20 @@ std::size_t VCallbackList::RemoveIf( const std::function< bool( const VCallbackR
     }
   }
   const std::size_t Removed = m_pRecords->size() - pNew->size();
-  io_rOld.push_back( std::exchange( m_pRecords, std::move( pNew ) ) );
+  io_rOld.push_back( m_pRecords );
+  Replace( std::move( pNew ) );
   return Removed;
+}
+
+void VCallbackList::Replace( std::shared_ptr< VRecordArray > i_pNew )
+{
+  std::uint64_t Masks = 0;
+  for ( const VCallbackRecord& rRecord : *i_pNew )
+  {
+    Masks |= rRecord.m_Mask;
+  }
+  m_Masks.store( Masks, std::memory_order_release );
+  m_pRecords = std::move( i_pNew );
 }
 
 std::size_t VCallbackList::Count() const
@@ -78,16 +90,6 @@ std::size_t VCallbackList::CountWithMask( std::uint64_t i_Mask ) const
                                                     {
                                                       return i_rRecord.m_Mask == i_Mask;
                                                     } ) );
-}
-
-bool VCallbackList::Wants( std::uint64_t i_Flags ) const
-{
-  const std::unique_lock Lock = LockOrDie( m_Mutex );
-  return std::any_of( m_pRecords->begin(), m_pRecords->end(),
-                      [i_Flags]( const VCallbackRecord& i_rRecord )
-                      {
-                        return ( i_rRecord.m_Mask & i_Flags ) != 0;
-                      } );
 }
 
 void VCallbackList::Accumulate( std::uint64_t i_Flags, ChangeId i_Id )

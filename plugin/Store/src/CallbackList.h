@@ -4,6 +4,7 @@
 
 #include <ZEK/HandlerCallback.h>
 
+#include <atomic>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
@@ -41,7 +42,8 @@ public:
   std::size_t Count() const;
   std::size_t CountWithMask( std::uint64_t i_Mask ) const;
   bool IsEmpty() const { return Count() == 0; }
-  bool Wants( std::uint64_t i_Flags ) const;
+  /// Some record may want one of the flags: exact while nobody adds or removes.
+  bool Wants( std::uint64_t i_Flags ) const { return ( m_Masks.load( std::memory_order_acquire ) & i_Flags ) != 0; }
 
   /// Notes the flags of a commit for later delivery.
   void Accumulate( std::uint64_t i_Flags, ZEK::ChangeId i_Id );
@@ -62,7 +64,10 @@ private:
                                              std::vector< VCall >& o_rCalls );
   void RemoveAll( const std::vector< ZEK::CallbackId >& i_rIds );
 
+  void Replace( std::shared_ptr< VRecordArray > i_pNew );
+
   mutable std::mutex m_Mutex;
+  std::atomic< std::uint64_t > m_Masks{ 0 }; ///< of all records
   std::shared_ptr< VRecordArray > m_pRecords = std::make_shared< VRecordArray >();
   bool m_bHasWork = false;
   ZEK::ChangeId m_Newest;

@@ -49,36 +49,34 @@ struct VEntryExtras
   std::string m_Attributes;
 };
 
-/// What is committed of an entry. Readers look at it without a lock: it changes only while no reader of its generation
-/// is left. The handler list alone is guarded by the store mutex.
+/// What is committed of an entry besides what lies in the entry itself.
 struct VEntryState
 {
-  ZEK::VChangeIds m_Changes;
-  VHandlerList m_Handlers;                ///< those whose patterns match; found again when a state is made
   std::vector< VStoreEntry* > m_Children; ///< in child order
   std::unique_ptr< VEntryPresentation > m_pPresentation;
   std::unique_ptr< VEntryExtras > m_pExtras;
 };
 
 /// What the open write scope has written of an entry. Records are pooled and keep old contents: a field counts only
-/// when the mask has its bit. Most have neither children nor more than a verified value, and are one cache line then.
+/// when the mask has its bit. Those with children only, as most parents, take one cache line, those with a verified
+/// value only two.
 struct alignas( 64 ) VEntryChange
 {
   std::uint64_t m_Mask = 0;
-  const ZEK::IO::ISchema* m_pSchema = nullptr;
+  std::uint64_t m_Told = 0;  ///< by the merge so far
   std::uint32_t m_Place = 0; ///< in the pending children of the parent
   bool m_bParent = false;    ///< the pending children may not be empty
   bool m_bChoices = false;   ///< the three lists of choices may hold something
   bool m_bWasThere = false;  ///< before the merge
-  VEntryValues m_Values;
   VPendingChildren m_Children;
+  const ZEK::IO::ISchema* m_pSchema = nullptr;
+  VEntryValues m_Values;
   /// Made on first need and kept with the record: most records never have them, and are small.
   VEntryPresentation& Presentation() { return Made( m_pPresentation ); }
   VEntryExtras& Extras() { return Made( m_pExtras ); }
 
   std::unique_ptr< VEntryPresentation > m_pPresentation;
   std::unique_ptr< VEntryExtras > m_pExtras;
-  std::uint64_t m_Told = 0; ///< by the merge so far
 
 private:
   template < typename TGroup >
@@ -94,6 +92,9 @@ private:
 
 /// A node of the tree. Made on first use of a path and kept as long as the store; it is there, for clients, when it
 /// has a state.
+///
+/// Readers look at what is committed without a lock: it changes only while no reader of its generation is left. What a
+/// commit looks at in every entry that it changes lies together, and so does what a read of a value needs.
 class alignas( 64 ) VStoreEntry
 {
 public:
@@ -103,16 +104,29 @@ public:
     , m_Path( std::move( i_Path ) )
   {
   }
+  /// Of what is committed, nothing stays. The by-handle handlers do.
+  void EndState()
+  {
+    m_PatternHandlers = {};
+    m_pSchema = nullptr;
+    m_pState.reset();
+    m_Values = {};
+    m_Changes = {};
+  }
 
-  std::atomic< VStoreEntry* > m_pBucketLink{ nullptr };
   const std::uint64_t m_LeafKey; ///< orders most siblings without their names
   VStoreEntry* const m_pParent;  ///< null for the root only
   VHandlerList m_Handlers;       ///< those registered by handle; store mutex
-  // Part of what is committed, and here so that a read or a write of a value looks at one place; empty without a state.
-  const ZEK::IO::ISchema* m_pSchema = nullptr; ///< null until there is a typed value or a schema
+  /// Those whose patterns match; found again when a state is made, empty without one. Store mutex.
+  VHandlerList m_PatternHandlers;
+
+  const ZEK::IO::ISchema* m_pSchema = nullptr; ///< committed; null until there is a typed value or a schema
   VEntryChange* m_pChange = nullptr;           ///< the thread of the write scope, or the store mutex
   std::unique_ptr< VEntryState > m_pState;     ///< null while the entry is not there
-  VEntryValues m_Values;
+  VEntryValues m_Values;                       ///< committed; empty without a state
+  ZEK::VChangeIds m_Changes;                   ///< committed; zeros without a state
+
+  std::atomic< VStoreEntry* > m_pBucketLink{ nullptr };
   const ZEK::VEntryPath m_Path;
 };
 

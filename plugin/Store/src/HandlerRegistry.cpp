@@ -28,7 +28,7 @@ VHandlerRegistry::FindOrMake( const ZEK::VEntryPatternSet& i_rSet,
   {
     for ( VStoreEntry* const pEntry : FindCommitted( m_rTable, rPath ) )
     {
-      pEntry->m_pState->m_Handlers.push_back( pHandler.get() );
+      pEntry->m_PatternHandlers.push_back( pHandler.get() );
     }
     m_Patterns.Add( rPath, *pHandler );
   }
@@ -48,7 +48,7 @@ void VHandlerRegistry::Forget( const VHandlerCallback& i_rHandler )
   {
     for ( VStoreEntry* const pEntry : FindCommitted( m_rTable, rPath ) )
     {
-      std::erase( pEntry->m_pState->m_Handlers, &i_rHandler );
+      std::erase( pEntry->m_PatternHandlers, &i_rHandler );
     }
     m_Patterns.Remove( rPath, i_rHandler );
   }

@@ -31,7 +31,7 @@ public:
   /// Takes a handler that has no reference left off everything that knows it.
   void Forget( const VHandlerCallback& i_rHandler );
   /// Gives a state that was just made the handlers whose patterns name its entry.
-  void Match( VStoreEntry& io_rEntry ) const { m_Patterns.Match( io_rEntry, io_rEntry.m_pState->m_Handlers ); }
+  void Match( VStoreEntry& io_rEntry ) const { m_Patterns.Match( io_rEntry, io_rEntry.m_PatternHandlers ); }
 
   std::size_t Count() const { return m_Handlers.size(); }
   bool HasPatterns() const { return !m_Patterns.IsEmpty(); }

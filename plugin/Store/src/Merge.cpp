@@ -102,6 +102,44 @@ void ApplyExtras( VEntryExtras& io_rOld, VEntryExtras& io_rNew, std::uint64_t i_
   ApplyField( EChangeAttributes, i_Mask, io_rOld.m_Attributes, io_rNew.m_Attributes, io_rFlags );
 }
 
+void ApplyFields( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
+{
+  // Before the fields are looked at: a new entry may have a schema and nothing else.
+  if ( ( i_Mask & TakesSchema ) != 0 && io_rChange.m_pSchema != nullptr )
+  {
+    io_rEntry.m_pSchema = io_rChange.m_pSchema;
+  }
+  if ( ( i_Mask & ChangeMask::Values ) != 0 )
+  {
+    ApplyValues( io_rEntry.m_Values, io_rChange.m_Values, i_Mask, io_rFlags );
+  }
+  if ( ( i_Mask & ChangeMask::Presentation ) != 0 )
+  {
+    ApplyPresentation( Ensure( io_rEntry.m_pState->m_pPresentation ), io_rChange.Presentation(), i_Mask, io_rFlags );
+  }
+  if ( ( i_Mask & ChangeMask::Extras ) != 0 )
+  {
+    ApplyExtras( Ensure( io_rEntry.m_pState->m_pExtras ), io_rChange.Extras(), i_Mask, io_rFlags );
+  }
+}
+
+/// Siblings lie apart, so that the commit of many entries mostly waits for memory: asks for what comes soon.
+void FetchAhead( const VPendingChildren& i_rChildren )
+{
+  constexpr std::size_t Far = 6, Near = 2;
+  if ( const VStoreEntry* const pFar = i_rChildren.Ahead( Far ) )
+  {
+    __builtin_prefetch( &pFar->m_LeafKey );
+    __builtin_prefetch( &pFar->m_pChange );
+    __builtin_prefetch( &pFar->m_Changes );
+  }
+  if ( const VStoreEntry* const pNear = i_rChildren.Ahead( Near ) )
+  {
+    __builtin_prefetch( pNear->m_pChange );
+    __builtin_prefetch( &pNear->m_pChange->m_pSchema );
+  }
+}
+
 /// Brings children that came or went into a list in child order. Few of them are moved in one by one, many by one
 /// pass over the whole list.
 void UpdateChildren( std::vector< VStoreEntry* >& io_rChildren, std::span< const VPendingChild > i_Moved )
@@ -175,6 +213,7 @@ VStoreEntry* VMerge::MergeLeaves( VEntryChange& io_rParent )
 {
   while ( VStoreEntry* const pChild = io_rParent.m_Children.Next() )
   {
+    FetchAhead( io_rParent.m_Children );
     Begin( *pChild );
     if ( pChild->m_pChange->m_bParent )
     {
@@ -209,9 +248,7 @@ void VMerge::End( VStoreEntry& io_rEntry )
   Touch( io_rEntry.m_Handlers, rChange.m_Told );
   if ( ( rChange.m_Mask & ERemoved ) != 0 )
   {
-    io_rEntry.m_Values = VEntryValues();
-    io_rEntry.m_pSchema = nullptr;
-    io_rEntry.m_pState.reset();
+    io_rEntry.EndState();
   }
   if ( io_rEntry.m_pParent != nullptr )
   {
@@ -248,37 +285,34 @@ void VMerge::MakeState( VStoreEntry& io_rEntry, std::uint64_t& io_rFlags )
 
 void VMerge::Apply( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags )
 {
-  VEntryState& rState = *io_rEntry.m_pState;
   if ( ( i_Mask & ERemoved ) != 0 )
   {
     io_rFlags |= ERemoved;
-    Touch( rState.m_Handlers, io_rFlags );
+    Touch( io_rEntry.m_PatternHandlers, io_rFlags );
     return;
   }
-  // Before the fields are looked at: a new entry may have a schema and nothing else.
-  if ( ( i_Mask & TakesSchema ) != 0 && io_rChange.m_pSchema != nullptr )
+  // Most parents hold nothing of their own.
+  if ( i_Mask != 0 )
   {
-    io_rEntry.m_pSchema = io_rChange.m_pSchema;
+    ApplyFields( io_rEntry, io_rChange, i_Mask, io_rFlags );
+    io_rFlags |= i_Mask & ChangeMask::Kept;
   }
-  if ( ( i_Mask & ChangeMask::Values ) != 0 )
-  {
-    ApplyValues( io_rEntry.m_Values, io_rChange.m_Values, i_Mask, io_rFlags );
-  }
-  if ( ( i_Mask & ChangeMask::Presentation ) != 0 )
-  {
-    ApplyPresentation( Ensure( rState.m_pPresentation ), io_rChange.Presentation(), i_Mask, io_rFlags );
-  }
-  if ( ( i_Mask & ChangeMask::Extras ) != 0 )
-  {
-    ApplyExtras( Ensure( rState.m_pExtras ), io_rChange.Extras(), i_Mask, io_rFlags );
-  }
-  io_rFlags |= i_Mask & ChangeMask::Kept;
-  Stamp( rState, io_rFlags );
-  Touch( rState.m_Handlers, io_rFlags );
+  Stamp( io_rEntry, io_rFlags );
+  Touch( io_rEntry.m_PatternHandlers, io_rFlags );
 }
 
-void VMerge::Stamp( VEntryState& io_rState, std::uint64_t i_Flags ) const
+void VMerge::Stamp( VStoreEntry& io_rEntry, std::uint64_t i_Flags ) const
 {
+  VChangeIds& rChanges = io_rEntry.m_Changes;
+  if ( ( i_Flags & EChangeVerified ) != 0 )
+  {
+    rChanges.m_Verified = m_Id;
+  }
+  // Most changes are of nothing else.
+  if ( ( i_Flags & ~std::uint64_t( EChangeVerified ) ) == 0 )
+  {
+    return;
+  }
   const auto StampIf = [this, i_Flags]( ChangeId& io_rStamp, std::uint64_t i_Mask )
   {
     if ( ( i_Flags & i_Mask ) != 0 )
@@ -286,12 +320,10 @@ void VMerge::Stamp( VEntryState& io_rState, std::uint64_t i_Flags ) const
       io_rStamp = m_Id;
     }
   };
-  constexpr std::uint64_t Values = EChangeVerified | EChangeProposed;
-  StampIf( io_rState.m_Changes.m_Verified, EChangeVerified );
-  StampIf( io_rState.m_Changes.m_Proposed, EChangeProposed );
-  StampIf( io_rState.m_Changes.m_Other, ~Values );
-  StampIf( io_rState.m_Changes.m_Child, ChangeMask::ChildStamp );
-  StampIf( io_rState.m_Changes.m_Descendant, ChangeMask::DescendantStamp );
+  StampIf( rChanges.m_Proposed, EChangeProposed );
+  StampIf( rChanges.m_Other, ~std::uint64_t( EChangeVerified | EChangeProposed ) );
+  StampIf( rChanges.m_Child, ChangeMask::ChildStamp );
+  StampIf( rChanges.m_Descendant, ChangeMask::DescendantStamp );
 }
 
 void VMerge::Touch( const VHandlerList& i_rHandlers, std::uint64_t i_Flags )
@@ -333,7 +365,7 @@ void VMerge::TouchSubtree( const VStoreEntry& i_rEntry, std::uint64_t i_Flags )
     }
     if ( rEntry.m_pState )
     {
-      Touch( rEntry.m_pState->m_Handlers, Flags );
+      Touch( rEntry.m_PatternHandlers, Flags );
       // The first child is the next.
       Left.insert( Left.end(), rEntry.m_pState->m_Children.rbegin(), rEntry.m_pState->m_Children.rend() );
     }

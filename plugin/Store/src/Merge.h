@@ -46,7 +46,7 @@ private:
   void End( VStoreEntry& io_rEntry );
   void MakeState( VStoreEntry& io_rEntry, std::uint64_t& io_rFlags );
   void Apply( VStoreEntry& io_rEntry, VEntryChange& io_rChange, std::uint64_t i_Mask, std::uint64_t& io_rFlags );
-  void Stamp( VEntryState& io_rState, std::uint64_t i_Flags ) const;
+  void Stamp( VStoreEntry& io_rEntry, std::uint64_t i_Flags ) const;
   void Touch( const VHandlerList& i_rHandlers, std::uint64_t i_Flags );
   void TouchSubtree( const VStoreEntry& i_rEntry, std::uint64_t i_Flags );
 

@@ -49,32 +49,39 @@ void ClearChoices( VEntryChange& io_rChange )
 }
 } // namespace
 
-VEntryChange& VPending::Take( std::uint64_t i_Mask )
+VEntryChange& VPending::TakeNext()
 {
-  VEntryChange* pChange = nullptr;
   if ( !m_Free.empty() )
   {
-    pChange = m_Free.back();
+    VEntryChange& rChange = *m_Free.back();
     m_Free.pop_back();
+    return rChange;
   }
-  else
+  if ( m_pNext == m_pEnd )
   {
-    if ( m_Taken == m_Blocks.size() * BlockSize )
+    if ( m_UsedBlocks == m_Blocks.size() )
     {
       m_Blocks.push_back( std::make_unique< VEntryChange[] >( BlockSize ) );
     }
-    pChange = &m_Blocks[m_Taken / BlockSize][m_Taken % BlockSize];
-    ++m_Taken;
+    m_pNext = m_Blocks[m_UsedBlocks++].get();
+    m_pEnd = m_pNext + BlockSize;
   }
-  pChange->m_Mask = i_Mask;
-  pChange->m_pSchema = nullptr;
-  if ( pChange->m_bParent )
+  return *m_pNext++;
+}
+
+VEntryChange& VPending::Take( std::uint64_t i_Mask )
+{
+  VEntryChange& rChange = TakeNext();
+  ++m_InUse;
+  rChange.m_Mask = i_Mask;
+  rChange.m_pSchema = nullptr;
+  if ( rChange.m_bParent )
   {
-    pChange->m_bParent = false;
-    pChange->m_Children.Clear();
+    rChange.m_bParent = false;
+    rChange.m_Children.Clear();
   }
-  ClearChoices( *pChange );
-  return *pChange;
+  ClearChoices( rChange );
+  return rChange;
 }
 
 void VPending::Release( VStoreEntry& io_rEntry )
@@ -90,11 +97,14 @@ void VPending::Release( VStoreEntry& io_rEntry )
   io_rEntry.m_pChange->Extras().m_Number1 = ~std::uint32_t( 0 );
 #endif
   io_rEntry.m_pChange = nullptr;
+  --m_InUse;
 }
 
 void VPending::ReleaseAll()
 {
-  m_Taken = 0;
+  m_UsedBlocks = 0;
+  m_pNext = nullptr;
+  m_pEnd = nullptr;
   m_Free.clear();
 }
 

@@ -67,7 +67,7 @@ public:
   /// The merge is through with all entries: records are taken from the first again, in the order of their memory.
   void ReleaseAll();
   /// The number of records in use.
-  std::size_t InUse() const { return m_Taken - m_Free.size(); }
+  std::size_t InUse() const { return m_InUse; }
 
 private:
   static constexpr std::size_t BlockSize = 32;
@@ -79,9 +79,14 @@ private:
   void ReleaseUnlessOld( const VEntryChange& i_rChange );
   void Unlink( VStoreEntry& io_rEntry );
 
+  VEntryChange& TakeNext();
+
   std::vector< std::unique_ptr< VEntryChange[] > > m_Blocks;
-  std::size_t m_Taken = 0;             ///< so many at the front were taken
-  std::vector< VEntryChange* > m_Free; ///< of those, given back within the scope
+  std::size_t m_UsedBlocks = 0;
+  VEntryChange* m_pNext = nullptr; ///< not taken yet, as those up to the end of its block
+  VEntryChange* m_pEnd = nullptr;
+  std::vector< VEntryChange* > m_Free; ///< taken and given back within the scope
+  std::size_t m_InUse = 0;
 };
 
 } // namespace Store

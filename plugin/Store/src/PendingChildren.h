@@ -77,6 +77,11 @@ public:
   // The merge goes through the sorted children once, and keeps those that came or went at the front of the list.
   /// Null at the end.
   VStoreEntry* Next() { return m_Next < m_Items.size() ? m_Items[m_Next++].m_pEntry : nullptr; }
+  /// So many after the next; null past the end.
+  const VStoreEntry* Ahead( std::size_t i_Steps ) const
+  {
+    return m_Next + i_Steps < m_Items.size() ? m_Items[m_Next + i_Steps].m_pEntry : nullptr;
+  }
   void KeepMoved( VStoreEntry& i_rChild ) { m_Items[m_Moved++].m_pEntry = &i_rChild; }
   std::span< const VPendingChild > Moved() const { return { m_Items.data(), m_Moved }; }
 

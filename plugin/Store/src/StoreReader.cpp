@@ -192,7 +192,7 @@ ChangeId VStoreReader::Generation() const
 
 VChangeIds VStoreReader::ChangeIds( Entry i_pEntry ) const
 {
-  return i_pEntry != nullptr && i_pEntry->m_pState ? i_pEntry->m_pState->m_Changes : VChangeIds();
+  return i_pEntry != nullptr ? i_pEntry->m_Changes : VChangeIds();
 }
 
 void VStoreReader::Defer( std::function< void() > i_Function ) const

@@ -264,7 +264,7 @@ ChangeId VStoreWriter::Generation() const
 
 VChangeIds VStoreWriter::ChangeIds( Entry i_pEntry ) const
 {
-  return i_pEntry != nullptr && i_pEntry->m_pState ? i_pEntry->m_pState->m_Changes : VChangeIds();
+  return i_pEntry != nullptr ? i_pEntry->m_Changes : VChangeIds();
 }
 
 void VStoreWriter::Defer( std::function< void() > i_Function ) const

@@ -160,26 +160,38 @@ void VStore::EndWrite()
   {
     return;
   }
-  // A commit within a callback of another has a delivery of its own.
-  VDelivery Inner;
-  const bool bSpare = !std::exchange( rThread.m_bSpareTaken, true );
-  VDelivery& rDelivery = bSpare ? rThread.m_Spare : Inner;
-  const ChangeId Id = Commit( rDelivery );
+  if ( rThread.m_bSpareTaken )
+  {
+    // Within a callback of another commit.
+    VDelivery Inner;
+    EndOutermost( rThread, Inner );
+    return;
+  }
+  struct VTaken
+  {
+    ~VTaken() { m_rbTaken = false; }
+    bool& m_rbTaken;
+  };
+  rThread.m_bSpareTaken = true;
+  const VTaken Taken{ rThread.m_bSpareTaken };
+  EndOutermost( rThread, rThread.m_Spare );
+}
+
+void VStore::EndOutermost( VThreadState& io_rThread, VDelivery& io_rDelivery )
+{
+  const ChangeId Id = Commit( io_rDelivery );
+  if ( io_rDelivery.m_Touched.empty() && io_rThread.m_Deferred.empty() )
+  {
+    m_Lock.Advance();
+    return;
+  }
   // Callbacks and deferred functions may release the store.
-  const bool bCalls = !rDelivery.m_Touched.empty() || !rThread.m_Deferred.empty();
-  const std::shared_ptr< VStore > pSelf = bCalls ? Self() : nullptr;
+  const std::shared_ptr< VStore > pSelf = Self();
   m_Lock.Advance();
   VFirstFailure Failure;
-  if ( bCalls )
-  {
-    Deliver( rThread, rDelivery, Id, Failure );
-    rDelivery.Clear();
-    RunDeferred( rThread, Failure );
-  }
-  if ( bSpare )
-  {
-    rThread.m_bSpareTaken = false;
-  }
+  Deliver( io_rThread, io_rDelivery, Id, Failure );
+  io_rDelivery.Clear();
+  RunDeferred( io_rThread, Failure );
   Failure.Rethrow();
 }
 

@@ -59,6 +59,7 @@ private:
 
   VThreadState& Thread() const { return m_Slot.Get( m_Lock.Lines() ); }
   std::shared_ptr< VHandlerCallback > MakeHandler( const ZEK::VEntryPatternSet& i_rSet );
+  void EndOutermost( VThreadState& io_rThread, VDelivery& io_rDelivery );
   /// Merges under the mutex.
   ZEK::ChangeId Commit( VDelivery& io_rDelivery );
   void Deliver( VThreadState& io_rThread, VDelivery& io_rDelivery, ZEK::ChangeId i_Id, VFirstFailure& io_rFailure );

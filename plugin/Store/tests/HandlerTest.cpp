@@ -47,7 +47,7 @@ TEST_F( VHandlers, EqualSetsShareAHandlerWhileItLives )
   EXPECT_TRUE( pWeak.lock()->RemoveCallback( Id ) );
   EXPECT_TRUE( pWeak.expired() );
   EXPECT_EQ( m_Store.m_pStore->HandlerCount(), 0u );
-  EXPECT_TRUE( pA->m_Handlers.empty() && m_Store["x/y"]->m_pState->m_Handlers.empty() );
+  EXPECT_TRUE( pA->m_Handlers.empty() && m_Store["x/y"]->m_PatternHandlers.empty() );
   m_Store.Set( "x/y", 2 );
   m_Store.Set( "x/z", 2 );
   EXPECT_TRUE( m_Heard.Take().empty() );
