@@ -13,9 +13,9 @@ namespace UtilsFileSystem
 /// Acts on the file of that name. An exception out of it counts as `FailedWithException`.
 using PathFunction = std::function< ZEK::IResult( const std::string& i_rPath ) >;
 
-/// The exclusive right of this process and this thread of work to save one file: the lock of a file beside it
-/// named ".lock", which is gone when the right is. Other savers are refused meanwhile, loaders that have something to
-/// recover wait. For work that reads, changes and saves; a save or load by itself takes the lock of its own.
+/// The exclusive right to save one file: the lock of a file beside it named ".lock", which goes with the right.
+/// Other savers are refused meanwhile, in this process too, and loaders that have something to recover wait. For
+/// work that reads, changes and saves; a save or load by itself takes the lock of its own.
 class VSaveLock
 {
 public:
