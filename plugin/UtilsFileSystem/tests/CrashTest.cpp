@@ -385,6 +385,16 @@ int CountKernelCalls( pid_t i_Child )
   }
   return Markers == 2 ? Count : -1;
 }
+/// Gives the second folder the files of the first, two names of one file as such.
+void LinkFiles( const std::filesystem::path& i_rFrom, const std::filesystem::path& i_rTo )
+{
+  std::filesystem::remove_all( i_rTo );
+  std::filesystem::create_directory( i_rTo );
+  for ( const std::filesystem::directory_entry& rEntry : std::filesystem::directory_iterator( i_rFrom ) )
+  {
+    std::filesystem::create_hard_link( rEntry.path(), i_rTo / rEntry.path().filename() );
+  }
+}
 } // namespace
 
 TEST( CrashSeam, TheKernelSeesNoCallThatTheTableOfCallsDoesNot )
@@ -451,11 +461,13 @@ TEST( CrashTwice, TwoStopsWithoutALoadBetweenLeaveAWholeDocument )
     Used.Refused = bRefused ? std::map< std::string, int >{ { "link", EPERM } } : Used.Refused;
     for ( int First = 1, Before = Stopped; Before == Stopped; ++First )
     {
+      Folder.Clear();
+      Start.Prepare( Folder );
+      Before = StopAt< VTracedCalls >( First, Used, SaveFirst );
+      LinkFiles( Folder.Folder(), Folder.Kept() );
       for ( int Second = 1, After = Stopped; After == Stopped; ++Second )
       {
-        Folder.Clear();
-        Start.Prepare( Folder );
-        Before = StopAt< VTracedCalls >( First, Used, SaveFirst );
+        LinkFiles( Folder.Kept(), Folder.Folder() );
         After = StopAt< VTracedCalls >( Second, Used, SaveSecond );
         const std::optional< std::string > Found = Load( Folder.Target() );
         EXPECT_TRUE( Start.Allowed.contains( Found ) ) << First << ", " << Second;

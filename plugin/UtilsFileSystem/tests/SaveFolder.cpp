@@ -4,6 +4,7 @@
 #include <UtilsFileSystem/FileStreams.h>
 
 #include <algorithm>
+#include <cstdlib>
 #include <fstream>
 #include <iterator>
 #include <sstream>
@@ -17,7 +18,21 @@ using namespace UtilsFileSystem;
 
 VSaveFolder::VSaveFolder()
 {
+  for ( const fs::path& rParent : { fs::path( "/dev/shm" ), fs::temp_directory_path() } )
+  {
+    std::string Name = rParent / "harrow-test-XXXXXX";
+    if ( m_Base.empty() && ::mkdtemp( Name.data() ) )
+    {
+      m_Base = Name;
+    }
+  }
   Clear();
+}
+
+VSaveFolder::~VSaveFolder()
+{
+  std::error_code Ignored;
+  fs::remove_all( m_Base, Ignored );
 }
 
 void VSaveFolder::Clear()

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <TestSupport/Paths.h>
 #include <UtilsFileSystem/ProtectedFileIO.h>
 #include <ZEK/Log.h>
 
@@ -12,15 +11,19 @@
 namespace UtilsFileSystemTests
 {
 
-/// One protected file in a folder of its own.
+/// One protected file in a folder of its own, in memory where there is such a file system: tests save by the ten
+/// thousand, and what a disk keeps is told by `VPowerLossCalls`.
 class VSaveFolder
 {
 public:
-  std::string Folder() const { return m_Base.Path() / "files"; }
+  std::string Folder() const { return m_Base / "files"; }
   std::string Target() const { return Folder() + "/doc"; }
-  std::string Kept() const { return m_Base.Path() / "kept"; }
+  std::string Kept() const { return m_Base / "kept"; }
 
   VSaveFolder();
+  ~VSaveFolder();
+  VSaveFolder( const VSaveFolder& ) = delete;
+  VSaveFolder& operator=( const VSaveFolder& ) = delete;
   /// Empties the folder. Contents go to the target's name plus the ending.
   void Clear();
   void Put( const std::string& i_rEnding, const std::string& i_rContent ) const;
@@ -29,7 +32,7 @@ public:
   std::vector< std::string > Endings() const;
 
 private:
-  TestSupport::VTemporaryDir m_Base;
+  std::filesystem::path m_Base;
 };
 
 /// Writes through a C stream, in pieces, as a document is written.
