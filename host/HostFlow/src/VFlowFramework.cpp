@@ -4,6 +4,9 @@
 #include "VItemPool.h"
 #include "VStateCache.h"
 
+#include <ZEK/FlowCacheFlags.h>
+
+#include <algorithm>
 #include <atomic>
 #include <map>
 #include <mutex>
@@ -90,7 +93,7 @@ public:
   }
 
   IResult CreateCache( std::shared_ptr< IFlowWritableStateCache >& o_rpCache, const std::string& i_rName,
-                       std::uint32_t ) override
+                       std::uint32_t i_Flags ) override
   {
     o_rpCache.reset();
     if ( i_rName.empty() )
@@ -102,7 +105,8 @@ public:
     const bool bPresent = rpCache != nullptr;
     if ( !bPresent )
     {
-      rpCache = MakeCache( m_Ring );
+      const bool bLive = ( i_Flags & EFlowCacheWatchedLive ) != 0;
+      rpCache = MakeCache( bLive ? std::min( m_Ring, LiveRing ) : m_Ring );
       m_Names.push_back( i_rName );
     }
     o_rpCache = rpCache;

@@ -3,6 +3,8 @@
 #include "VFolderPreferenceWatcher.h"
 
 #include <CoreGraphics/VHarrowInteractionMapper.h>
+#include <Flow2Graphics/TestPattern.h>
+#include <Flow2Graphics/VStressTest.h>
 #include <HarrowGraphics/VSceneManager.h>
 #include <HarrowGraphics/VSceneWindowContentFactory.h>
 #include <HarrowPluginInterface/IHarrowApplication.h>
@@ -73,8 +75,42 @@ bool VHarrowPluginGraphics::CreateWorkspaceContent( HarrowPluginInterface::IHarr
           pResources->Reload();
         },
         {}, "" );
+    AddTestCaches( io_rApplication, *io_rWorkspace.Commands() );
   }
   return true;
+}
+
+void VHarrowPluginGraphics::AddTestCaches( HarrowPluginInterface::IHarrowApplication& io_rApplication,
+                                           HarrowPluginInterface::ICommandRegistry& io_rCommands )
+{
+  m_pStressTest = std::make_shared< Flow2Graphics::VStressTest >(
+      io_rApplication.StateCacheRegistry(), io_rApplication.TestPatternSink(), io_rApplication.SubjectFlowContext() );
+  io_rCommands.AddAction(
+      { "Plugin", "Graphics", "Create Test Pattern Cache" },
+      [pWeak = std::weak_ptr( io_rApplication.StateCacheRegistry() ), Factory = io_rApplication.TestPatternSink(),
+       Store = io_rApplication.SubjectFlowContext()]
+      {
+        if ( const auto pManager = pWeak.lock() )
+        {
+          (void)Flow2Graphics::CreateTestPattern( *pManager, *Factory, *Store );
+        }
+      },
+      {}, "" );
+  const auto AddSwitch = [&]( const char* i_pText, auto i_Switch )
+  {
+    io_rCommands.AddAction(
+        { "Plugin", "Graphics", i_pText },
+        [pWeak = std::weak_ptr( m_pStressTest ), i_Switch]
+        {
+          if ( const auto pStressTest = pWeak.lock() )
+          {
+            (void)( ( *pStressTest ).*i_Switch )();
+          }
+        },
+        {}, "" );
+  };
+  AddSwitch( "Start Stress Test Cache", &Flow2Graphics::VStressTest::Start );
+  AddSwitch( "Stop Stress Test Cache", &Flow2Graphics::VStressTest::Stop );
 }
 
 void VHarrowPluginGraphics::ReleaseGraphics()

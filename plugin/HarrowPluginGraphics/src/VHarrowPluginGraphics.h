@@ -5,6 +5,15 @@
 
 #include <memory>
 
+namespace Flow2Graphics
+{
+class VStressTest;
+}
+namespace HarrowPluginInterface
+{
+class ICommandRegistry;
+}
+
 namespace HarrowPluginGraphics
 {
 
@@ -18,7 +27,11 @@ public:
   void ReleaseGraphics() override;
 
 private:
-  std::shared_ptr< ZEK::VShared > m_pFolderWatcher; ///< none without a mesh cache
+  void AddTestCaches( HarrowPluginInterface::IHarrowApplication& io_rApplication,
+                      HarrowPluginInterface::ICommandRegistry& io_rCommands );
+
+  std::shared_ptr< ZEK::VShared > m_pFolderWatcher;            ///< none without a mesh cache
+  std::shared_ptr< Flow2Graphics::VStressTest > m_pStressTest; ///< in developer mode only
 };
 
 } // namespace HarrowPluginGraphics

@@ -13,6 +13,8 @@ namespace HostFlow
 {
 
 inline constexpr std::size_t DefaultRing = 512;
+/// The states that a cache made with `ZEK::EFlowCacheWatchedLive` keeps at most.
+inline constexpr std::size_t LiveRing = 4;
 
 /// A cache as its owner sees it: what a writer does, and what only the host may set.
 ///
