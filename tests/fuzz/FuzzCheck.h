@@ -1,25 +1,16 @@
 #pragma once
 
+#include "FuzzRequire.h"
+
 #include <HostSources/RecordingInfo.h>
 #include <HostSources/VRecording.h>
 
 #include <ZEK/Result.h>
 
-#include <cstdio>
-#include <cstdlib>
 #include <string>
 
 namespace FuzzCheck
 {
-
-inline void Require( bool i_bTrue, const char* i_pWhat )
-{
-  if ( !i_bTrue )
-  {
-    std::fprintf( stderr, "a reader broke its promise: %s\n", i_pWhat );
-    std::abort();
-  }
-}
 
 /// What every reader promises, whatever the bytes were.
 inline void CheckRead( ZEK::IResult i_Result, const std::string& i_rName, const std::string& i_rMessage,

@@ -1,4 +1,5 @@
 #include <TestSupport/Paths.h>
+#include <ZEK/Log.h>
 
 #include <gtest/gtest.h>
 
@@ -9,6 +10,10 @@
 
 extern "C" int FuzzC3dOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzTrcOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
+extern "C" int FuzzSettingsOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
+extern "C" int FuzzSchemaOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
+extern "C" int FuzzValueOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
+extern "C" int FuzzVersionOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 
 namespace
 {
@@ -46,4 +51,15 @@ TEST( FuzzCorpus, C3d )
 TEST( FuzzCorpus, Trc )
 {
   EXPECT_GE( Replay( "trc", FuzzTrcOneInput ), 8u );
+}
+
+TEST( FuzzCorpus, SettingsAndTheTextsInThem )
+{
+  // Most of these are faulty on purpose.
+  ZEK::GlobalLog().SetMaximumLevel( 0 );
+  EXPECT_GE( Replay( "settings", FuzzSettingsOneInput ), 10u );
+  EXPECT_GE( Replay( "schema", FuzzSchemaOneInput ), 8u );
+  EXPECT_GE( Replay( "value", FuzzValueOneInput ), 8u );
+  EXPECT_GE( Replay( "version", FuzzVersionOneInput ), 4u );
+  ZEK::GlobalLog().SetMaximumLevel( ZEK::ELogDetail );
 }
