@@ -19,8 +19,6 @@ struct VCameraModel;
 namespace ZEK
 {
 
-class IFlowItem;
-
 /// A 4 by 4 matrix, column-major, as OpenGL takes it.
 using VMatrix4 = std::array< float, 16 >;
 
@@ -32,7 +30,7 @@ enum ECentroidColourScheme : std::uint32_t
   EColourMarker = 2      ///< by the marker that the centroid was labelled as
 };
 
-/// A centroid as programs draw it: on the sensor, px, or on the plane z = 1 of the camera frame.
+/// A centroid, or another dot, as programs draw it; px.
 struct VCentroidVertex
 {
   float X = 0, Y = 0, Radius = 0;
@@ -62,22 +60,33 @@ struct VGreyscaleData
   std::vector< std::uint32_t > Blobs; ///< by record: index of the blob in its camera
   std::vector< VGreyscaleSpan > Lines;
   std::span< const std::uint8_t > Pixels; ///< of the camera's item: good until the provider's next update
-  /// From image pixels: x and y of the offset, then of the scale. To sensor pixels, or, in the buffers for 3D, to the
-  /// plane z = 1.
+  /// From image to sensor pixels: x and y of the offset, then of the scale.
   std::array< float, 4 > OffsetScale{ 0, 0, 1, 1 };
 };
 
+/// Whoever keeps a buffer has it unchanged; one that nobody keeps is filled again in place.
 template < typename T >
 using VDrawBuffer = std::shared_ptr< const T >;
+using VDrawWords = VDrawBuffer< std::vector< std::uint32_t > >;
+using VDrawVertices = VDrawBuffer< std::vector< VCentroidVertex > >;
 
-/// The buffers that a view draws a camera's data from. They are never null. Whoever keeps one has it unchanged; a
-/// buffer that nobody keeps is filled again in place, and then `Generation` differs.
-struct VCameraDrawLists
+/// What a camera's own view draws its data from; nothing is null. Raw sensor pixels.
+struct VCameraLists2D
 {
-  VDrawBuffer< std::vector< VCentroidVertex > > pCentroids;
-  VDrawBuffer< std::vector< std::uint32_t > > pIds; ///< selection words, one a centroid
+  VDrawVertices pCentroids;
+  VDrawWords pIds; ///< selection words, one a centroid
   VDrawBuffer< VGreyscaleData > pGreyscale;
-  std::uint64_t Generation = 0;
+  /// Another number: another content, among all cameras.
+  std::uint64_t Generation = 0, IdGeneration = 0;
+};
+
+/// What the 3D view draws a camera's data from; nothing is null. Sensor pixels that are corrected for the lens, for the
+/// programs that take them to the plane z = 1 of the frustum.
+struct VCameraLists3D
+{
+  VDrawVertices pCentroids;
+  VDrawVertices pGreyscale; ///< a vertex a span of grey pixels, of the grey in its middle
+  std::uint64_t Generation = 0, IdGeneration = 0;
 };
 
 /// What views need to know of a camera beside its model.
@@ -94,6 +103,7 @@ struct VRenderCameraInfo
   std::int32_t UserId = -1;
   std::array< float, 3 > Position{}; ///< of the drawn body: 50 mm behind the optical centre
   std::string DisplayType;
+  std::uint32_t Number = 0;          ///< in the provider's list
   std::uint32_t FirstCentroidId = 0; ///< selection ids in the present state; 0: nothing to pick
   std::uint32_t FirstBlobId = 0;
   std::int32_t ChangeCount = 0; ///< grows with each change of what stands here, of the name and of the model
@@ -115,15 +125,12 @@ public:
   virtual bool GetVideoFlag() const = 0;
   /// Null when there is none; good until the provider's next update.
   virtual const CoreMoxelTypes::VVideoFrame* GetVideoFrame() const = 0;
-  /// The buffers for the camera's own view. `i_Id` is the first selection id of its centroids, `i_Mode` the scheme that
-  /// `o_rColours` follows, one colour a centroid, 0xAABBGGRR. Grey blobs are listed with `i_bWide` only.
-  virtual void GetDrawData2D( std::uint32_t i_Id, ECentroidColourScheme i_Mode, bool i_bWide,
-                              VCameraDrawLists& o_rLists,
-                              VDrawBuffer< std::vector< std::uint32_t > >& o_rColours ) const = 0;
-  /// The buffers for the 3D view, on the plane z = 1 of the camera frame; the colours follow the scheme. Empty for a
-  /// camera that is not calibrated.
-  virtual void GetDrawData3D( VDrawBuffer< std::vector< std::uint32_t > >& o_rIds, VCameraDrawLists& o_rLists,
-                              ECentroidColourScheme i_Colours ) const = 0;
+  /// `i_Id` is the first selection id of the camera's centroids; 0: none can be picked. `o_rColours` has one colour a
+  /// centroid after the scheme `i_Mode`. Grey blobs are listed with `i_bWide` only.
+  virtual void GetDrawData2D( std::uint32_t i_Id, ECentroidColourScheme i_Mode, bool i_bWide, VCameraLists2D& o_rLists,
+                              VDrawWords& o_rColours ) const = 0;
+  /// Without a vertex for a camera that is not calibrated. `i_Colours` is the scheme of the vertices' colours.
+  virtual void GetDrawData3D( VDrawWords& o_rIds, VCameraLists3D& o_rLists, ECentroidColourScheme i_Colours ) const = 0;
   virtual const VRenderCameraInfo& GetInfo() const = 0;
 };
 
@@ -136,8 +143,8 @@ public:
   virtual ~IRenderCameraProvider() = default;
   /// Empty for a name that is not there.
   virtual VRenderCameraRef GetCamera( const std::string& i_rName ) const = 0;
-  /// In the order of the names' bytes.
-  virtual std::vector< VRenderCameraRef > GetCameras() const = 0;
+  /// In the order of the names' bytes; good until the next update.
+  virtual const std::vector< VRenderCameraRef >& GetCameras() const = 0;
 };
 
 } // namespace ZEK
