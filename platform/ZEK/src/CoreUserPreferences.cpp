@@ -79,16 +79,13 @@ IResult DeclareCoreUserPreferences( IStoreWriter& io_rWriter )
   for ( const VPreferenceDeclaration& rDeclaration : CoreUserPreferences() )
   {
     const IStoreReader::Entry pEntry = io_rWriter.GetStore()->GetEntry( rDeclaration.m_Path );
+    // A value that follows a new default counts as set; here it is still no choice of the operator's.
     const std::uint32_t Using = io_rWriter.Flags( pEntry ) & EUsingDefault;
-    // A default that is set again counts as a choice of the operator's.
-    if ( io_rWriter.DefaultValue( pEntry ) != rDeclaration.m_Default )
+    const IResult Made = io_rWriter.SetDefaultValue( pEntry, rDeclaration.m_Default );
+    if ( Made.IsError() )
     {
-      const IResult Made = io_rWriter.SetDefaultValue( pEntry, rDeclaration.m_Default );
-      if ( Made.IsError() )
-      {
-        Result = Result.IsError() ? Result : Made;
-        continue;
-      }
+      Result = Result.IsError() ? Result : Made;
+      continue;
     }
     io_rWriter.SetFlag( pEntry, EPersistent | Using );
   }

@@ -13,6 +13,8 @@ namespace
 class Preferences : public testing::Test
 {
 protected:
+  Preferences() { GlobalLog().Category( "Store" ).SetMaximumLevel( ELogDetail ); }
+
   template < typename TValue >
   void Set( const VEntryPath& i_rPath, const TValue& i_rValue )
   {
