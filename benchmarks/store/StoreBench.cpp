@@ -7,6 +7,7 @@
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
+#include <array>
 #include <atomic>
 #include <chrono>
 #include <cstdint>
@@ -133,16 +134,21 @@ void Contended( benchmark::State& io_rState )
 {
   using VClock = std::chrono::steady_clock;
   const VSettings Settings;
+  struct alignas( 64 ) VCount
+  {
+    std::atomic< std::uint64_t > m_Reads{ 0 };
+  };
   std::atomic< bool > bStop{ false };
-  std::atomic< std::uint64_t > Reads{ 0 };
+  std::array< VCount, 2 > Counts; // each written by its reader alone
   std::vector< std::thread > Readers;
-  for ( std::size_t Reader = 0; Reader < 2; ++Reader )
+  for ( std::size_t Reader = 0; Reader < Counts.size(); ++Reader )
   {
     Readers.emplace_back(
         [&, Reader]
         {
           VNext Next( Reader * 500 );
           std::int64_t Sum = 0;
+          std::uint64_t Reads = 0;
           while ( !bStop.load( std::memory_order_relaxed ) )
           {
             for ( int Read = 0; Read < 64; ++Read )
@@ -150,14 +156,18 @@ void Contended( benchmark::State& io_rState )
               const VStoreReadScope Scope( *Settings.m_pStore );
               Sum += ReadKey( *Scope, Settings.m_Handles[Next()] );
             }
-            Reads.fetch_add( 64, std::memory_order_relaxed );
+            Counts[Reader].m_Reads.store( Reads += 64, std::memory_order_relaxed );
           }
           benchmark::DoNotOptimize( Sum );
         } );
   }
   std::vector< double > Commits;
   std::int64_t Value = 1000000;
-  const std::uint64_t Before = Reads;
+  const auto CountReads = [&Counts]
+  {
+    return Counts[0].m_Reads + Counts[1].m_Reads;
+  };
+  const std::uint64_t Before = CountReads();
   for ( auto Turn : io_rState )
   {
     const VClock::time_point Begin = VClock::now();
@@ -165,7 +175,7 @@ void Contended( benchmark::State& io_rState )
     Commits.push_back( std::chrono::duration< double, std::nano >( VClock::now() - Begin ).count() );
     std::this_thread::sleep_for( std::chrono::milliseconds( 1 ) );
   }
-  io_rState.SetItemsProcessed( static_cast< std::int64_t >( Reads - Before ) );
+  io_rState.SetItemsProcessed( static_cast< std::int64_t >( CountReads() - Before ) );
   bStop = true;
   for ( std::thread& rReader : Readers )
   {

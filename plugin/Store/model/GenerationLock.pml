@@ -1,12 +1,16 @@
-/* The generation lock of the store as a model: the fields and steps of GenerationLock.h and .cpp under their own names.
-   What the mutex guards is one step; it is left only to sleep. A broadcast wakes only who sleeps at that moment, and
-   the mutex is let go before it. Readers announce themselves in lines of their own, one step a word. The committed
-   tree is two cells that a merge writes one after the other and that readers look at without the mutex.
+/* The generation lock of the store as a model: the fields and steps of GenerationLock.h and .cpp under their own names,
+   one step a word that others see. A thread that would look again and again either sees at its one look what it waits
+   for, or goes to sleep. A broadcast wakes only who sleeps at that moment, and the mutex is let go before it. The
+   committed tree is two cells that a merge writes one after the other and that readers look at without the mutex.
 
-   spin -a -DREADERS=2 -DWRITERS=2 GenerationLock.pml; cc -O2 -DSAFETY -o pan pan.c; ./pan -m100000
-   -DMUTANT=n seeds a mistake that the run must find: 1 no look at the commit after announcing, 2 the commit does not
-   look at the lines, 3 the pushed generation leaves the writer queued, 4 the gate opens before the merge, 5 leaving a
-   line wakes nobody, 6 a broadcast wakes one sleeper only. */
+   Check.sh runs it: safety with -DREADERS=2 -DWRITERS=2 -DROUNDS=2 and others, and with -DLIVE scopes without end, a
+   fair mutex, and the claims that who waits gets in; numbers are then kept relative to the phase, so that there are
+   finitely many. -DMUTANT=n seeds a mistake that the run must find:
+     1 a reader does not look again after announcing       2 the commit does not look at the lines
+     3 a late reader announces the phase before the commit  4 the phase moves on before the merge
+     5 leaving a line wakes nobody                          6 a broadcast wakes one sleeper only
+     7 announcing anew wakes nobody                         8 two writers may draw one number
+     9 a late reader leaves its line before it announces   10 the phase moves on without the mutex */
 
 #ifndef READERS
 #define READERS 2
@@ -20,40 +24,43 @@
 #ifndef MUTANT
 #define MUTANT 0
 #endif
-#define SLOTS 6
+#define THREADS (READERS + WRITERS)
+#define IsCommit(phase) ((phase) % 2 != 0)
 
-bool Locked;
-byte Count[SLOTS];           /* m_Fifo: holders, from the front */
-byte Size;
-byte Current = 1;
-bool bWriterQueued, bCommitting, bCommit, bDrainWaits;
-bool Reading[READERS];       /* the lines */
-bool DrainSleeps;            /* the one committer sleeps */
-bool AdvanceSleeps[READERS + WRITERS];
-byte CellA, CellB;           /* the committed tree: the number of its last commit */
+byte Phase = 2;
+byte Line[READERS];           /* VReaderLine::m_Phase */
+byte NextWriter = 1;
+bool bDrainWaits;
+bool DrainSleeps;             /* the one committer sleeps */
+bool AdvanceSleeps[THREADS];
+byte CellA, CellB;            /* the committed tree: the number of its last commit */
 byte InWrite, Finished;
+bool Waits[THREADS];          /* between the call of Begin and its end */
+/* Of each thread: the phase that it saw or awaits. */
+byte Saw[THREADS];
 
+#ifdef LIVE
+/* A fair mutex: who comes first is first. */
+byte Head, Tail;
+inline Lock() { d_step { ticket = Tail; Tail = (Tail + 1) % THREADS }; Head == ticket }
+inline Unlock() { d_step { Head = (Head + 1) % THREADS; ticket = 0 } }
+#define TURNS do :: true ->
+#define TURNS_END od
+/* Older than the phase is older, however much. */
+#define Older(word) word = (word > 3 -> word - 2 : (word != 0 -> 1 : 0))
+#else
+bool Locked;
 inline Lock() { atomic { !Locked -> Locked = true } }
 inline Unlock() { Locked = false }
-
-inline Pop() {
-  d_step {
-    i = 0;
-    do
-    :: i + 1 < Size -> Count[i] = Count[i + 1]; i++
-    :: else -> break
-    od;
-    Size--;
-    Count[Size] = 0;
-    i = 0
-  }
-}
+#define TURNS for ( round : 1 .. ROUNDS ) {
+#define TURNS_END }
+#endif
 
 inline Broadcast() {
   d_step {
     i = 0;
     do
-      :: i < READERS + WRITERS ->
+    :: i < THREADS ->
        if
        :: MUTANT == 6 && AdvanceSleeps[i] -> AdvanceSleeps[i] = false; break
        :: else -> AdvanceSleeps[i] = false
@@ -65,134 +72,116 @@ inline Broadcast() {
   }
 }
 
-/* A sleeper has let the mutex go in the step in which it fell asleep. */
-inline WaitAdvance( target ) {
-  do
-  :: Current == target -> break
-  :: else ->
-     atomic { AdvanceSleeps[me] = true; Locked = false };
-     !AdvanceSleeps[me];
-     Lock()
-  od
+inline WakeDrain() {
+  Lock(); Unlock();
+  DrainSleeps = false
 }
 
-inline AnyReading( result ) {
-  /* Line by line, as readers go on meanwhile. */
+/* One look, then asleep under the mutex until the phase is there. */
+inline AwaitPhase() {
+  if
+  :: Phase >= Saw[me]
+  :: Phase < Saw[me] ->
+     Lock();
+     do
+     :: Phase >= Saw[me] -> break
+     :: Phase < Saw[me] ->
+        atomic { AdvanceSleeps[me] = true; Unlock() };
+        !AdvanceSleeps[me];
+        Lock()
+     od;
+     Unlock()
+  fi
+}
+
+/* The line is never empty meanwhile: no commit but the one under way can be over before the new word is there. */
+inline BeginLate() {
+  if
+  :: MUTANT == 9 -> Line[me] = 0
+  :: else
+  fi;
+  Saw[me] = Phase;
+  if
+  :: IsCommit( Saw[me] ) -> Saw[me] = (MUTANT == 3 -> Saw[me] - 1 : Saw[me] + 1)
+  :: else
+  fi;
+  Line[me] = Saw[me];
+  if
+  :: bDrainWaits && MUTANT != 7 -> WakeDrain()
+  :: else
+  fi;
+  AwaitPhase()
+}
+
+/* Line by line, as readers go on meanwhile. */
+inline AnyBefore( result ) {
   result = false;
   i = 0;
   do
   :: i < READERS ->
-     if
-     :: Reading[i] && MUTANT != 2 -> result = true
-     :: else
-     fi;
+     result = result || (Line[i] != 0 && Line[i] < Phase && MUTANT != 2);
      i++
   :: else -> break
   od;
   i = 0
 }
 
-inline LeaveLine() {
-  Reading[me] = false;
-  if
-  :: bDrainWaits && MUTANT != 5 ->
-     Lock(); Unlock();
-     DrainSleeps = false
-  :: else
-  fi
-}
-
 proctype Reader( byte me ) {
-  byte i, round, seen, other, target;
-  bool counted;
-  for ( round : 1 .. ROUNDS ) {
+  byte i, round, seen, ticket;
+  TURNS
     /* BeginRead */
-    counted = false;
-    Reading[me] = true;
+    atomic { Waits[me] = true; Saw[me] = Phase };
+    Line[me] = Saw[me];
     if
-    :: bCommit && MUTANT != 1 ->
-       LeaveLine();
-       Lock();
-       atomic {
-         counted = true;
-         if
-         :: Size == 0 -> Size = 1; Count[0] = 1; bWriterQueued = false; target = Current
-         :: Size != 0 && !bCommitting -> Count[0]++; target = Current
-         :: else ->
-            target = Current + 1;
-            if
-            :: Size > 1 -> Count[1]++
-            :: else -> Count[1] = 1; Size = 2;
-               if
-               :: MUTANT != 3 -> bWriterQueued = false
-               :: else
-               fi
-            fi
-         fi
-       };
-       WaitAdvance( target );
-       Unlock()
+    :: (Phase != Saw[me] || IsCommit( Saw[me] )) && MUTANT != 1 -> BeginLate()
     :: else
     fi;
+    atomic { Waits[me] = false; Saw[me] = 0 };
+#ifndef LIVE
     /* inside: the tree is the commit that Generation() says, from begin to end */
-    seen = Current - 1;
-    other = CellA;
-    assert( other == seen );
-    other = CellB;
-    assert( other == seen );
-    other = CellA;
-    assert( other == seen && Current - 1 == seen );
+    seen = Phase / 2 - 1;
+    assert( CellA == seen );
+    assert( CellB == seen );
+    assert( CellA == seen && Phase / 2 - 1 == seen );
+#endif
     /* EndRead */
+    Line[me] = 0;
     if
-    :: counted ->
-       Lock();
-       Count[0]--;
-       if
-       :: Count[0] == 0 && bCommitting -> Unlock(); DrainSleeps = false
-       :: Count[0] == 0 && !bCommitting -> assert( Size == 1 ); Pop(); Unlock()
-       :: else -> Unlock()
-       fi
-    :: else -> LeaveLine()
+    :: bDrainWaits && MUTANT != 5 -> WakeDrain()
+    :: else
     fi
-  };
+  TURNS_END;
   Finished++
 }
 
 proctype Writer( byte me ) {
-  byte i, round, target, number;
+  byte i, round, number, ticket;
   bool reading;
-  for ( round : 1 .. ROUNDS ) {
+  TURNS
     /* BeginWrite */
-    Lock();
-    atomic {
-      target = Current + Size;
-      if
-      :: Size != 0 && !bWriterQueued -> target--; Count[Size - 1]++
-      :: else -> assert( Size < SLOTS ); Count[Size] = 1; Size++
-      fi;
-      bWriterQueued = true
-    };
-    WaitAdvance( target );
-    Unlock();
-    assert( InWrite == 0 );
-    InWrite++;
-    assert( CellA == Current - 1 && CellB == CellA );
-    InWrite--;
-    /* EndWrite: BeginCommit */
-    Lock();
-    Count[0]--;
-    bCommitting = true;
-    bCommit = true;
-    AnyReading( reading );
     if
-    :: Count[0] != 0 || reading ->
+    :: MUTANT != 8 -> d_step { Waits[me] = true; Saw[me] = 2 * NextWriter; NextWriter++ }
+    :: MUTANT == 8 -> Saw[me] = 2 * NextWriter; NextWriter = Saw[me] / 2 + 1
+    fi;
+    AwaitPhase();
+    d_step { Waits[me] = false; assert( InWrite == 0 ); InWrite++ };
+#ifndef LIVE
+    assert( Phase == Saw[me] && CellA == Phase / 2 - 1 && CellB == CellA );
+#endif
+    InWrite--;
+    /* EndWrite: BeginCommit, one look at the lines without the mutex */
+    Phase++;
+    AnyBefore( reading );
+    Lock();
+    if
+    :: reading ->
        bDrainWaits = true;
        do
-       :: AnyReading( reading );
+       :: AnyBefore( reading );
           if
-          :: Count[0] == 0 && !reading -> break
+          :: !reading -> break
           :: else ->
-             atomic { DrainSleeps = true; Locked = false };
+             atomic { DrainSleeps = true; Unlock() };
              !DrainSleeps;
              Lock()
           fi
@@ -200,31 +189,53 @@ proctype Writer( byte me ) {
        bDrainWaits = false
     :: else
     fi;
-    Pop();
-    bCommitting = false;
+    number = Phase / 2;
+    assert( number == Saw[me] / 2 );
     if
-    :: MUTANT == 4 -> bCommit = false
+    :: MUTANT == 4 -> Phase++
     :: else
     fi;
-    number = Current;
-    Current++;
-    assert( number == target );
+#ifdef LIVE
+    d_step {
+      Saw[me] = 0;
+      for ( i : 0 .. READERS - 1 ) { Older( Line[i] ) };
+      for ( i : 0 .. THREADS - 1 ) { Older( Saw[i] ) };
+      NextWriter--;
+      Phase--;
+      number = 0;
+      i = 0
+    };
+    Unlock();
+#else
     /* the merge */
     CellA = number;
     CellB = number;
-    bCommit = false;
-    Unlock();
+    if
+    :: MUTANT == 10 -> Unlock(); Phase++
+    :: MUTANT == 4 -> Unlock()
+    :: else -> Phase++; Unlock()
+    fi;
+    Saw[me] = 0;
+#endif
     Broadcast()
-  };
+  TURNS_END;
   Finished++
 }
 
 init {
   byte p;
   atomic {
-    for ( p : 0 .. READERS - 1 ) { run Reader( p ) }
-    for ( p : READERS .. READERS + WRITERS - 1 ) { run Writer( p ) }
+    for ( p : 0 .. READERS - 1 ) { run Reader( p ) };
+    for ( p : READERS .. THREADS - 1 ) { run Writer( p ) };
+    p = 0
   };
-  Finished == READERS + WRITERS;
-  assert( Size == 0 && !bCommitting && !bCommit && Current == 1 + WRITERS * ROUNDS )
+#ifndef LIVE
+  Finished == THREADS;
+  assert( Phase == 2 + 2 * WRITERS * ROUNDS && NextWriter == Phase / 2 && !bDrainWaits )
+#endif
 }
+
+#ifdef LIVE
+ltl ReaderGetsIn { [] <> !Waits[0] }
+ltl WriterGetsIn { [] <> !Waits[READERS] }
+#endif

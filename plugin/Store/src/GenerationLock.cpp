@@ -40,34 +40,18 @@ std::unique_lock< std::mutex > LockOrDie( std::mutex& io_rMutex )
   }
 }
 
-/// Announces the reader for the phase that is, or for the one after the commit under way. False when the commit of
-/// that very phase may have looked at the lines before.
-bool VGenerationLock::Announce( VReaderLine& io_rLine )
+void VGenerationLock::BeginLate( VReaderLine& io_rLine )
 {
+  // The line holds an older phase, so that no commit but the one under way can be over before it holds the new one.
   const std::uint64_t Phase = m_Phase.load();
   const std::uint64_t Target = Phase + ( IsCommit( Phase ) ? 1 : 0 );
   io_rLine.m_Phase.store( Target );
-  return m_Phase.load() <= Target;
-}
-
-void VGenerationLock::BeginLate( VReaderLine& io_rLine )
-{
-  const bool bAnnounced = Announce( io_rLine );
-  // The line may have held a commit up until now.
+  // Up until now the line may have held the commit.
   if ( m_bDrainWaits.load() )
   {
     WakeDrain();
   }
-  if ( !bAnnounced )
-  {
-    // Commits come too fast. While the mutex is held none is merged, so that a second try is the last.
-    const std::unique_lock Lock = LockOrDie( m_Mutex );
-    while ( !Announce( io_rLine ) )
-    {
-    }
-    m_Drain.notify_all();
-  }
-  AwaitPhase( io_rLine.m_Phase.load( std::memory_order_relaxed ) );
+  AwaitPhase( Target );
 }
 
 /// Returns in that phase; for a reader, who has announced it, in that or in the commit that waits for the reader.

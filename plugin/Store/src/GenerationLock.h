@@ -72,7 +72,6 @@ public:
 private:
   static bool IsCommit( std::uint64_t i_Phase ) { return i_Phase % 2 != 0; }
   void BeginLate( VReaderLine& io_rLine );
-  bool Announce( VReaderLine& io_rLine );
   void AwaitPhase( std::uint64_t i_Phase );
   void WakeDrain();
 
