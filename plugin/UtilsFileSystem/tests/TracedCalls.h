@@ -67,9 +67,14 @@ protected:
   virtual void Synced( int ) {}
 
 private:
-  template < typename TReturn, typename TCall >
-  TReturn Do( const char* i_pName, std::string i_Path, TReturn i_Failure, TCall i_Call );
+  bool IsToFail( const char* i_pName, std::string i_Path );
+  template < typename TReturn, typename... TParameters, typename... TArguments >
+  TReturn Do( const char* i_pName, const std::string& i_rPath,
+              TReturn ( UtilsFileSystem::IFileSystemCalls::*i_pCall )( TParameters... ), TArguments... i_Arguments );
+  int DoNames( const char* i_pName, int ( UtilsFileSystem::IFileSystemCalls::*i_pCall )( const char*, const char* ),
+               const char* i_pFrom, const char* i_pTo );
 
+  UtilsFileSystem::IFileSystemCalls m_Real;
   UtilsFileSystem::IFileSystemCalls* m_pFormer;
   std::map< int, std::string > m_Opened;
   std::vector< VCall > m_Trace;
