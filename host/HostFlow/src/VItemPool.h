@@ -34,6 +34,11 @@ public:
   std::uint64_t NameHash() const { return m_NameHash; }
   void Renew( std::uint32_t i_Salt, std::uint32_t i_Tag, std::int64_t i_Number );
 
+private:
+  /// Empty: no such name. Before all else, so that they lie by the id: a join reads both.
+  std::array< std::string, ZEK::EFlowNameCount - 1 > m_Names;
+
+public:
   VPooledItem* pNextFree = nullptr;
 
 protected:
@@ -43,7 +48,6 @@ protected:
 private:
   VItemPool& m_rPool;
   std::uint64_t m_NameHash = 0;
-  std::array< std::string, ZEK::EFlowNameCount - 1 > m_Names; // empty: no such name
 };
 
 /// The items of one tag. Lives as long as the process, as an item may outlive every handle.

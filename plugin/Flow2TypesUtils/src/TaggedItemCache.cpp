@@ -15,6 +15,12 @@ bool IdLess( const ZEK::VFlowValueId& i_rLeft, const ZEK::VFlowValueId& i_rRight
          std::tie( i_rRight.Salt, i_rRight.Type, i_rRight.Number );
 }
 
+/// Asks for memory that is read a little later.
+void FetchAhead( const void* i_pMemory )
+{
+  __builtin_prefetch( i_pMemory );
+}
+
 /// The time test of one query. Most entries of a tag share their key, so the last answer is kept.
 class VTimeTest
 {
@@ -144,6 +150,7 @@ bool VItemCache::Keep( const VJoinQuery& i_rQuery, VNameTable& io_rTable )
   ZEK::VFlowCursor It, End;
   i_rQuery.rState.ItemsBegin( It, m_Tag, i_rQuery.Match, i_rQuery.Key );
   i_rQuery.rState.ItemsEnd( End, m_Tag, i_rQuery.Match, i_rQuery.Key );
+  m_Others.clear();
   for ( ; It != End; ++It )
   {
     if ( !Time.Passes( It->Key ) )
@@ -156,10 +163,11 @@ bool VItemCache::Keep( const VJoinQuery& i_rQuery, VNameTable& io_rTable )
     }
     // An item at the same place in memory with the same id is the same item.
     const ZEK::IFlowItem* pItem = It->pItem;
-    const bool bSame = pItem == pSeen->pItem && pItem->Id() == pSeen->Id;
-    if ( !bSame && !TakeOther( *pSeen, pItem, i_rQuery.NameSelector, io_rTable ) )
+    if ( pItem != pSeen->pItem || !( pItem->Id() == pSeen->Id ) )
     {
-      return false;
+      FetchAhead( pItem );
+      FetchAhead( reinterpret_cast< const char* >( pItem ) + 64 ); // where a name may begin
+      m_Others.push_back( { pSeen, pItem, {}, false } );
     }
     if ( pSeen->Slot != None )
     {
@@ -167,33 +175,41 @@ bool VItemCache::Keep( const VJoinQuery& i_rQuery, VNameTable& io_rTable )
     }
     ++pSeen;
   }
-  return pSeen == pEnd;
+  return pSeen == pEnd && ( m_Others.empty() || TakeOthers( i_rQuery.NameSelector, io_rTable ) );
 }
 
-bool VItemCache::TakeOther( VSeen& io_rSeen, const ZEK::IFlowItem* i_pItem, std::uint32_t i_NameSelector,
-                            VNameTable& io_rTable )
+bool VItemCache::TakeOthers( std::uint32_t i_NameSelector, VNameTable& io_rTable )
 {
-  io_rSeen.pItem = i_pItem;
-  m_bValuesTaken = m_bValuesTaken && io_rSeen.Slot == None;
-  if ( i_pItem->Id() == io_rSeen.Id )
+  // Items and names lie all over the memory: what a round needs is on its way while the one before goes through all.
+  for ( VOther& rOther : m_Others )
   {
-    return true;
+    rOther.bName = rOther.pItem->Value().GetName( i_NameSelector, rOther.Name );
+    FetchAhead( rOther.Name.data() );
   }
-  std::string_view Name;
-  const bool bName = i_pItem->Value().GetName( i_NameSelector, Name );
-  if ( bName != ( io_rSeen.Row != None ) || ( bName && io_rTable.Row( io_rSeen.Row ).Name != Name ) )
+  for ( const VOther& rOther : m_Others )
   {
-    return false;
-  }
-  io_rSeen.Id = i_pItem->Id();
-  if ( io_rSeen.Slot != None )
-  {
-    if ( m_bSameIds )
+    VSeen& rSeen = *rOther.pSeen;
+    rSeen.pItem = rOther.pItem;
+    m_bValuesTaken = m_bValuesTaken && rSeen.Slot == None;
+    const ZEK::VFlowValueId& rId = rOther.pItem->Id();
+    if ( rId == rSeen.Id )
     {
-      m_PreviousIds.assign( m_Ids.begin(), m_Ids.end() );
-      m_bSameIds = false;
+      continue;
     }
-    m_Ids[io_rSeen.Slot] = io_rSeen.Id;
+    if ( rOther.bName != ( rSeen.Row != None ) || ( rOther.bName && io_rTable.Row( rSeen.Row ).Name != rOther.Name ) )
+    {
+      return false;
+    }
+    rSeen.Id = rId;
+    if ( rSeen.Slot != None )
+    {
+      if ( m_bSameIds )
+      {
+        m_PreviousIds.assign( m_Ids.begin(), m_Ids.end() );
+        m_bSameIds = false;
+      }
+      m_Ids[rSeen.Slot] = rId;
+    }
   }
   return true;
 }

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <map>
 #include <random>
 #include <set>
@@ -218,8 +219,11 @@ TEST( TaggedCoreTypeExtractor, JoinsAsAnOrderedMapWouldWhateverWasBefore )
     for ( int Step = 0; Step < 120; ++Step )
     {
       const std::uint32_t Which = Below( static_cast< std::uint32_t >( Entries.size() ) );
-      switch ( Below( 8 ) )
+      switch ( Below( 9 ) )
       {
+      case 4: // the same items in another order
+        std::rotate( Entries.begin(), Entries.begin() + Which, Entries.end() );
+        break;
       case 0:
         Entries[Which] = Entry( Entries[Which].Tag, Below( 9 ) );
         break;
@@ -240,10 +244,12 @@ TEST( TaggedCoreTypeExtractor, JoinsAsAnOrderedMapWouldWhateverWasBefore )
         break;
       }
       const std::uint32_t Absent = Below( 12 ); // now and then a tag is not there
-      const ZEK::VFlowStateRef State = Maker.State();
+      const bool bEmpty = Below( 25 ) == 0;
+      // A late state lies before those that came, so that other items hold for it.
+      const ZEK::VFlowStateRef State = Maker.State( { Below( 8 ) == 0 ? 8 : 100, 10, 1 } );
       for ( const VEntry& rEntry : Entries )
       {
-        if ( Absent > 3 || rEntry.Tag != Tags[Absent] )
+        if ( !bEmpty && ( Absent > 3 || rEntry.Tag != Tags[Absent] ) )
         {
           State->AddItemAt( rEntry.Item, rEntry.Key );
         }
@@ -255,7 +261,7 @@ TEST( TaggedCoreTypeExtractor, JoinsAsAnOrderedMapWouldWhateverWasBefore )
       ExpectAlike( Extractor, Model, *State );
       ASSERT_FALSE( testing::Test::HasFailure() ) << "seed " << Seed << ", step " << Step;
       // The same items under a new state: nothing may seem changed, and nothing may point into the former state.
-      const ZEK::VFlowStateRef Again = Maker.State();
+      const ZEK::VFlowStateRef Again = Maker.State( State->GetKey() );
       Again->Merge( *State );
       Model.Update( *Again, Match, Again->GetKey() );
       Extractor.Update( *Again, ZEK::EFlowNameDevice, Match, Again->GetKey() );
@@ -265,6 +271,67 @@ TEST( TaggedCoreTypeExtractor, JoinsAsAnOrderedMapWouldWhateverWasBefore )
     }
     EXPECT_TRUE( Results.contains( true ) ) << "seed " << Seed << " joined nothing";
   }
+}
+
+// What a consumer is told as the states go by, each beside the one before.
+TEST( TaggedCoreTypeExtractor, EachStateIsToldFromTheOneBefore )
+{
+  VMaker Maker;
+  VTaggedCoreTypeExtractor Extractor;
+  Extractor.AddCache< FlowCameraHardware >( ETagRequirement::Required );
+  Extractor.AddCache< FlowCameraSettings >( ETagRequirement::RequiredIfAny );
+  Extractor.AddCache< FlowDevice >( ETagRequirement::Optional );
+  using VItems = std::vector< ZEK::VFlowItemRef >;
+  ZEK::VFlowStateRef State;
+  const auto Show = [&]( const VItems& i_rItems )
+  {
+    const ZEK::VFlowStateRef Next = Maker.State();
+    for ( const ZEK::VFlowItemRef& rItem : i_rItems )
+    {
+      Next->AddItem( rItem );
+    }
+    State = Next; // the state before is gone when the extractor meets this one
+    return Extractor.Update( *State, ZEK::EFlowNameDevice, EFlowTimeMatch::Overlap, State->GetKey() );
+  };
+  const auto Told = [&]
+  {
+    std::vector< bool > Bits;
+    Extractor.ChangedBits( Tags[0], Bits );
+    std::string Text = Extractor.NamesChanged() ? "names " : "";
+    Text += Extractor.Changed( Tags[0] ) ? "changed " : "";
+    for ( std::size_t Slot = 0; Slot < Bits.size(); ++Slot )
+    {
+      Text += Extractor.Names()[Slot] + ( Bits[Slot] ? "* " : " " );
+    }
+    return Text;
+  };
+  const ZEK::VFlowItemRef A = Maker.Item( Tags[0], "a" ), B = Maker.Item( Tags[0], "b" ),
+                          C = Maker.Item( Tags[0], "c" );
+  const ZEK::VFlowItemRef Plain = Maker.Item( Tags[2], "b" );
+  EXPECT_TRUE( Show( { A, B, C, Plain } ) );
+  EXPECT_EQ( Told(), "names changed a* b* c* " );
+  VItems Devices;
+  Extractor.Items< FlowDevice >( Devices );
+  EXPECT_EQ( Devices, ( VItems{ nullptr, Plain, nullptr } ) );
+  Show( { A, B, C, Plain } );
+  EXPECT_EQ( Told(), "a b c " );
+  Show( { C, A, B } );
+  EXPECT_EQ( Told(), "a b c " ) << "another order";
+  const ZEK::VFlowItemRef NewB = Maker.Item( Tags[0], "b" );
+  Show( { A, NewB, C } );
+  EXPECT_EQ( Told(), "changed a b* c " );
+  Show( { NewB, C } );
+  EXPECT_EQ( Told(), "names changed b c " ) << "moved to other slots";
+  Show( { NewB, C, Maker.Item( Tags[1], "c" ) } );
+  EXPECT_EQ( Told(), "names changed c " ) << "a tag that is there for one hides the others";
+  EXPECT_FALSE( Show( { Maker.Item( Tags[1], "c" ), Plain } ) );
+  EXPECT_EQ( Told(), "names changed " ) << "the required tag is gone";
+  EXPECT_FALSE( Show( {} ) );
+  EXPECT_EQ( Told(), "" );
+  EXPECT_TRUE( Show( { A } ) );
+  EXPECT_EQ( Told(), "names changed a* " );
+  EXPECT_TRUE( Extractor.Values< FlowCameraSettings >().empty() );
+  EXPECT_EQ( Extractor.Values< FlowDevice >(), ( std::vector< const VDevice* >{ nullptr } ) );
 }
 
 TEST( TaggedCoreTypeExtractor, AnotherSelectorJoinsByOtherNames )

@@ -82,11 +82,20 @@ private:
     std::uint32_t Row = None;  ///< none: the item has no name
     std::uint32_t Slot = None; ///< none: another item of the name came first, or the object lacks something
   };
-  bool TakeOther( VSeen& io_rSeen, const ZEK::IFlowItem* i_pItem, std::uint32_t i_NameSelector, VNameTable& io_rTable );
+  /// An item in the place of another.
+  struct VOther
+  {
+    VSeen* pSeen = nullptr;
+    const ZEK::IFlowItem* pItem = nullptr;
+    std::string_view Name;
+    bool bName = false;
+  };
+  bool TakeOthers( std::uint32_t i_NameSelector, VNameTable& io_rTable );
 
   std::uint32_t m_Tag;
   ETagRequirement m_Requirement;
   std::vector< VSeen > m_Seen;
+  std::vector< VOther > m_Others;                ///< while a join is kept
   std::vector< ZEK::VFlowCursor > m_SeenEntries; ///< while a join is made anew, one an item seen
   std::vector< ZEK::VFlowCursor > m_Entries;
   std::vector< ZEK::VFlowValueId > m_Ids;
