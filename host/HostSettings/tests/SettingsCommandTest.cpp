@@ -1,4 +1,5 @@
 #include <HostSettings/SettingsCommand.h>
+#include <HostSettings/SettingsLine.h>
 
 #include <TestSupport/LogGuard.h>
 #include <TestSupport/Paths.h>
@@ -10,6 +11,7 @@
 #include <fstream>
 #include <iterator>
 #include <memory>
+#include <sstream>
 
 using namespace ZEK;
 
@@ -142,6 +144,48 @@ TEST_F( Settings, AFailureLeavesTheFileAlone )
     EXPECT_TRUE( Set( "a", "2" ).IsError() );
     EXPECT_EQ( Slurp( "s.json" ), pText );
   }
+}
+
+TEST_F( Settings, LinesOfCommands )
+{
+  const std::string Ok = Text( IResult::Ok ) + "\n";
+  struct VRow
+  {
+    std::vector< std::string > m_Arguments;
+    int m_Exit;
+    std::string m_Output;
+    std::string m_Error;
+  };
+  const VRow Rows[] = { { { "set", "a", "-7" }, 0, Ok, "" },
+                        { { "get", "a" }, 0, "-7\n", "" },
+                        { { "set", "--type", "String", "b", "--set" }, 0, Ok, "" },
+                        { { "set", "b", "--x=y", "--type=String" }, 0, Ok, "" },
+                        { { "set", "set", "set" }, 0, Ok, "" },
+                        { { "list" }, 0, "a\t-7\nb\t\"--x=y\"\nset\t\"set\"\n", "" },
+                        { { "get", "c" }, 5, "", "harrow: " + Text( IResult::NotFound ) + "\n" },
+                        { { "get", "a", "--store", m_Folder.Path() / "none" },
+                          5,
+                          "",
+                          "harrow: " + ( m_Folder.Path() / "none" ).string() + ": " + Text( IResult::FileNotFound ) +
+                              "\nharrow: " + Text( IResult::FileNotFound ) + "\n" },
+                        { { "set", "a" }, 2, "", "harrow: value is required\n" },
+                        { {}, 2, "", "harrow: A subcommand is required\n" },
+                        { { "set", "a", "1", "--typ" },
+                          2,
+                          "",
+                          "harrow: The following argument was not expected: --typ\n" } };
+  for ( const VRow& rRow : Rows )
+  {
+    std::ostringstream Output;
+    std::ostringstream Errors;
+    EXPECT_EQ( RunSettingsLine( rRow.m_Arguments, m_Store, Output, Errors ), rRow.m_Exit );
+    EXPECT_EQ( Output.str(), rRow.m_Output );
+    EXPECT_EQ( Errors.str(), rRow.m_Error );
+  }
+  std::ostringstream Output;
+  std::ostringstream Errors;
+  EXPECT_EQ( RunSettingsLine( { "set", "--help" }, m_Store, Output, Errors ), 0 );
+  EXPECT_NE( Output.str().find( "--type" ), std::string::npos );
 }
 } // namespace
 } // namespace HostSettings

@@ -29,10 +29,9 @@ bool IsOwn( const rapidjson::Value::Member& i_rMember )
 
 void SetMember( rapidjson::Document& io_rDocument, std::string_view i_Name, rapidjson::Value i_Value )
 {
-  const auto Found = io_rDocument.FindMember( i_Name.data() );
-  if ( Found != io_rDocument.MemberEnd() )
+  if ( io_rDocument.HasMember( i_Name.data() ) )
   {
-    Found->value = std::move( i_Value );
+    io_rDocument[i_Name.data()] = std::move( i_Value );
     return;
   }
   const auto Size = static_cast< rapidjson::SizeType >( i_Name.size() );

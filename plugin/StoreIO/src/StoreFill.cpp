@@ -227,13 +227,14 @@ rapidjson::SizeType VStoreFill::Schema( const IO::ISchema* i_pSchema )
   {
     It->second = ParseSchema( i_pSchema );
   }
-  for ( const auto& rMember : It->second.GetObject() )
+  const rapidjson::Value& rMembers = It->second;
+  for ( const auto& rMember : rMembers.GetObject() )
   {
     Key( { rMember.name.GetString(), rMember.name.GetStringLength() } );
     // Recurses as deep as a schema can be.
     rMember.value.Accept( m_Filled );
   }
-  return It->second.MemberCount();
+  return rMembers.MemberCount();
 }
 
 /// With its text in the pool, so that copies of the value only refer to it.

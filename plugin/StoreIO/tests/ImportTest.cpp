@@ -5,6 +5,9 @@
 #include <cstdint>
 #include <limits>
 #include <sstream>
+#include <stdexcept>
+#include <streambuf>
+#include <utility>
 
 using namespace ZEK;
 
@@ -263,6 +266,23 @@ TEST( Import, NamesOfAnyBytesFindTheirPlaces )
   }
 }
 
+/// Breaks where its text ends.
+class VBrokenBuffer : public std::streambuf
+{
+public:
+  explicit VBrokenBuffer( std::string i_Text )
+    : m_Text( std::move( i_Text ) )
+  {
+    setg( m_Text.data(), m_Text.data(), m_Text.data() + m_Text.size() );
+  }
+
+protected:
+  int_type underflow() override { throw std::runtime_error( "broken" ); }
+
+private:
+  std::string m_Text;
+};
+
 TEST( Import, OneDocumentManyTimesAndOfTwoMembersTheFirst )
 {
   std::istringstream Stream( "\xef\xbb\xbf \n" + Whole( R"("a":{"Value":1,"Value":2,"Type":"Int32"})" ) + "\r\n\t " );
@@ -280,6 +300,9 @@ TEST( Import, OneDocumentManyTimesAndOfTwoMembersTheFirst )
   }
   Stream.setstate( std::ios::badbit );
   EXPECT_EQ( Importer.ReadStream( Stream ), IResult::FileIOFailure );
+  VBrokenBuffer Buffer( Whole( "" ) );
+  std::istream Broken( &Buffer );
+  EXPECT_EQ( Importer.ReadStream( Broken ), IResult::FileIOFailure );
   // A zero byte is no end.
   EXPECT_EQ( Importer.ReadText( Whole( "" ) + std::string( "\0", 1 ) ), IResult::InvalidFormat );
   EXPECT_EQ( Importer.ReadError(), "A zero byte stands behind the document. at line 1, column 32" );
