@@ -63,7 +63,7 @@ VRecordingSubjects SubjectsOf( const VRecording& i_rRecording )
     }
     auto& rMarkers = All.Subjects[It->second - 1].Markers;
     CoreMoxelTypes::VMarker Marker;
-    Marker.Id = static_cast< std::uint32_t >( rMarkers.size() + 1 );
+    Marker.Id = static_cast< std::uint32_t >( rMarkers.size() ); // as labels name it
     Marker.Name = std::move( Name.Marker );
     Marker.Radius = MarkerRadius;
     All.Places[Point] = { It->second, static_cast< std::uint32_t >( rMarkers.size() ) };
