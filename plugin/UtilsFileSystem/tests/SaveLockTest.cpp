@@ -117,6 +117,30 @@ TEST_F( VProtected, OneWhoHoldsTheLockLoadsAndSavesAndOthersWait )
   EXPECT_EQ( Load( m_Folder.Target() ), "late" );
 }
 
+TEST_F( VProtected, TheLockOfAFileWithoutANameIsWorthNothing )
+{
+  // The owner before removes its file between our opening and our locking.
+  bool bFirst = true;
+  const VTracedCalls Calls(
+      [&]( const VCall& i_rCall, int )
+      {
+        if ( i_rCall.Name == "lock" && std::exchange( bFirst, false ) )
+        {
+          std::filesystem::remove( i_rCall.Path );
+        }
+        return 0;
+      } );
+  EXPECT_EQ( ProtectedSave(
+                 [&]( const std::string& i_rPath )
+                 {
+                   EXPECT_TRUE( m_Folder.Get( ".lock" ) );
+                   return Writer( "n" )( i_rPath );
+                 },
+                 m_Folder.Target(), true ),
+             IResult::Ok );
+  EXPECT_FALSE( bFirst );
+}
+
 TEST_F( VProtected, TwoProcessesSaveOneTargetAndEveryLoadIsWhole )
 {
   const char* const pRounds = std::getenv( "HARROW_SAVE_ROUNDS" );

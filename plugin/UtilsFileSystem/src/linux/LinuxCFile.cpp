@@ -104,7 +104,7 @@ IResult Platform::OpenCFile( const std::string& i_rPath, std::string_view i_Mode
   {
     return IResult::InvalidArgument;
   }
-  auto pCookie = std::make_unique< VCookie >();
+  auto pCookie = std::make_unique_for_overwrite< VCookie >();
   pCookie->File = OpenFile( i_rPath, Mode.Flags );
   if ( pCookie->File == -1 )
   {
