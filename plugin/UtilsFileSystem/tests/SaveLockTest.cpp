@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <cerrno>
 #include <cstdlib>
 #include <new>
 
@@ -139,6 +140,20 @@ TEST_F( VProtected, TheLockOfAFileWithoutANameIsWorthNothing )
                  m_Folder.Target(), true ),
              IResult::Ok );
   EXPECT_FALSE( bFirst );
+}
+
+TEST_F( VProtected, ABackupNeverComesBackBesideAFileThatIsNotWholeAndAFailingCloseIsAFailure )
+{
+  Prepare( { { "", "t" }, { ".old", "o" } } );
+  const VQuiet Quiet;
+  const VTracedCalls Calls(
+      []( const VCall& i_rCall, int )
+      {
+        const bool bNew = i_rCall.Path.ends_with( ".new" );
+        return bNew && ( i_rCall.Name == "unlink" || i_rCall.Name == "close" ) ? EIO : 0;
+      } );
+  EXPECT_EQ( Save( m_Folder.Target(), "n" ), IResult::FileIOFailure );
+  EXPECT_EQ( Left(), ( Contents{ { "", "t" }, { ".new", "n" }, { ".old.stale", "o" } } ) );
 }
 
 TEST_F( VProtected, TwoProcessesSaveOneTargetAndEveryLoadIsWhole )
