@@ -123,6 +123,12 @@ QQuickFramebufferObject::Renderer* VSceneFramebufferObject::createRenderer() con
   return new VSceneFramebufferRenderer( m_bContinuous );
 }
 
+bool VSceneFramebufferObject::IsPickPending() const
+{
+  TakeOver( this );
+  return m_PickMode == EPickClick || m_PickMode == EPickBandDone;
+}
+
 QSGNode* VSceneFramebufferObject::updatePaintNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData )
 {
   TakeOver( this );

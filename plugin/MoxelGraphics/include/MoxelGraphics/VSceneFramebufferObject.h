@@ -96,7 +96,7 @@ public:
   const ZEK::VSelection& Picked() const { return m_Picked; }
   const std::vector< std::string >& PickedLabels() const { return m_PickedLabels; }
   /// True while a click or a band waits for its pick; a few frames end that.
-  bool IsPickPending() const { return m_PickMode == EPickClick || m_PickMode == EPickBandDone; }
+  bool IsPickPending() const;
 
   /// Sets one option as a person would: the map, the record, bindings and the view follow.
   Q_INVOKABLE void setOption( const QString& i_rKey, const QVariant& i_rValue );
