@@ -1,8 +1,11 @@
+#include <HostSettings/SettingsCommand.h>
+#include <HostSettings/SettingsLine.h>
 #include <HostWindow/CommandLine.h>
 #include <HostWindow/Display.h>
 #include <HostWindow/Headless.h>
 #include <HostWindow/MainWindow.h>
 
+#include <QtCore/QStandardPaths>
 #include <QtWidgets/QApplication>
 #include <QtWidgets/QStyleFactory>
 
@@ -10,6 +13,7 @@
 #include <exception>
 #include <iostream>
 #include <locale>
+#include <string_view>
 
 namespace
 {
@@ -35,8 +39,22 @@ void TurnIntoPictures( HostWindow::VCommandLine& io_rLine )
   io_rLine.Render.bAll = true;
 }
 
+/// Needs neither a display nor a plug-in.
+int RunSettings( int i_Count, char** i_ppArguments )
+{
+  QCoreApplication::setApplicationName( "harrow" );
+  const QString Folder = QStandardPaths::writableLocation( QStandardPaths::AppConfigLocation );
+  return HostSettings::RunSettingsLine( { i_ppArguments + 2, i_ppArguments + i_Count },
+                                        Folder.toStdString() + "/" + HostSettings::SettingsFileName, std::cout,
+                                        std::cerr );
+}
+
 int Run( int i_Count, char** i_ppArguments )
 {
+  if ( i_Count > 1 && std::string_view( i_ppArguments[1] ) == "settings" )
+  {
+    return RunSettings( i_Count, i_ppArguments );
+  }
   HostWindow::VCommandLine Line;
   const HostWindow::VParseResult Parsed = HostWindow::ParseCommandLine( i_Count, i_ppArguments, Line );
   if ( Parsed.Exit )
@@ -47,6 +65,10 @@ int Run( int i_Count, char** i_ppArguments )
   if ( Line.Mode == HostWindow::EProgramMode::Info )
   {
     return Report( HostWindow::RunInfo( Line.Files, Line.bJson ) );
+  }
+  if ( Line.Mode == HostWindow::EProgramMode::InspectCameras )
+  {
+    return Report( HostWindow::RunInspectCameras( Line.Files ) );
   }
 
   HostWindow::VPrivateDisplay Display;

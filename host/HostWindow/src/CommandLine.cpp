@@ -10,6 +10,7 @@ namespace HostWindow
 namespace
 {
 constexpr const char* pFooter =
+    "\"harrow settings --help\" tells how settings are read and changed without a window.\n"
     "Exit codes: 0 done, 2 wrong usage, 3 the plug-in cannot be loaded, 4 no display, 5 a file cannot be read or "
     "written.";
 
@@ -238,7 +239,11 @@ VParseResult ParseCommandLine( int i_Count, const char* const* i_ppArguments, VC
   CLI::App& rInfo = *App.add_subcommand( "info", "Print what recordings hold" );
   rInfo.add_option( "files", o_rLine.Files, "The recordings" )->required()->type_name( "FILE" );
   rInfo.add_flag( "--json", o_rLine.bJson, "As JSON" );
-  for ( CLI::App* pSub : { &rOpen, &rRender, &rInfo } )
+  CLI::App& rInspect = *App.add_subcommand( "inspect", "Print what the program makes of a file, as JSON" );
+  rInspect.require_subcommand( 1 );
+  CLI::App& rCameras = *rInspect.add_subcommand( "cameras", "Of calibrations: the model of each camera" );
+  rCameras.add_option( "files", o_rLine.Files, "Camera calibrations (TOML, JSON)" )->required()->type_name( "FILE" );
+  for ( CLI::App* pSub : { &rOpen, &rRender, &rInfo, &rInspect, &rCameras } )
   {
     pSub->fallthrough();
     pSub->footer( "The options of \"harrow --help\" hold here too." );
@@ -259,10 +264,11 @@ VParseResult ParseCommandLine( int i_Count, const char* const* i_ppArguments, VC
     Result.Error = bGood ? std::string() : OneLine( rError.what() );
     return Result;
   }
-  o_rLine.Mode = rOpen.parsed()     ? EProgramMode::Open
-                 : rRender.parsed() ? EProgramMode::Render
-                 : rInfo.parsed()   ? EProgramMode::Info
-                                    : EProgramMode::Window;
+  o_rLine.Mode = rOpen.parsed()      ? EProgramMode::Open
+                 : rRender.parsed()  ? EProgramMode::Render
+                 : rInfo.parsed()    ? EProgramMode::Info
+                 : rCameras.parsed() ? EProgramMode::InspectCameras
+                                     : EProgramMode::Window;
   Result.Error = CheckTogether( o_rLine );
   if ( !Result.Error.empty() )
   {

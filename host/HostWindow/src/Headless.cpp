@@ -6,6 +6,7 @@
 #include <HostWindow/ViewDriver.h>
 
 #include <HarrowPluginInterface/IWorkspaceContent.h>
+#include <HostSources/CameraCalibrations.h>
 #include <HostSources/ReadRecording.h>
 #include <HostSources/RecordingInfo.h>
 
@@ -187,6 +188,32 @@ VRunResult RenderAll( VSession& io_rSession, const VRenderOptions& i_rRender )
   }
   return {};
 }
+/// Says what went wrong with a file, if anything did. False when there is nothing to show of it.
+bool TellOfReading( const std::string& i_rFile, const ZEK::IResult& i_rRead, const std::string& i_rMessage,
+                    VRunResult& io_rResult )
+{
+  if ( !i_rMessage.empty() || i_rRead.IsError() )
+  {
+    std::cerr << "harrow: " << ( i_rMessage.empty() ? i_rFile + ": " + i_rRead.Text() : i_rMessage ) << std::endl;
+  }
+  if ( i_rRead.IsError() )
+  {
+    io_rResult.Exit = EExitFile;
+  }
+  return !i_rRead.IsError();
+}
+
+/// One after the other, or as one JSON list.
+VRunResult PrintTexts( const std::vector< std::string >& i_rTexts, bool i_bList, const VRunResult& i_rResult )
+{
+  std::cout << ( i_bList ? "[\n" : "" );
+  for ( std::size_t i = 0; i < i_rTexts.size(); ++i )
+  {
+    std::cout << ( i == 0 ? "" : i_bList ? ",\n" : "\n" ) << i_rTexts[i];
+  }
+  std::cout << ( i_bList ? "]\n" : "" ) << std::flush;
+  return std::cout.good() ? i_rResult : Fail( EExitFile, "cannot write to stdout" );
+}
 } // namespace
 
 VRunResult RunRender( const VCommonOptions& i_rCommon, const VRenderOptions& i_rRender )
@@ -229,26 +256,31 @@ VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson )
     HostSources::VRecording Recording;
     std::string Message;
     const ZEK::IResult Read = HostSources::ReadRecording( rFile, Recording, Message );
-    if ( !Message.empty() || Read.IsError() )
+    if ( TellOfReading( rFile, Read, Message, Result ) )
     {
-      std::cerr << "harrow: " << ( Message.empty() ? rFile + ": " + Read.Text() : Message ) << std::endl;
+      const HostSources::VRecordingInfo Info = HostSources::DescribeRecording( Recording );
+      Texts.push_back( i_bJson ? Info.Json() : Info.Text() );
     }
-    if ( Read.IsError() )
-    {
-      Result.Exit = EExitFile;
-      continue;
-    }
-    const HostSources::VRecordingInfo Info = HostSources::DescribeRecording( Recording );
-    Texts.push_back( i_bJson ? Info.Json() : Info.Text() );
   }
-  const bool bList = i_bJson && i_rFiles.size() > 1;
-  std::cout << ( bList ? "[\n" : "" );
-  for ( std::size_t i = 0; i < Texts.size(); ++i )
+  return PrintTexts( Texts, i_bJson && i_rFiles.size() > 1, Result );
+}
+
+VRunResult RunInspectCameras( const std::vector< std::string >& i_rFiles )
+{
+  VRunResult Result;
+  std::vector< std::string > Texts;
+  for ( const std::string& rFile : i_rFiles )
   {
-    std::cout << ( i == 0 ? "" : bList ? ",\n" : "\n" ) << Texts[i];
+    HostSources::VCameraCalibrations Calibrations;
+    std::string Message;
+    const ZEK::IResult Read =
+        HostSources::ReadCameraCalibrations( std::filesystem::path( rFile ), Calibrations, Message );
+    if ( TellOfReading( rFile, Read, Message, Result ) )
+    {
+      Texts.push_back( HostSources::CameraCalibrationsJson( Calibrations ) );
+    }
   }
-  std::cout << ( bList ? "]\n" : "" ) << std::flush;
-  return std::cout.good() ? Result : Fail( EExitFile, "cannot write to stdout" );
+  return PrintTexts( Texts, i_rFiles.size() > 1, Result );
 }
 
 } // namespace HostWindow

@@ -28,7 +28,8 @@ enum class EProgramMode
   Window,
   Open,
   Render,
-  Info
+  Info,
+  InspectCameras
 };
 
 /// What holds for every mode.
@@ -64,7 +65,7 @@ struct VCommandLine
   EProgramMode Mode = EProgramMode::Window;
   VCommonOptions Common;
   VRenderOptions Render;
-  std::vector< std::string > Files; ///< of `open` and `info`
+  std::vector< std::string > Files; ///< of `open`, `info` and `inspect`
   bool bJson = false;
 };
 

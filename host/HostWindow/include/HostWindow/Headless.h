@@ -21,4 +21,8 @@ VRunResult RunRender( const VCommonOptions& i_rCommon, const VRenderOptions& i_r
 /// Prints what each recording holds to stdout. Needs no application object. All files are tried.
 VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson );
 
+/// Prints the cameras of each calibration, with the models that views draw them with, to stdout as JSON. Needs no
+/// application object. All files are tried.
+VRunResult RunInspectCameras( const std::vector< std::string >& i_rFiles );
+
 } // namespace HostWindow
