@@ -141,6 +141,9 @@ TEST( Export, WhatCannotBeWrittenIsToldAndTheDocumentStays )
         EXPECT_EQ( io_rWriter.SetVerifiedValue( Settings["c"], VTypedValue( IO::GetUniquePodSchema( EType::Int32 ),
                                                                             IO::VValueBytes( "x", 1 ) ) ),
                    IResult::Ok );
+        EXPECT_EQ( io_rWriter.SetVerifiedValue( Settings["d"], VTypedValue( IO::GetUniquePodSchema( EType::String ),
+                                                                            IO::VValueBytes( "\0\0\0\0x", 5 ) ) ),
+                   IResult::Ok );
       } );
   EXPECT_EQ( Settings.Export( Exporter ), IResult::Failed );
   std::string After;
@@ -152,6 +155,7 @@ TEST( Export, WhatCannotBeWrittenIsToldAndTheDocumentStays )
   ExpectLines( { "Failed trying to write values for entry path 'a/only', entry has no values set.",
                  "Failed trying to write a value for entry path 'b', it has no text.",
                  "Failed trying to write a value for entry path 'c', it has no text.",
+                 "Failed trying to write a value for entry path 'd', it has no text.",
                  "The Json document is not of type Object or Null" } );
 }
 

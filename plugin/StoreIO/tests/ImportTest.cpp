@@ -97,7 +97,7 @@ TEST( Import, FaultsAreToldOneByOneAndTheRestIsWritten )
              R"("b":{"Value":"x","Type":"List","SubSchemas":[{"Type":"Bool"}]},)"
              R"("c":{"Value":1,"Value-Proposed":2,"Type":"Int33","Count":3},)"
              R"("d":{"Value":{},"Value-Proposed":7,"Type":"String"},)"
-             R"("e":{"Value":true},"f":{"Children":4},"%1%":{"Value":"","Type":"Void"},)"
+             R"("e":{"Value":true},"g":{"Value":1,"Type":"Ixxx2"},"f":{"Children":4},"%1%":{"Value":"","Type":"Void"},)"
              R"("wrong":[],"skipped":{"Value":1,"Type":"Int32"}}},"later":{"Value":2,"Type":"Int32"})" );
   const std::string In = "(Element XPath=\"/Configuration/Node[@name='a']";
   const std::vector< std::string > Lines{
@@ -107,6 +107,7 @@ TEST( Import, FaultsAreToldOneByOneAndTheRestIsWritten )
       "Encountered 'd' with invalid 'Value-Proposed', " + In + "/Node[@name='d']\")",
       "Encountered 'd' with invalid 'Value', " + In + "/Node[@name='d']\")",
       "Encountered 'e', and unable to set value schema from '{}'. " + In + "/Node[@name='e']\")",
+      R"(Encountered 'g', and unable to set value schema from '{"Type":"Ixxx2"}'. )" + In + "/Node[@name='g']\")",
       "Expected to encounter a json object as the value of member 'Children' at path 'a/f', " + In +
           "/Node[@name='f']\")",
       "Encountered '%1%' with invalid 'Value', " + In + "/Node[@name='%1%']\")",
