@@ -216,10 +216,16 @@ TEST_F( CacheTransform, TransformsAStateOnceAndAnotherOneOfItsKeyAgain )
   Put( 1, 12 );
   EXPECT_EQ( Fetched(), std::pair( -2, -2 ) );
   EXPECT_EQ( Fetched(), std::pair( -2, -2 ) ) << "the output of the key's former state";
-  m_Cache.SetTransform( std::make_shared< VTransform >() );
+  // Another transform, and a source set anew, start afresh even with a state that is in the stash.
+  const auto pOther = std::make_shared< VTransform >();
+  m_pTransform->Refused = ~0u;
   EXPECT_EQ( Fetched(), std::pair( 12, 5 ) );
+  m_Cache.SetTransform( pOther );
+  EXPECT_EQ( Fetched(), std::pair( 12, 5 ) );
+  EXPECT_EQ( pOther->Calls, 1 );
   m_Cache.SetSource( m_pSource );
   EXPECT_EQ( Fetched(), std::pair( 12, 5 ) );
+  EXPECT_EQ( pOther->Calls, 2 );
   const std::uint64_t Before = TestSupport::AllocationCount();
   EXPECT_EQ( Fetched(), std::pair( 12, 5 ) );
   EXPECT_EQ( TestSupport::AllocationCount(), Before ) << "a frame that is drawn again";
@@ -312,18 +318,19 @@ TEST_F( CacheTransform, RandomFetchesAnswerAsAListOfPairsWould )
         std::vector< ZEK::VFlowStateRef > Many( 3, NumberState( {}, 1 ) );
         const std::int64_t First =
             InRing.empty() ? 0 : InRing.back().Frame - static_cast< std::int64_t >( Random() % 6 );
-        ASSERT_TRUE( m_Cache.FetchMany( { { First, 1, 1 }, { First + 2, 1, 1 } }, Many, 0 ) );
-        std::size_t Place = 0;
         const int Former = Calls;
+        ASSERT_TRUE( m_Cache.FetchMany( { { First, 1, 1 }, { First + 2, 1, 1 } }, Many, 0 ) );
+        const int Made = m_pTransform->Calls - Former; // all before the first is looked at
+        std::size_t Place = 0;
         for ( const VPair& rInput : InRing )
         {
           if ( rInput.Frame >= First && rInput.Frame <= First + 2 )
           {
-            m_pTransform->Calls = Calls + 1; // they were all made before the first is looked at
+            m_pTransform->Calls = Calls + 1;
             Expect( rInput, true, Many.at( Place++ ) );
           }
         }
-        EXPECT_EQ( std::pair( Many.size(), Calls - Former ), std::pair( Place, static_cast< int >( Place ) ) );
+        EXPECT_EQ( std::pair( Many.size(), Made ), std::pair( Place, static_cast< int >( Place ) ) );
         break;
       }
       case 4:
