@@ -177,6 +177,11 @@ void VCameraDrawData::MakeColours( const VSource& i_rSource, ZEK::ECentroidColou
   const auto* const pAssignments = rCamera.Value< VCentroidAssignmentSet >( ECameraCentroidAssignments );
   const auto* const pLabels = rCamera.Value< VCentroidLabelSet >( ECameraCentroidLabels );
   const auto* const pSet = rCamera.Value< VCentroidSet >( ECameraCentroids );
+  if ( i_Scheme == ZEK::EColourConnection && !pAssignments )
+  {
+    std::fill( rColours.begin(), rColours.end(), PlainColour );
+    return;
+  }
   for ( std::size_t Centroid = 0; Centroid < rColours.size(); ++Centroid )
   {
     std::uint32_t& rColour = rColours[Centroid];
@@ -194,8 +199,7 @@ void VCameraDrawData::MakeColours( const VSource& i_rSource, ZEK::ECentroidColou
     else
     {
       const auto* const pReconstruction = ElementAt( pAssignments ? &pAssignments->Reconstruction : nullptr, Centroid );
-      rColour = !pAssignments                                ? PlainColour
-                : !pReconstruction || *pReconstruction < 0   ? UnassignedColour
+      rColour = !pReconstruction || *pReconstruction < 0     ? UnassignedColour
                 : m_pColours->IsLabelled( *pReconstruction ) ? LabelledColour
                                                              : AssignedColour;
     }
@@ -218,17 +222,24 @@ void VCameraDrawData::MakeVertices( const VSource& i_rSource, bool i_b3D )
   {
     return;
   }
-  const VCorrection Correction{ rCamera.GetModel() };
-  if ( const auto* const pSet = rCamera.Value< VCentroidSet >( ECameraCentroids ) )
+  const auto* const pSet = rCamera.Value< VCentroidSet >( ECameraCentroids );
+  if ( !pSet )
   {
-    for ( const VCentroid& rCentroid : pSet->Centroids )
+    return;
+  }
+  const std::vector< std::uint32_t >& rColours = *m_pColourWords;
+  rVertices.resize( pSet->Centroids.size() );
+  for ( std::size_t Index = 0; Index < rVertices.size(); ++Index )
+  {
+    const VCentroid& rCentroid = pSet->Centroids[Index];
+    rVertices[Index] = { rCentroid.x, rCentroid.y, rCentroid.radius, rColours[Index] };
+  }
+  if ( i_b3D )
+  {
+    const VCorrection Correction{ rCamera.GetModel() };
+    for ( VCentroidVertex& rVertex : rVertices )
     {
-      VCentroidVertex& rVertex = rVertices.emplace_back();
-      rVertex = { rCentroid.x, rCentroid.y, rCentroid.radius, ( *m_pColourWords )[rVertices.size() - 1] };
-      if ( i_b3D )
-      {
-        Correction.Apply( rVertex.X, rVertex.Y );
-      }
+      Correction.Apply( rVertex.X, rVertex.Y );
     }
   }
 }

@@ -139,7 +139,13 @@ bool VCameraMembers::FindIndex( const ZEK::VSelectionItem& i_rItem, std::uint32_
   return true;
 }
 
-void VCameraMembers::Add( const VFlowRenderCamera& i_rCamera, std::size_t i_Count )
+void VCameraMembers::Clear()
+{
+  Parts.clear();
+  Count = 0;
+}
+
+void VCameraMembers::Add( VFlowRenderCamera& i_rCamera, std::size_t i_Count )
 {
   if ( i_Count > 0 )
   {
@@ -178,7 +184,7 @@ void VFlowRenderCameraProvider::Update( const ZEK::IFlowState& i_rState )
   }
   GiveMarks( bNames );
   const bool bChanged = GiveItems( i_rState, bNames );
-  GiveIds();
+  GiveIds( bNames );
   if ( bNames || bChanged )
   {
     TellScene();
@@ -209,7 +215,8 @@ void VFlowRenderCameraProvider::TakeReconstructionLabels( const ZEK::IFlowState&
 {
   ZEK::VFlowItemRef New;
   i_rState.FindItem( New, ZEK::FlowTag< FlowReconstructionLabelSet >, EFlowTimeMatch::Overlap );
-  if ( IsOtherValue( m_ReconstructionLabels, New ) )
+  m_bOtherLabels = IsOtherValue( m_ReconstructionLabels, New );
+  if ( m_bOtherLabels )
   {
     m_pColours->SetReconstructionLabels( ZEK::FlowPayload< VReconstructionLabelSet >( New.Get() ) );
   }
@@ -222,8 +229,8 @@ void VFlowRenderCameraProvider::TakeNames()
   New.reserve( CameraExtractor.Names().size() );
   m_Slots.clear();
   m_List.clear();
-  m_Centroids.Parts.clear();
-  m_Blobs.Parts.clear();
+  m_Centroids.Clear();
+  m_Blobs.Clear();
   for ( const std::string& rName : CameraExtractor.Names() )
   {
     const auto It = Cameras.find( rName );
@@ -240,11 +247,13 @@ void VFlowRenderCameraProvider::TakeNames()
 bool VFlowRenderCameraProvider::GiveItems( const ZEK::IFlowState& i_rState, bool i_bAll )
 {
   std::array< const std::vector< ZEK::VFlowCursor >*, ECameraItemCount > Entries{};
+  bool bAny = i_bAll || m_bOtherLabels;
   for ( const VCameraTag& rTag : CameraTags )
   {
     if ( i_bAll || CameraExtractor.Changed( rTag.Tag ) )
     {
       Entries[rTag.Item] = &CameraExtractor.Entries( rTag.Tag );
+      bAny = true;
     }
   }
   ZEK::VFlowCursor End;
@@ -255,7 +264,7 @@ bool VFlowRenderCameraProvider::GiveItems( const ZEK::IFlowState& i_rState, bool
     VFlowRenderCamera& rCamera = *m_Slots[Slot];
     const std::int32_t Before = rCamera.GetInfo().ChangeCount;
     rCamera.SetKey( i_rState.GetKey() );
-    for ( std::uint32_t Item = 0; Item < ECameraItemCount; ++Item )
+    for ( std::uint32_t Item = 0; bAny && Item < ECameraItemCount; ++Item )
     {
       if ( Item == ECameraReconstructionLabels )
       {
@@ -308,34 +317,44 @@ void VFlowRenderCameraProvider::GiveMarks( bool i_bAll )
   }
 }
 
-void VFlowRenderCameraProvider::GiveIds()
+void VFlowRenderCameraProvider::GiveIds( bool i_bAll )
 {
-  MoxelGraphics::VSelectionRegistry& rRegistry = m_rScene.Registry();
-  for ( VCameraMembers* const pMembers : { &m_Centroids, &m_Blobs } )
+  const bool bOthers = i_bAll || CameraExtractor.Changed( ZEK::FlowTag< FlowCentroidSet > ) ||
+                       CameraExtractor.Changed( ZEK::FlowTag< FlowGreyscaleBlobSet > );
+  if ( bOthers )
   {
-    pMembers->Parts.clear();
-    pMembers->Count = 0;
-  }
-  for ( const auto& rpCamera : m_Slots )
-  {
-    m_Centroids.Add( *rpCamera, rpCamera->CentroidCount() );
-    m_Blobs.Add( *rpCamera, rpCamera->BlobCount() );
+    m_Centroids.Clear();
+    m_Blobs.Clear();
+    for ( const auto& rpCamera : m_Slots )
+    {
+      m_Centroids.Add( *rpCamera, rpCamera->CentroidCount() );
+      m_Blobs.Add( *rpCamera, rpCamera->BlobCount() );
+    }
   }
   const auto Allocate = [&]( const VCameraMembers& i_rMembers )
   {
-    return i_rMembers.Count == 0 ? 0 : rRegistry.AllocateRange( i_rMembers.Count, i_rMembers );
+    return i_rMembers.Count == 0 ? 0 : m_rScene.Registry().AllocateRange( i_rMembers.Count, i_rMembers );
   };
   const std::uint32_t FirstCentroid = Allocate( m_Centroids );
   const std::uint32_t FirstBlob = Allocate( m_Blobs );
-  std::uint32_t Centroids = 0, Blobs = 0;
+  if ( !bOthers && FirstCentroid == m_FirstCentroid && FirstBlob == m_FirstBlob )
+  {
+    return;
+  }
+  m_FirstCentroid = FirstCentroid;
+  m_FirstBlob = FirstBlob;
   for ( const auto& rpCamera : m_Slots )
   {
-    const auto OwnCentroids = static_cast< std::uint32_t >( rpCamera->CentroidCount() );
-    const auto OwnBlobs = static_cast< std::uint32_t >( rpCamera->BlobCount() );
-    rpCamera->SetFirstIds( FirstCentroid != 0 && OwnCentroids > 0 ? FirstCentroid + Centroids : 0,
-                           FirstBlob != 0 && OwnBlobs > 0 ? FirstBlob + Blobs : 0 );
-    Centroids += OwnCentroids;
-    Blobs += OwnBlobs;
+    rpCamera->SetFirstIds( 0, 0 );
+  }
+  for ( const VCameraMembers::VPart& rPart : m_Blobs.Parts )
+  {
+    rPart.pCamera->SetFirstIds( 0, FirstBlob == 0 ? 0 : FirstBlob + rPart.First );
+  }
+  for ( const VCameraMembers::VPart& rPart : m_Centroids.Parts )
+  {
+    rPart.pCamera->SetFirstIds( FirstCentroid == 0 ? 0 : FirstCentroid + rPart.First,
+                                rPart.pCamera->GetInfo().FirstBlobId );
   }
 }
 

@@ -2,6 +2,7 @@
 
 #include "StateUpAxis.h"
 
+#include <Flow2Graphics/VFlowRenderCentroidAssignments.h>
 #include <Flow2Graphics/VFlowRenderFloorGrid.h>
 #include <Flow2Graphics/VFlowRenderForcePlates.h>
 #include <Flow2Graphics/VFlowRenderReconstructionVolume.h>
@@ -32,12 +33,14 @@ void VFlowScene::CreateRenderTypes()
   const auto pFloor = std::make_shared< VFlowRenderFloorGrid >( Resources() );
   const auto pPlates = std::make_shared< VFlowRenderForcePlates >( *this );
   const auto pReconstructions = std::make_shared< VFlowRenderReconstructions >( *this );
+  m_pCameraProvider = std::make_shared< VFlowRenderCameraProvider >( *this );
+  const auto pAssignments = std::make_shared< VFlowRenderCentroidAssignments >( *this, m_pCameraProvider );
   const auto pVolume = std::make_shared< VFlowRenderReconstructionVolume >( Resources() );
   const auto pAxis = std::make_shared< MoxelGraphics::VRenderAxis >( Resources() );
 
   m_PostList = { std::make_shared< MoxelGraphics::VRenderOutlines >( *this ) };
-  m_RenderList = { pFloor, pPlates, pReconstructions, pVolume, pAxis };
-  m_FlowRenderTypes = { pFloor, pPlates, pReconstructions, pVolume };
+  m_RenderList = { pFloor, pPlates, pReconstructions, pAssignments, pVolume, pAxis };
+  m_FlowRenderTypes = { pFloor, pPlates, pReconstructions, pVolume, m_pCameraProvider, pAssignments };
 }
 
 bool VFlowScene::ProcessPending()

@@ -28,7 +28,7 @@ class VCameraMembers : public MoxelGraphics::IRangeResolver
 public:
   struct VPart
   {
-    const VFlowRenderCamera* pCamera = nullptr;
+    VFlowRenderCamera* pCamera = nullptr;
     std::uint32_t First = 0;
   };
   VCameraMembers( std::uint32_t i_Kind, const char* i_pWord )
@@ -42,7 +42,8 @@ public:
 
   bool ResolveIndex( std::uint32_t i_Index, ZEK::VSelectionItem& o_rItem, std::string& o_rLabel ) const override;
   bool FindIndex( const ZEK::VSelectionItem& i_rItem, std::uint32_t& o_rIndex ) const override;
-  void Add( const VFlowRenderCamera& i_rCamera, std::size_t i_Count );
+  void Clear();
+  void Add( VFlowRenderCamera& i_rCamera, std::size_t i_Count );
 
 private:
   std::uint32_t m_Kind;
@@ -92,7 +93,7 @@ private:
   bool GiveItems( const ZEK::IFlowState& i_rState, bool i_bAll );
   void TakeReconstructionLabels( const ZEK::IFlowState& i_rState );
   void GiveMarks( bool i_bAll );
-  void GiveIds();
+  void GiveIds( bool i_bAll );
   void TellScene();
 
   MoxelGraphics::VMoxelScene& m_rScene;
@@ -103,9 +104,11 @@ private:
   std::vector< std::shared_ptr< VFlowRenderCamera > > m_Slots; ///< by slot of the join
   std::vector< ZEK::VRenderCameraRef > m_List;
   ZEK::VFlowItemRef m_ReconstructionLabels;
+  bool m_bOtherLabels = false;         ///< than in the update before
   std::vector< VCameraMarks > m_Marks; ///< by slot, while marks are given
   std::uint64_t m_MarksGeneration = 0;
   VCameraMembers m_Centroids, m_Blobs;
+  std::uint32_t m_FirstCentroid = 0, m_FirstBlob = 0;
 };
 
 } // namespace Flow2Graphics

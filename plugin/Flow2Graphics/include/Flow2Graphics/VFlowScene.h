@@ -9,6 +9,8 @@
 namespace Flow2Graphics
 {
 
+class VFlowRenderCameraProvider;
+
 /// A scene that draws frames of state. A derived scene decides where the states come from: it calls `MarkDirty` when
 /// there is something new, and answers `FetchState`.
 ///
@@ -47,6 +49,8 @@ public:
   QString SelectedName() { return GetSelectedCameraURN(); }
   void SelectByName( const QString& i_rName, bool i_bPreselect ) { SelectDevice( i_rName, i_bPreselect ); }
 
+  /// The cameras of the present state; null before the render types are made.
+  const std::shared_ptr< VFlowRenderCameraProvider >& CameraProvider() const { return m_pCameraProvider; }
   const std::vector< std::shared_ptr< IFlowRenderType > >& FlowRenderTypes() const { return m_FlowRenderTypes; }
 
 protected:
@@ -55,6 +59,7 @@ protected:
 
 private:
   std::vector< std::shared_ptr< IFlowRenderType > > m_FlowRenderTypes;
+  std::shared_ptr< VFlowRenderCameraProvider > m_pCameraProvider;
 };
 
 } // namespace Flow2Graphics
