@@ -66,6 +66,8 @@ QPainterPath PathOf( EIcon i_Icon )
     return LoopPath();
   case EIcon::Live:
     return Circle( 4.5 );
+  case EIcon::Reset:
+    return QTransform( -1, 0, 0, 1, 16, 0 ).map( LoopPath() );
   }
   return {};
 }

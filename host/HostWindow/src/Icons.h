@@ -14,7 +14,8 @@ enum class EIcon
   First,
   Last,
   Loop,
-  Live
+  Live,
+  Reset
 };
 
 /// Drawn in the colour of the text, so that they fit every theme and ratio.

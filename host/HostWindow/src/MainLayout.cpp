@@ -27,14 +27,19 @@ void VMainWindow::SaveLayout()
   rPreferences.SetLayout( pLayoutName, QJsonObject{ { "windows", Windows } } );
   rPreferences.SetGeometry( pGeometryName, saveGeometry() );
   rPreferences.SetGeometry( pStateName, saveState( StateVersion ) );
-  rPreferences.SetValue( "altToSelect", m_bAltToSelect );
+  rPreferences.SetValue( "altToSelect", AltToSelect() );
   (void)rPreferences.Save();
 }
 
 void VMainWindow::RestoreLayout()
 {
   auto& rPreferences = m_rSession.Host().Preferences();
-  SetAltToSelect( rPreferences.Value( "altToSelect" ).toBool( true ) );
+  const QJsonValue Alt = rPreferences.Value( "altToSelect" );
+  if ( Alt.isBool() && Alt.toBool() != AltToSelect() )
+  {
+    const ZEK::VStoreWriteScope Scope( *m_rSession.Host().Store() );
+    (void)Scope->SetValue( m_Preferences.AltToSelect().Entry(), ZEK::IO::MakeValue( Alt.toBool() ) );
+  }
   for ( const QJsonValue& rValue : rPreferences.Layout( pLayoutName )["windows"].toArray() )
   {
     const QJsonObject Window = rValue.toObject();

@@ -21,6 +21,10 @@ void VMainWindow::MakeMenus()
   QAction* pRedo = rUndo.createRedoAction( pEdit, tr( "&Redo" ) );
   pRedo->setShortcut( QKeySequence::Redo );
   pEdit->addActions( { pUndo, pRedo } );
+  pEdit->addSeparator();
+  QAction* pPreferences = pEdit->addAction( tr( "Pre&ferences…" ), this, &VMainWindow::ShowPreferences );
+  pPreferences->setShortcut( QKeySequence( Qt::CTRL | Qt::Key_Comma ) );
+  pPreferences->setMenuRole( QAction::PreferencesRole );
   MakeViewMenu();
   MakePlaybackMenu();
   m_pWindowMenu = menuBar()->addMenu( tr( "&Window" ) );

@@ -34,16 +34,12 @@ QStringList DroppedFiles( const QMimeData* i_pData )
   }
   return Paths;
 }
-
-constexpr const char* pGesturesWithAlt =
-    "Drag: orbit · Right drag: zoom · Left+right: pan · Alt+drag: select · Click: select";
-constexpr const char* pGesturesWithoutAlt =
-    "Alt+drag: orbit · Alt+right drag: zoom · Alt+left+right: pan · Drag: select · Click: select";
 } // namespace
 
 VMainWindow::VMainWindow( VSession& i_rSession, QWidget* i_pParent )
   : QMainWindow( i_pParent )
   , m_rSession( i_rSession )
+  , m_Preferences( i_rSession.Host().Store() )
 {
   setAcceptDrops( true );
   setDockNestingEnabled( true );
@@ -75,6 +71,7 @@ VMainWindow::VMainWindow( VSession& i_rSession, QWidget* i_pParent )
       rHost.Postal() );
   connect( &m_rSession, &VSession::SourceChanged, this, &VMainWindow::OnSourceChanged );
   RestoreLayout();
+  WatchPreferences();
   OnSourceChanged();
   ShowSelection();
 }
@@ -84,6 +81,8 @@ VMainWindow::~VMainWindow()
   m_SelectionConnection.Disconnect();
   m_CommandsConnection.Disconnect();
   m_FactoriesConnection.Disconnect();
+  m_AltToSelectConnection.Disconnect();
+  m_FailedConnection.Disconnect();
   // The contents go while everything they draw from is still there.
   for ( VWorkspaceDock* pDock : std::exchange( m_Docks, {} ) )
   {
@@ -193,7 +192,6 @@ VWorkspaceDock* VMainWindow::AddWindow( const std::string& i_rKind )
   connect( pDock, &VWorkspaceDock::Activated, this, &VMainWindow::SetActive );
   addDockWidget( Qt::TopDockWidgetArea, pDock );
   m_Docks.push_back( pDock );
-  ApplyAltToSelect( *pDock );
   SetActive( pDock );
   return pDock;
 }
@@ -273,7 +271,7 @@ void VMainWindow::OnLoaded( const QString& i_rPath, std::shared_ptr< const HostS
   }
   if ( std::exchange( m_bShowNext, false ) )
   {
-    ShowRecording( m_Opened.back() );
+    ShowLoaded( m_Opened.back() );
   }
   LoadNext();
 }
@@ -293,16 +291,6 @@ void VMainWindow::OnFailed( const QString& i_rPath, const QString& i_rMessage, q
   LoadNext();
 }
 
-void VMainWindow::ShowRecording( const VOpened& i_rOpened )
-{
-  for ( const auto Set : { ZEK::ISelectionService::EPrimary, ZEK::ISelectionService::ESecondary } )
-  {
-    m_rSession.Host().Selection()->Set( Set, {} );
-  }
-  m_rSession.OpenRecording( i_rOpened.pRecording );
-  m_rSession.Clock().Play();
-}
-
 void VMainWindow::OnSourceChanged()
 {
   const auto pContext = m_rSession.Context();
@@ -311,31 +299,11 @@ void VMainWindow::OnSourceChanged()
     if ( pDock->ContextName() != pContext->Name() )
     {
       pDock->Rebuild();
-      ApplyAltToSelect( *pDock );
     }
   }
   m_pViewMenu->Refresh();
   const HostSources::IFrameSource* pSource = m_rSession.Source();
   setWindowTitle( pSource ? QString::fromStdString( pSource->Name() ) : QString() );
-}
-
-void VMainWindow::SetAltToSelect( bool i_bOn )
-{
-  m_bAltToSelect = i_bOn;
-  m_pAltAction->setChecked( i_bOn );
-  m_pGestures->setText( QString::fromUtf8( i_bOn ? pGesturesWithAlt : pGesturesWithoutAlt ) );
-  for ( VWorkspaceDock* pDock : m_Docks )
-  {
-    ApplyAltToSelect( *pDock );
-  }
-}
-
-void VMainWindow::ApplyAltToSelect( VWorkspaceDock& io_rDock )
-{
-  if ( QQuickWidget* pWidget = io_rDock.View().Widget() )
-  {
-    QMetaObject::invokeMethod( pWidget, "setAltToSelect", Q_ARG( bool, m_bAltToSelect ) );
-  }
 }
 
 void VMainWindow::ShowSelection()

@@ -141,7 +141,7 @@ void VSession::GoLive()
   emit SourceChanged();
 }
 
-void VSession::OpenRecording( std::shared_ptr< const HostSources::VRecording > i_pRecording )
+void VSession::OpenRecording( std::shared_ptr< const HostSources::VRecording > i_pRecording, bool i_bShow )
 {
   m_pPlaybackPump.reset();
   m_pHost->Contexts()->PlaybackCache()->Clear();
@@ -157,7 +157,13 @@ void VSession::OpenRecording( std::shared_ptr< const HostSources::VRecording > i
     static const ZEK::VLogCategory& rCategory = ZEK::GlobalLog().Category( "Session" );
     ZEK::Log( rCategory, ZEK::ELogFailure, "The recording cannot be played: %1%", Opened.Text() );
   }
-  GoPlayback();
+  if ( i_bShow || !m_bLive )
+  {
+    GoPlayback();
+    return;
+  }
+  Clock().SetPlayback( false );
+  emit SourceChanged();
 }
 
 void VSession::GoPlayback()

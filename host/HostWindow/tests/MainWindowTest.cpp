@@ -1,5 +1,7 @@
 #include <HostWindow/MainWindow.h>
 
+#include <ZEK/Serialiser.h>
+
 #include <TestSupport/LogGuard.h>
 #include <TestSupport/Paths.h>
 
@@ -9,6 +11,7 @@
 #include <QtCore/QThread>
 #include <QtGui/QDropEvent>
 #include <QtQml/QQmlComponent>
+#include <QtWidgets/QStatusBar>
 
 #include <gmock/gmock.h>
 
@@ -132,6 +135,14 @@ protected:
     m_pSession.reset();
   }
 
+  void Prefer( const char* i_pName, bool i_bOn )
+  {
+    ZEK::IStore& rStore = *m_pSession->Host().Store();
+    const ZEK::VStoreWriteScope Scope( rStore );
+    const auto pEntry = rStore.GetEntry( std::string( "Preferences/Core/" ).append( i_pName ) );
+    ASSERT_EQ( Scope->SetValue( pEntry, ZEK::IO::MakeValue( i_bOn ) ), ZEK::IResult::Ok );
+  }
+
   TestSupport::VTemporaryDir m_Folder;
   std::unique_ptr< VSession > m_pSession;
   std::shared_ptr< VFakeFactory > m_pFactory;
@@ -157,6 +168,7 @@ TEST_F( MainWindow, BeginsLiveWithOneViewAndFramesArrive )
 
 TEST_F( MainWindow, ARecordingTurnsTheViewsToPlaybackAndKeepsTheirState )
 {
+  Prefer( "StartPlayingAutomatically", true );
   m_pFactory->Newest().Mark = 42;
   m_pWindow->OpenFiles( { WriteTrc( m_Folder, "a.trc" ) } );
   ASSERT_TRUE( SpinUntil(
@@ -185,6 +197,31 @@ TEST_F( MainWindow, ARecordingTurnsTheViewsToPlaybackAndKeepsTheirState )
   m_pSession->GoLive();
   EXPECT_EQ( m_pFactory->Newest().Context, "Live" );
   EXPECT_EQ( m_pFactory->Newest().Mark, 42 );
+}
+
+TEST_F( MainWindow, ARecordingWaitsWhereTheOperatorWantsItTo )
+{
+  Prefer( "EnableAutoContextSwitch", false );
+  m_pWindow->OpenFiles( { WriteTrc( m_Folder, "a.trc" ) } );
+  ASSERT_TRUE( SpinUntil(
+      [&]
+      {
+        return m_pSession->HasRecording();
+      } ) );
+  EXPECT_TRUE( m_pSession->IsLive() );
+  EXPECT_EQ( m_pFactory->Newest().Context, "Live" );
+  EXPECT_TRUE( m_pWindow->statusBar()->currentMessage().contains( "a.trc" ) );
+  const std::int64_t Frame = m_pSession->ShownFrame();
+  EXPECT_TRUE( SpinUntil(
+      [&]
+      {
+        return m_pSession->ShownFrame() > Frame;
+      } ) )
+      << "the live capture goes on";
+  m_pSession->GoPlayback();
+  EXPECT_EQ( m_pFactory->Newest().Context, "Playback" );
+  EXPECT_EQ( m_pSession->ShownFrame(), 0 );
+  EXPECT_FALSE( m_pSession->Clock().IsPlaying() );
 }
 
 TEST_F( MainWindow, AFileThatCannotBeReadLeavesEverythingAndSaysSo )

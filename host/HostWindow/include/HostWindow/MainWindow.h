@@ -8,6 +8,8 @@
 #include <HostWindow/ViewMenu.h>
 #include <HostWindow/WorkspaceDock.h>
 
+#include <ZEK/CoreUserPreferences.h>
+
 #include <QtGui/QActionGroup>
 #include <QtWidgets/QLineEdit>
 #include <QtWidgets/QMainWindow>
@@ -15,6 +17,8 @@
 
 namespace HostWindow
 {
+
+class VPreferencesWindow;
 
 /// The program's window: docked workspace windows, menus, transport bar, message bar, log panel and status line.
 class VMainWindow : public QMainWindow
@@ -33,6 +37,8 @@ public:
   VMessageBar& Messages() { return *m_pMessages; }
   /// Runs the text as a command of the active window, or as a command of the program.
   bool ExecuteCommand( const QString& i_rText );
+  /// Opens the window of preferences, or brings it to the front.
+  void ShowPreferences();
 
 protected:
   void closeEvent( QCloseEvent* io_pEvent ) override;
@@ -70,21 +76,28 @@ private:
   void OnLoaded( const QString& i_rPath, std::shared_ptr< const HostSources::VRecording > i_pRecording,
                  const QString& i_rMessage );
   void OnFailed( const QString& i_rPath, const QString& i_rMessage, quint32 i_Code );
-  void ShowRecording( const VOpened& i_rOpened );
   void OnSourceChanged();
   void OnDockClosed( VWorkspaceDock* i_pDock );
-  void SetAltToSelect( bool i_bOn );
-  void ApplyAltToSelect( VWorkspaceDock& io_rDock );
   void ShowSelection();
   void ShowSeen( bool i_bSeen );
   void SetActive( VWorkspaceDock* i_pDock );
   VWorkspaceDock* ActiveDock() const;
 
-  // Layout.cpp
+  // MainPreferences.cpp
+  void WatchPreferences();
+  bool AltToSelect() const;
+  void SetAltToSelect( bool i_bOn );
+  void ShowAltToSelect();
+  /// A recording that was just read is shown, unless the operator wants to stay live.
+  void ShowLoaded( const VOpened& i_rOpened );
+  void ShowRecording( const VOpened& i_rOpened );
+
+  // MainLayout.cpp
   void SaveLayout();
   void RestoreLayout();
 
   VSession& m_rSession;
+  ZEK::ICoreUserPreferencesLayout m_Preferences;
   VRecordingLoader m_Loader;
   QStringList m_Queue;
   bool m_bShowNext = true; ///< the next recording of the queue that can be read is shown
@@ -92,7 +105,6 @@ private:
   std::vector< VWorkspaceDock* > m_Docks;
   QPointer< VWorkspaceDock > m_pActive;
   int m_NextWindow = 1;
-  bool m_bAltToSelect = true;
   VTransportBar* m_pTransport = nullptr;
   VMessageBar* m_pMessages = nullptr;
   VLogPanel* m_pLog = nullptr;
@@ -106,11 +118,14 @@ private:
   QMenu* m_pWindowMenu = nullptr;
   VViewMenu* m_pViewMenu = nullptr;
   QAction* m_pAltAction = nullptr;
+  VPreferencesWindow* m_pPreferencesWindow = nullptr;
   QList< QAction* > m_PluginActions;
   QList< QMenu* > m_PluginMenus;
   ZEK::VConnection m_SelectionConnection;
   ZEK::VConnection m_CommandsConnection;
   ZEK::VConnection m_FactoriesConnection;
+  ZEK::VConnection m_AltToSelectConnection;
+  ZEK::VConnection m_FailedConnection;
 };
 
 /// Opens the window and runs the program until it is closed. Needs the application object.

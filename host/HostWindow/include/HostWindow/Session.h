@@ -41,8 +41,9 @@ public:
 
   /// The views show the simulated capture.
   void GoLive();
-  /// The views show this recording, from its first frame.
-  void OpenRecording( std::shared_ptr< const HostSources::VRecording > i_pRecording );
+  /// The views show this recording, from its first frame. Without `i_bShow` they stay live if they are, and show it
+  /// after `GoPlayback`.
+  void OpenRecording( std::shared_ptr< const HostSources::VRecording > i_pRecording, bool i_bShow = true );
   /// The views show the open recording again, where it stands.
   void GoPlayback();
   bool IsLive() const { return m_bLive; }
