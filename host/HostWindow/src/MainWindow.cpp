@@ -40,6 +40,7 @@ VMainWindow::VMainWindow( VSession& i_rSession, QWidget* i_pParent )
   : QMainWindow( i_pParent )
   , m_rSession( i_rSession )
   , m_Preferences( i_rSession.Host().Store() )
+  , m_Loader( i_rSession.Host().Postal() )
 {
   setAcceptDrops( true );
   setDockNestingEnabled( true );

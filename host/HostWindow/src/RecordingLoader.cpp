@@ -2,7 +2,7 @@
 
 #include <HostSources/ReadRecording.h>
 
-#include <QtCore/QMetaObject>
+#include <utility>
 
 namespace HostWindow
 {
@@ -10,14 +10,16 @@ namespace HostWindow
 struct VRecordingLoader::VJob
 {
   QString Path;
+  VRecordingLoader* pLoader = nullptr; ///< null once it is given up; GUI thread
   std::atomic< bool > bCancel{ false };
   std::shared_ptr< HostSources::VRecording > pRecording = std::make_shared< HostSources::VRecording >();
   std::string Message;
   ZEK::IResult Result;
 };
 
-VRecordingLoader::VRecordingLoader( QObject* i_pParent )
+VRecordingLoader::VRecordingLoader( std::shared_ptr< ZEK::IPostalService > i_pPostal, QObject* i_pParent )
   : QObject( i_pParent )
+  , m_pPostal( std::move( i_pPostal ) )
 {
 }
 
@@ -31,6 +33,7 @@ void VRecordingLoader::Abandon()
   if ( m_pJob )
   {
     m_pJob->bCancel = true;
+    m_pJob->pLoader = nullptr;
   }
   m_pJob.reset();
   if ( m_Thread.joinable() )
@@ -44,8 +47,9 @@ void VRecordingLoader::Load( const QString& i_rPath )
   Abandon();
   m_pJob = std::make_shared< VJob >();
   m_pJob->Path = i_rPath;
+  m_pJob->pLoader = this;
   m_Thread = std::thread(
-      [this, pJob = m_pJob]
+      [pPostal = m_pPostal, pJob = m_pJob]
       {
         int LastPercent = -1;
         const auto OnProgress = [&]( double i_Fraction )
@@ -54,28 +58,27 @@ void VRecordingLoader::Load( const QString& i_rPath )
           if ( Percent != LastPercent )
           {
             LastPercent = Percent;
-            QMetaObject::invokeMethod(
-                this,
-                [this, pJob, i_Fraction]
+            pPostal->Post(
+                [pJob, i_Fraction]
                 {
-                  if ( pJob == m_pJob )
+                  if ( pJob->pLoader != nullptr )
                   {
-                    emit Progress( pJob->Path, i_Fraction );
+                    emit pJob->pLoader->Progress( pJob->Path, i_Fraction );
                   }
-                },
-                Qt::QueuedConnection );
+                } );
           }
           return !pJob->bCancel;
         };
         pJob->Result =
             HostSources::ReadRecording( pJob->Path.toStdString(), *pJob->pRecording, pJob->Message, OnProgress );
-        QMetaObject::invokeMethod(
-            this,
-            [this, pJob]
+        pPostal->Post(
+            [pJob]
             {
-              Finish( pJob );
-            },
-            Qt::QueuedConnection );
+              if ( pJob->pLoader != nullptr )
+              {
+                pJob->pLoader->Finish( pJob );
+              }
+            } );
       } );
 }
 
@@ -89,10 +92,6 @@ void VRecordingLoader::Cancel()
 
 void VRecordingLoader::Finish( const std::shared_ptr< VJob >& i_rpJob )
 {
-  if ( i_rpJob != m_pJob )
-  {
-    return;
-  }
   m_Thread.join();
   m_pJob.reset();
   const QString Message = QString::fromStdString( i_rpJob->Message );

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <HostSources/VRecording.h>
+#include <ZEK/Callback.h>
 #include <ZEK/Result.h>
 
 #include <QtCore/QObject>
@@ -19,7 +20,7 @@ class VRecordingLoader : public QObject
   Q_OBJECT
 
 public:
-  explicit VRecordingLoader( QObject* i_pParent = nullptr );
+  explicit VRecordingLoader( std::shared_ptr< ZEK::IPostalService > i_pPostal, QObject* i_pParent = nullptr );
   ~VRecordingLoader() override;
 
   /// Begins to read; what is still being read is given up without a word.
@@ -40,6 +41,7 @@ private:
   void Finish( const std::shared_ptr< VJob >& i_rpJob );
   void Abandon();
 
+  std::shared_ptr< ZEK::IPostalService > m_pPostal;
   std::shared_ptr< VJob > m_pJob;
   std::thread m_Thread;
 };
