@@ -203,7 +203,8 @@ TEST( TaggedCoreTypeExtractor, JoinsAsAnOrderedMapWouldWhateverWasBefore )
     std::vector< VEntry > Entries;
     const auto Entry = [&]( std::uint32_t i_Tag, std::uint32_t i_Name )
     {
-      const std::string Name = i_Name == 7 ? std::string() : "a device with a long name " + std::to_string( i_Name );
+      const std::string Name =
+          i_Name == 7 ? std::string() : std::string( "a device with a long name " ).append( std::to_string( i_Name ) );
       // A key of its own keeps an item beside one of its name; some lie in the past, some hold long.
       const ZEK::VFlowTimeKey Keys[] = { { 0, 1000, 1 }, { 100, 10, 1 }, { 101, 0, 1 }, { 7, 5, 1 }, { 100, 1, 9 } };
       return VEntry{ i_Tag, Maker.Item( i_Tag, Name ), Keys[Below( 8 ) % 5] };

@@ -46,7 +46,7 @@ void UseDeepPaths()
   const VTestStore Store;
   VHeard Heard;
   const std::string Path = Deep( "a", Entries );
-  const std::string Pattern = "*" + Path.substr( 1 );
+  const std::string Pattern = std::string( "*" ).append( Path, 1 );
   Store.Set( Path.c_str(), 1 );
   const auto pDeep = Store.OnPattern( Pattern.c_str() );
   pDeep->AddImmediateCallback( Heard.As( "deep" ), ChangeMask::All );

@@ -104,7 +104,7 @@ TEST( Limits, OneMoreIsRefusedByImportAndExport )
 {
   const VSettings Settings;
   const std::string Path = PathOf( MaximumComponents + 1 );
-  const std::string ImportLine = "The path '" + Path + "' has more than 512 components";
+  const std::string ImportLine = std::string( "The path '" ).append( Path ).append( "' has more than 512 components" );
   // By nesting, and by the names alone.
   EXPECT_EQ( Settings.Import( Deep( MaximumComponents + 1, R"({"Value":1,"Type":"Int32"})" ) ),
              IResult::InvalidFormat );
@@ -118,7 +118,7 @@ TEST( Limits, OneMoreIsRefusedByImportAndExport )
   EXPECT_EQ( Settings.Export( Exporter ), IResult::Failed );
   EXPECT_TRUE( Exporter.Document().IsNull() );
   std::string Schema = Lists( 65 );
-  Schema = "{" + Schema.substr( Schema.find( "\"Type\"" ) );
+  Schema.erase( 1, Schema.find( "\"Type\"" ) - 1 );
   ExpectLines( { ImportLine, ImportLine,
                  "Encountered 'l', and unable to set value schema from '" + Schema +
                      "'. (Element XPath=\"/Configuration/Node[@name='l']\")",

@@ -48,7 +48,7 @@ VCarriedEntries Fill( const VSettings& i_rSettings, std::uint64_t i_Seed, int i_
         {
           const std::string& rParent = Paths[Random.Below( Paths.size() )];
           // A path cannot begin with a '/' and come back.
-          std::string Path = rParent.empty() ? "r" + Name( Random ) : rParent + "/" + Name( Random );
+          std::string Path = std::string( rParent ).append( rParent.empty() ? "r" : "/" ).append( Name( Random ) );
           const IO::ISchema* const pSchema = Random.Schema( 3 );
           if ( Entries.contains( Path ) || pSchema == nullptr )
           {

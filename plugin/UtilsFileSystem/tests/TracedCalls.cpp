@@ -33,7 +33,7 @@ std::vector< std::string > VTracedCalls::Steps( const std::string& i_rTarget ) c
     std::string Path = rCall.Path;
     for ( std::size_t At = 0; ( At = Path.find( i_rTarget ) ) != std::string::npos; )
     {
-      Path.replace( At, i_rTarget.size(), "*" );
+      Path.replace( At, i_rTarget.size(), 1, '*' );
     }
     Texts.push_back( rCall.Name + " " + Path );
   }
