@@ -30,6 +30,13 @@ VStoreEntry& VEntryTable::FindOrMake( const ZEK::VEntryPath& i_rPath )
   {
     return *pEntry;
   }
+  // Siblings are often made one after the other.
+  const std::size_t Leaf = i_rPath.LeafPosition();
+  if ( m_pLastParent != nullptr && Leaf != 0 &&
+       std::string_view( i_rPath.Text() ).substr( 0, Leaf - 1 ) == m_pLastParent->m_Path.Text() )
+  {
+    return Make( i_rPath, m_pLastParent );
+  }
   // Not by recursion: a path may have any number of components. Only the sizes of what is missing are kept, as the
   // texts together may be large.
   std::vector< std::size_t > Missing{ i_rPath.Text().size() };
@@ -43,7 +50,9 @@ VStoreEntry& VEntryTable::FindOrMake( const ZEK::VEntryPath& i_rPath )
   }
   for ( ; !Missing.empty(); Missing.pop_back() )
   {
-    pParent = &Make( ZEK::VEntryPath( i_rPath.Text().substr( 0, Missing.back() ) ), pParent );
+    m_pLastParent = pParent;
+    pParent = &( Missing.size() == 1 ? Make( i_rPath, pParent )
+                                     : Make( i_rPath.Text().substr( 0, Missing.back() ), pParent ) );
   }
   return *pParent;
 }

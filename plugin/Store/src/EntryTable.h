@@ -37,7 +37,8 @@ private:
 
   std::vector< std::atomic< VStoreEntry* > > m_Buckets;
   bool m_bPowerOfTwo;
-  std::deque< VStoreEntry > m_Entries; ///< in the order of their making
+  std::deque< VStoreEntry > m_Entries;  ///< in the order of their making
+  VStoreEntry* m_pLastParent = nullptr; ///< of the entry made last; store mutex
 };
 
 } // namespace Store
