@@ -237,8 +237,8 @@ void VPreferencesWindow::MakeTabOrder()
   const QList< QWidget* > Widgets = m_pScroll->widget()->findChildren< QWidget* >();
   for ( QWidget* const pWidget : Widgets )
   {
-    // A spin box holds a line of its own that the box speaks for.
-    if ( ( pWidget->focusPolicy() & Qt::TabFocus ) != 0 && !pWidget->focusProxy() )
+    // A spin box holds a line of its own that the box speaks for, and a combo box a window of its own.
+    if ( ( pWidget->focusPolicy() & Qt::TabFocus ) != 0 && !pWidget->focusProxy() && pWidget->window() == window() )
     {
       setTabOrder( pBefore, pWidget );
       pBefore = pWidget;
