@@ -1,2 +1,4 @@
-set( HostSourcesSimulatedSources src/SimulatedStage.cpp src/VSimulatedCapture.cpp src/VSourcePump.cpp src/Walker.cpp )
-set( HostSourcesSimulatedTests tests/SimulatedCaptureTest.cpp tests/SourcePumpTest.cpp )
+set( HostSourcesSimulatedSources 
+  src/SimulatedCameras.cpp src/SimulatedImage.cpp src/SimulatedLens.cpp src/SimulatedMarkers.cpp
+  src/SimulatedStage.cpp src/VSimulatedCapture.cpp src/VSourcePump.cpp src/Walker.cpp )
+set( HostSourcesSimulatedTests tests/SimulatedCamerasTest.cpp tests/SimulatedCaptureTest.cpp tests/SourcePumpTest.cpp )

@@ -124,11 +124,18 @@ void FillCamera( std::uint32_t i_Camera, std::uint32_t i_Count, double i_RateHz,
   const D3 Right = Unit( Cross( Forward, D3{ 0, 0, 1 } ) );
   o_rCalibration.Rotation = RotationVector( Right, Cross( Forward, Right ), Forward );
   o_rCalibration.Position = Position;
-  o_rCalibration.PrincipalPoint[0] = o_rCalibration.DistortionCentre[0] = 639.5;
-  o_rCalibration.PrincipalPoint[1] = o_rCalibration.DistortionCentre[1] = 511.5;
-  o_rCalibration.RadialModel = 0;
-  o_rCalibration.RadialParameters = { 3.0e-8, 2.0e-15 };
+  o_rCalibration.PrincipalPoint[0] = 639.5;
+  o_rCalibration.PrincipalPoint[1] = 511.5;
   o_rCalibration.FocalLength = 950;
+  // Wide lenses bulge by some ten pixels in the corners, no two alike, and their centre is not the sensor's.
+  o_rCalibration.DistortionCentre[0] = 639.5 + 1.5 * ( i_Camera % 7 ) - 4.5;
+  o_rCalibration.DistortionCentre[1] = 511.5 + 1.5 * ( i_Camera % 5 ) - 3;
+  o_rCalibration.RadialModel = i_Camera % 2;
+  o_rCalibration.RadialParameters = { 2.5e-8 + 1.0e-9 * ( i_Camera % 11 ), 2.0e-15 };
+  if ( o_rCalibration.RadialModel == 1 )
+  {
+    o_rCalibration.RadialParameters.push_back( -1.0e-21 );
+  }
 }
 
 void FillSubject( std::uint32_t i_Performer, VSubject& o_rSubject )

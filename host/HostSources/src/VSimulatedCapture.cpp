@@ -1,5 +1,8 @@
 #include <HostSources/VSimulatedCapture.h>
 
+#include "SimulatedCameras.h"
+#include "SimulatedItems.h"
+#include "SimulatedMarkers.h"
 #include "SimulatedStage.h"
 
 #include <CoreMoxelTypes/FlowTypes.h>
@@ -19,18 +22,6 @@ namespace
 
 using namespace Simulation;
 
-constexpr double GapWindow = 0.2;   // s: a gap lies within one window
-constexpr double ExtraWindow = 0.5; // s: that an extra point stays or is away
-
-/// What a random number is for; keeps the streams apart.
-enum EStream : std::uint64_t
-{
-  EStreamNoise = 1,
-  EStreamGap,
-  EStreamExtra,
-  EStreamRays
-};
-
 template < typename T >
 T Within( T i_Value, T i_Least, T i_Greatest )
 {
@@ -45,6 +36,11 @@ VSimulatedCaptureOptions Limited( VSimulatedCaptureOptions i_Options )
   i_Options.NoiseMm = Within( i_Options.NoiseMm, 0.0, 50.0 );
   i_Options.GapProbability = Within( i_Options.GapProbability, 0.0, 1.0 );
   i_Options.ExtraPoints = Within( i_Options.ExtraPoints, 0u, 1000u );
+  i_Options.VideoCameras = Within( i_Options.VideoCameras, 0u, i_Options.Cameras / 2 );
+  if ( i_Options.VideoFormat && *i_Options.VideoFormat > EPixelFormat::NV12 )
+  {
+    i_Options.VideoFormat.reset();
+  }
   return i_Options;
 }
 
@@ -66,54 +62,27 @@ struct VSimulatedCapture::VImpl
     : Options( Limited( i_rOptions ) )
     , Hash( Options.Seed )
     , SamplesPerFrame( std::max( 1, static_cast< int >( std::lround( 1000 / Options.RateHz ) ) ) )
+    , Stage( Options )
+    , Cameras( Options )
   {
-    for ( std::uint32_t Performer = 0; Performer < Options.Performers; ++Performer )
-    {
-      Styles.push_back( PerformerStyle( Options, Performer ) );
-    }
   }
 
-  /// Makes one item and keeps the first failure; the payload is null after one.
-  template < typename TFlow >
-  typename FlowValueType< TFlow >::type* Make( const VStateMaker& i_rMaker, VFlowItemRef& o_rItem )
-  {
-    IResult Status;
-    i_rMaker.Store->CreateItem( Status, FlowValueType< TFlow >::Descriptor, o_rItem );
-    Failure = Failure.IsError() ? Failure : Status;
-    return FlowMutablePayload< typename FlowValueType< TFlow >::type >( o_rItem.Get() );
-  }
-  template < typename TFlow, typename TFill >
-  void MakeSlow( const VStateMaker& i_rMaker, EFlowName i_Selector, const std::string& i_rName, TFill i_Fill )
-  {
-    VFlowItemRef Item;
-    if ( auto* pPayload = Make< TFlow >( i_rMaker, Item ) )
-    {
-      i_Fill( *pPayload );
-      if ( !i_rName.empty() )
-      {
-        Item->MutableValue().SetName( i_Selector, i_rName );
-      }
-      Slow.push_back( std::move( Item ) );
-    }
-  }
-
-  void MakeSlowItems( const VStateMaker& i_rMaker );
-  void MakeUpAxis( const VStateMaker& i_rMaker );
-  void AddPoints( double i_Seconds, std::int64_t i_Index, const VStateMaker& i_rMaker, IFlowState& i_rState );
-  void AddPoint( const D3& i_rPosition, std::uint32_t i_Number, std::int64_t i_Index,
-                 VReconstructionSet& o_rSet ) const;
-  bool IsInGap( std::uint32_t i_Number, double i_Seconds ) const;
-  void AddExtraPoints( double i_Seconds, std::int64_t i_Index, VReconstructionSet& o_rSet ) const;
-  void AddLabels( const VStateMaker& i_rMaker, IFlowState& i_rState );
-  void AddPlateSamples( std::int64_t i_Index, const VStateMaker& i_rMaker, IFlowState& i_rState );
+  void MakeSlowItems();
+  void MakeUpAxis();
+  void AddPoints( double i_Seconds, std::int64_t i_Index, IFlowState& i_rState );
+  void AddPoint( const VStageMarker& i_rMarker, std::int64_t i_Index, VReconstructionSet& o_rSet ) const;
+  void AddLabels( IFlowState& i_rState );
+  void AddPlateSamples( std::int64_t i_Index, IFlowState& i_rState );
 
   const VSimulatedCaptureOptions Options;
   const VHash Hash;
   const int SamplesPerFrame;
   EUpAxis Up = EUpAxis::Z;
   bool bOverruled = false;
-  IResult Failure;
-  std::vector< VWalkerStyle > Styles;
+  const VMarkerStage Stage;
+  VSimulatedCameras Cameras;
+  VItemMaker Maker;
+  std::vector< VStageMarker > Markers; // of the frame being made
   bool bSlowMade = false;
   std::vector< VFlowItemRef > Slow;
   VFlowItemRef UpAxisItem;
@@ -122,161 +91,90 @@ struct VSimulatedCapture::VImpl
   std::vector< std::vector< VFootLoad > > Loads;    // by sample
 };
 
-void VSimulatedCapture::VImpl::MakeSlowItems( const VStateMaker& i_rMaker )
+void VSimulatedCapture::VImpl::MakeSlowItems()
 {
   Slow.clear();
-  for ( std::uint32_t Camera = 0; Camera < Options.Cameras; ++Camera )
-  {
-    VCameraHardware Hardware;
-    VCameraCalibration Calibration;
-    FillCamera( Camera, Options.Cameras, Options.RateHz, Hardware, Calibration );
-    MakeSlow< FlowCameraHardware >( i_rMaker, EFlowNameDevice, Hardware.Name,
-                                    [&]( VCameraHardware& o_rValue )
-                                    {
-                                      o_rValue = Hardware;
-                                    } );
-    MakeSlow< FlowCameraCalibration >( i_rMaker, EFlowNameDevice, Hardware.Name,
-                                       [&]( VCameraCalibration& o_rValue )
-                                       {
-                                         o_rValue = Calibration;
-                                       } );
-  }
+  Cameras.AddSlowItems( Maker, Slow );
   for ( std::uint32_t Performer = 0; Performer < Options.Performers; ++Performer )
   {
-    const std::string Subject = PerformerName( Performer );
-    MakeSlow< FlowSubject >( i_rMaker, EFlowNameObject, Subject,
-                             [&]( VSubject& o_rValue )
-                             {
-                               FillSubject( Performer, o_rValue );
-                             } );
-    MakeSlow< FlowSubjectApplicationData >( i_rMaker, EFlowNameObject, Subject,
-                                            [&]( VSubjectApplicationData& o_rValue )
-                                            {
-                                              FillColours( Performer, o_rValue );
-                                            } );
+    VSubject Subject;
+    VSubjectApplicationData Colours;
+    FillSubject( Performer, Subject );
+    FillColours( Performer, Colours );
+    const std::string Name = Subject.Name;
+    Maker.AddSlow< FlowSubject >( Slow, EFlowNameObject, Name, std::move( Subject ) );
+    Maker.AddSlow< FlowSubjectApplicationData >( Slow, EFlowNameObject, Name, std::move( Colours ) );
   }
   for ( std::size_t Plate = 0; Plate < ( Options.bForcePlates ? Plates : 0 ); ++Plate )
   {
     VDevice Device;
     FillPlate( Plate, Device );
-    MakeSlow< FlowDevice >( i_rMaker, EFlowNameDevice, Device.Name,
-                            [&]( VDevice& o_rValue )
-                            {
-                              o_rValue = Device;
-                            } );
+    Maker.AddSlow< FlowDevice >( Slow, EFlowNameDevice, Device.Name, Device );
   }
-  MakeSlow< FlowVolumeProperties >( i_rMaker, EFlowNameTarget, {},
-                                    []( VVolumeProperties& o_rValue )
-                                    {
-                                      constexpr auto Half = static_cast< i32 >( FloorHalf );
-                                      o_rValue = { -Half, -Half, Half, Half, 0, 0 };
-                                    } );
-  MakeSlow< FlowParametersItem >( i_rMaker, EFlowNameTarget, ReconstructionTarget, FillVolume );
-  bSlowMade = Failure.IsOk();
+  constexpr auto Half = static_cast< i32 >( FloorHalf );
+  Maker.AddSlow< FlowVolumeProperties >( Slow, EFlowNameTarget, {}, { -Half, -Half, Half, Half, 0, 0 } );
+  VParametersItem Volume;
+  FillVolume( Volume );
+  Maker.AddSlow< FlowParametersItem >( Slow, EFlowNameTarget, ReconstructionTarget, std::move( Volume ) );
+  bSlowMade = Maker.Failure().IsOk();
 }
 
-void VSimulatedCapture::VImpl::MakeUpAxis( const VStateMaker& i_rMaker )
+void VSimulatedCapture::VImpl::MakeUpAxis()
 {
-  if ( auto* pAxis = Make< FlowWorldAxis >( i_rMaker, UpAxisItem ) )
+  if ( auto* pAxis = Maker.Make< FlowWorldAxis >( UpAxisItem ) )
   {
     pAxis->Up = static_cast< u32 >( Up );
   }
 }
 
-void VSimulatedCapture::VImpl::AddPoint( const D3& i_rPosition, std::uint32_t i_Number, std::int64_t i_Index,
+void VSimulatedCapture::VImpl::AddPoint( const VStageMarker& i_rMarker, std::int64_t i_Index,
                                          VReconstructionSet& o_rSet ) const
 {
-  const VHash Point = Hash.With( EStreamNoise ).With( i_Number ).With( static_cast< std::uint64_t >( i_Index ) );
+  const VHash Point =
+      Hash.With( EStreamNoise ).With( i_rMarker.Number ).With( static_cast< std::uint64_t >( i_Index ) );
   const D3 Noise = Point.Normal() * Options.NoiseMm;
-  // Rays change with the place, not with every frame.
-  const std::uint64_t Window = static_cast< std::uint64_t >( static_cast< double >( i_Index ) / Options.RateHz );
-  const std::uint64_t Spread = Hash.With( EStreamRays ).With( i_Number ).With( Window ).Bits() % 7;
   VReconstruction& rPoint = o_rSet.Items.emplace_back();
-  rPoint.Id = i_Number + 1;
-  rPoint.Position = i_rPosition + Noise;
-  rPoint.Radius = 7;
+  rPoint.Id = i_rMarker.Number + 1;
+  rPoint.Position = i_rMarker.Position + Noise;
+  rPoint.Radius = static_cast< f32 >( MarkerRadius );
   rPoint.Residual = static_cast< f32 >( 0.2 + Length( Noise ) );
-  rPoint.Rays = static_cast< u32 >( std::min< std::uint64_t >( 2 + Spread, std::max( Options.Cameras, 2u ) ) );
 }
 
-bool VSimulatedCapture::VImpl::IsInGap( std::uint32_t i_Number, double i_Seconds ) const
-{
-  const double Window = std::floor( i_Seconds / GapWindow );
-  const VHash Gap = Hash.With( EStreamGap ).With( i_Number ).With( static_cast< std::uint64_t >( Window ) );
-  if ( Gap.Uniform() >= Options.GapProbability )
-  {
-    return false;
-  }
-  const double Begin = Gap.With( 1 ).Uniform() * 0.5, End = 0.5 + Gap.With( 2 ).Uniform() * 0.5;
-  const double Share = i_Seconds / GapWindow - Window;
-  return Share >= Begin && Share < End;
-}
-
-void VSimulatedCapture::VImpl::AddExtraPoints( double i_Seconds, std::int64_t i_Index,
-                                               VReconstructionSet& o_rSet ) const
-{
-  const auto First = static_cast< std::uint32_t >( Styles.size() * WalkerMarkers + ObjectMarkers );
-  const auto Window = static_cast< std::uint64_t >( i_Seconds / ExtraWindow );
-  for ( std::uint32_t Extra = 0; Extra < Options.ExtraPoints; ++Extra )
-  {
-    const VHash Place = Hash.With( EStreamExtra ).With( Extra ).With( Window );
-    if ( Place.Uniform() < 0.5 )
-    {
-      const auto Across = [&]( std::uint64_t i_Axis )
-      {
-        return ( 2 * Place.With( i_Axis ).Uniform() - 1 ) * ( FloorHalf - 100 );
-      };
-      AddPoint( { Across( 1 ), Across( 2 ), 200 + 2000 * Place.With( 3 ).Uniform() }, First + Extra, i_Index, o_rSet );
-    }
-  }
-}
-
-void VSimulatedCapture::VImpl::AddPoints( double i_Seconds, std::int64_t i_Index, const VStateMaker& i_rMaker,
-                                          IFlowState& i_rState )
+void VSimulatedCapture::VImpl::AddPoints( double i_Seconds, std::int64_t i_Index, IFlowState& i_rState )
 {
   VFlowItemRef Item;
-  auto* pSet = Make< FlowReconstructionSet >( i_rMaker, Item );
+  auto* pSet = Maker.Make< FlowReconstructionSet >( Item );
   if ( !pSet )
   {
     return;
   }
-  pSet->Items.reserve( Styles.size() * WalkerMarkers + ObjectMarkers + Options.ExtraPoints );
+  pSet->Items.reserve( Stage.MostMarkers() );
   Labels.clear();
-  VWalkerPose Pose;
-  for ( std::uint32_t Performer = 0; Performer < Styles.size(); ++Performer )
+  Stage.At( i_Seconds, Markers );
+  for ( VStageMarker& rMarker : Markers )
   {
-    PoseWalker( Styles[Performer], i_Seconds, Pose );
-    for ( std::uint32_t Marker = 0; Marker < WalkerMarkers; ++Marker )
+    if ( rMarker.bLost )
     {
-      const auto Number = static_cast< std::uint32_t >( Performer * WalkerMarkers + Marker );
-      if ( !IsInGap( Number, i_Seconds ) )
-      {
-        Labels.push_back( { static_cast< u32 >( pSet->Items.size() ), Performer + 1, Marker } );
-        AddPoint( Pose.Markers[Marker], Number, i_Index, *pSet );
-      }
+      continue;
     }
-  }
-  if ( Options.bObjects )
-  {
-    std::array< D3, ObjectMarkers > Objects;
-    PoseObjects( i_Seconds, Objects );
-    auto Number = static_cast< std::uint32_t >( Styles.size() * WalkerMarkers );
-    for ( const D3& rMarker : Objects )
+    rMarker.Reconstruction = static_cast< std::int32_t >( pSet->Items.size() );
+    if ( rMarker.SubjectId != NoSubject )
     {
-      AddPoint( rMarker, Number++, i_Index, *pSet );
+      Labels.push_back( { static_cast< u32 >( rMarker.Reconstruction ), rMarker.SubjectId, rMarker.MarkerId } );
     }
+    AddPoint( rMarker, i_Index, *pSet );
   }
-  AddExtraPoints( i_Seconds, i_Index, *pSet );
+  Cameras.AddFrame( Markers, Maker, i_rState, *pSet );
   i_rState.AddItem( Item );
-  AddLabels( i_rMaker, i_rState );
+  AddLabels( i_rState );
 }
 
-void VSimulatedCapture::VImpl::AddLabels( const VStateMaker& i_rMaker, IFlowState& i_rState )
+void VSimulatedCapture::VImpl::AddLabels( IFlowState& i_rState )
 {
   const auto* pLast = FlowPayload< VReconstructionLabelSet >( LabelItem.Get() );
   if ( !pLast || !SameLabels( *pLast, Labels ) )
   {
-    auto* pLabels = Make< FlowReconstructionLabelSet >( i_rMaker, LabelItem );
+    auto* pLabels = Maker.Make< FlowReconstructionLabelSet >( LabelItem );
     if ( !pLabels )
     {
       return;
@@ -286,8 +184,7 @@ void VSimulatedCapture::VImpl::AddLabels( const VStateMaker& i_rMaker, IFlowStat
   i_rState.AddItem( LabelItem );
 }
 
-void VSimulatedCapture::VImpl::AddPlateSamples( std::int64_t i_Index, const VStateMaker& i_rMaker,
-                                                IFlowState& i_rState )
+void VSimulatedCapture::VImpl::AddPlateSamples( std::int64_t i_Index, IFlowState& i_rState )
 {
   const double SampleRate = Options.RateHz * SamplesPerFrame;
   const std::int64_t First = i_Index * SamplesPerFrame;
@@ -296,16 +193,17 @@ void VSimulatedCapture::VImpl::AddPlateSamples( std::int64_t i_Index, const VSta
   {
     Loads[Sample].clear();
     std::array< VFootLoad, 2 > Feet;
-    for ( const VWalkerStyle& rStyle : Styles )
+    for ( const VWalkerStyle& rStyle : Stage.Styles() )
     {
       LoadFeet( rStyle, static_cast< double >( First + static_cast< std::int64_t >( Sample ) ) / SampleRate, Feet );
       Loads[Sample].insert( Loads[Sample].end(), Feet.begin(), Feet.end() );
     }
   }
+  static const std::string Names[Plates] = { "Plate 1", "Plate 2" };
   for ( std::size_t Plate = 0; Plate < Plates; ++Plate )
   {
     VFlowItemRef Item;
-    if ( auto* pSamples = Make< FlowDeviceSamples >( i_rMaker, Item ) )
+    if ( auto* pSamples = Maker.MakeNamed< FlowDeviceSamples >( Item, EFlowNameDevice, Names[Plate] ) )
     {
       pSamples->RateHz = static_cast< f32 >( SampleRate );
       pSamples->First = static_cast< u32 >( First );
@@ -313,7 +211,6 @@ void VSimulatedCapture::VImpl::AddPlateSamples( std::int64_t i_Index, const VSta
       {
         pSamples->Wrench.push_back( PlateWrench( Plate, rLoads ) );
       }
-      Item->MutableValue().SetName( EFlowNameDevice, Plate == 0 ? "Plate 1" : "Plate 2" );
       i_rState.AddItem( Item );
     }
   }
@@ -385,18 +282,20 @@ IResult VSimulatedCapture::MakeState( std::int64_t i_Index, const VStateMaker& i
       static_cast< std::int32_t >( Whole % 60 ),
       static_cast< std::int32_t >( ( Seconds - static_cast< double >( Whole ) ) * rImpl.Options.RateHz + 0.5 ), 0 };
   VFlowStateRef State;
-  rImpl.Failure = i_rMaker.Factory->CreateState( State, { i_Index * Ticks, Ticks, i_rMaker.Clock }, InfoA, InfoB );
-  if ( rImpl.Failure.IsError() )
+  const IResult Created =
+      i_rMaker.Factory->CreateState( State, { i_Index * Ticks, Ticks, i_rMaker.Clock }, InfoA, InfoB );
+  if ( Created.IsError() )
   {
-    return rImpl.Failure;
+    return Created;
   }
+  rImpl.Maker.Begin( i_rMaker );
   if ( !rImpl.bSlowMade )
   {
-    rImpl.MakeSlowItems( i_rMaker );
+    rImpl.MakeSlowItems();
   }
   if ( !rImpl.UpAxisItem )
   {
-    rImpl.MakeUpAxis( i_rMaker );
+    rImpl.MakeUpAxis();
   }
   const VFlowTimeKey Always{ 0, std::numeric_limits< std::int64_t >::max(), i_rMaker.Clock };
   for ( const VFlowItemRef& rItem : rImpl.Slow )
@@ -407,16 +306,16 @@ IResult VSimulatedCapture::MakeState( std::int64_t i_Index, const VStateMaker& i
   {
     State->AddItemAt( rImpl.UpAxisItem, Always );
   }
-  rImpl.AddPoints( Seconds, i_Index, i_rMaker, *State );
+  rImpl.AddPoints( Seconds, i_Index, *State );
   if ( rImpl.Options.bForcePlates )
   {
-    rImpl.AddPlateSamples( i_Index, i_rMaker, *State );
+    rImpl.AddPlateSamples( i_Index, *State );
   }
-  if ( rImpl.Failure.IsOk() )
+  if ( rImpl.Maker.Failure().IsOk() )
   {
     o_rState = std::move( State );
   }
-  return rImpl.Failure;
+  return rImpl.Maker.Failure();
 }
 
 } // namespace HostSources

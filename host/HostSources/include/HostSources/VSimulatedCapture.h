@@ -2,11 +2,33 @@
 
 #include <HostSources/IFrameSource.h>
 
+#include <CoreMoxelTypes/Camera.h>
+
 #include <cstdint>
 #include <memory>
+#include <optional>
+#include <vector>
 
 namespace HostSources
 {
+
+/// What can be wrong with a camera.
+enum class ESimulatedFault : std::uint32_t
+{
+  Bumped, ///< it stands otherwise than it was calibrated, so that nothing it sees fits
+  Missing,
+  Disconnected,
+  Disabled,
+  NotContributing,
+  Uncalibrated,
+  Hot,   ///< far from the temperature of its calibration
+  Warned ///< all eight warnings
+};
+struct VSimulatedFault
+{
+  std::uint32_t Camera = 0; ///< from 0; one that is not there is left out
+  ESimulatedFault Fault = ESimulatedFault::Bumped;
+};
 
 /// What the simulated capture shows. Values outside their range are moved to its nearer end.
 struct VSimulatedCaptureOptions
@@ -20,6 +42,11 @@ struct VSimulatedCaptureOptions
   std::uint32_t ExtraPoints = 3; ///< unlabelled points that come and go, 0 to 1000
   bool bObjects = true;          ///< a prop and a calibration wand
   bool bForcePlates = true;
+  bool bGreyscale = true;         ///< optical cameras send greyscale blobs, some edges too
+  std::uint32_t VideoCameras = 2; ///< the last of the cameras, at most half of them
+  std::optional< CoreMoxelTypes::EPixelFormat > VideoFormat =
+      std::nullopt; ///< none: every format in turn, two seconds each
+  std::vector< VSimulatedFault > Faults = {};
 };
 
 /// A capture without hardware: people who walk in circles on a floor of 6 by 6 m, within a ring of cameras.
@@ -27,13 +54,20 @@ struct VSimulatedCaptureOptions
 /// Never ends; the same options and the same frame give the same values, in whatever order frames are asked for.
 /// z is up, millimetres. `SetUpAxis` changes what the state claims (0x1029), not the points.
 ///
-/// Each state holds: 0x1000 and 0x100a of each camera (names "Camera 1", ... under the device selector); 0x1012 and
+/// Each state holds: 0x1000, 0x1001, 0x100a, 0x100b, 0x102d, 0x102e, 0x102f and 0x1037 of each camera (names
+/// "Camera 1", ... under the device selector), of an optical one 0x1002, 0x1003, 0x100c and 0x1022 too, with greyscale
+/// 0x1005 and for every fourth 0x1006, of a video camera 0x1007, 30 times a second; 0x1012 and
 /// 0x1013 of each performer (names "Ada", "Ben", ... under the object selector); 0x1023 and 0x1025 of the two plates
 /// "Plate 1" and "Plate 2"; 0x1 with the reconstruction's volume; 0x1029; 0x1031; 0x100d and 0x100f. A label's
 /// `SubjectId` is `VSubject::Id`, its `MarkerId` the index into `VSubject::Markers`, which is also `VMarker::Id`. Prop,
 /// wand and extra points have no label. 0x1025 holds the samples of the frame's own time, at a whole multiple of the
-/// rate near 1000 Hz; the moment is about the middle of the plate. All but 0x100d and 0x1025 are the same objects in
-/// every state; 0x100f is while no label comes or goes.
+/// rate near 1000 Hz; the moment is about the middle of the plate. All but 0x1003, 0x1005 to 0x1007, 0x100c, 0x100d,
+/// 0x1022 and 0x1025 are the same objects in every state; 0x100f is while no label comes or goes.
+///
+/// Centroids are the exact images of where markers truly are, without the noise of reconstructions. `Rays` counts the
+/// centroids that are assigned to a reconstruction. A marker in a gap may have centroids, without an assignment. A
+/// camera that is missing, disconnected or disabled sends nothing, one that is bumped, uncalibrated or does not
+/// contribute sends centroids without assignments.
 class VSimulatedCapture final : public IFrameSource
 {
 public:
