@@ -40,11 +40,17 @@ std::shared_ptr< VFeatureFlags > MakeFeatures( const QString& i_rText )
 }
 } // namespace
 
+std::filesystem::path SettingsPath( const VHostOptions& i_rOptions )
+{
+  return PreferencesPath( i_rOptions ).parent_path() / "settings.json";
+}
+
 struct VHost::VState final : public HarrowPluginInterface::IHarrowApplication,
                              public HarrowPluginInterface::IHarrowWorkspace
 {
   explicit VState( const VHostOptions& i_rOptions )
     : bDeveloperMode( i_rOptions.bDeveloperMode )
+    , Settings( pStore, SettingsPath( i_rOptions ) )
     , Preferences( PreferencesPath( i_rOptions ) )
     , pPaths( std::make_shared< VPaths >( i_rOptions.ContentRoot, i_rOptions.UserRoot ) )
     , pFeatures( MakeFeatures( i_rOptions.FeatureFlags ) )
@@ -90,6 +96,7 @@ struct VHost::VState final : public HarrowPluginInterface::IHarrowApplication,
   const bool bDeveloperMode;
   const std::shared_ptr< VPostalService > pPostal = std::make_shared< VPostalService >();
   const std::shared_ptr< ZEK::IStore > pStore = ::Store::CreateStore( pPostal, StoreBuckets );
+  VSettingsFile Settings;
   VPreferencesFile Preferences;
   const std::shared_ptr< VPaths > pPaths;
   const std::shared_ptr< VFeatureFlags > pFeatures;
@@ -114,12 +121,18 @@ struct VHost::VState final : public HarrowPluginInterface::IHarrowApplication,
 VHost::VHost( const VHostOptions& i_rOptions )
   : m_pState( std::make_unique< VState >( i_rOptions ) )
 {
-  (void)DeclareUserPreferences( *m_pState->pStore );
+  // What was saved is there first, so that it counts as set and a default of today does not take its place.
+  (void)m_pState->Settings.Load(
+      [this]
+      {
+        (void)DeclareUserPreferences( *m_pState->pStore );
+      } );
 }
 
 VHost::~VHost()
 {
   ReleasePluginContent();
+  (void)m_pState->Settings.Finish();
   // Objects of the plug-in may hold references to services beyond this point; these answer, and do nothing.
   m_pState->pPostal->Close();
   m_pState->pQuick->Shutdown();
@@ -209,6 +222,11 @@ const std::shared_ptr< ZEK::IStore >& VHost::Store() const
 VPreferenceEditor& VHost::PreferenceEditor()
 {
   return m_pState->Editor;
+}
+
+VSettingsFile& VHost::Settings()
+{
+  return m_pState->Settings;
 }
 
 ZEK::VFlowStateFactoryRef VHost::StateFactory() const

@@ -13,6 +13,7 @@
 #include <HostServices/VQuickHost.h>
 #include <HostServices/VRenderResources.h>
 #include <HostServices/VSelectionService.h>
+#include <HostServices/VSettingsFile.h>
 #include <HostServices/VUndoStack.h>
 
 #include <HarrowPluginInterface/IHarrowApplication.h>
@@ -32,6 +33,9 @@ struct VHostOptions
   std::size_t RingSize = 512;             ///< states that a cache keeps
   VPlaybackClock::VTimeFunction Now = {}; ///< of the playback clock; empty: the steady clock
 };
+
+/// The settings file of a host with these options: "settings.json" beside the file of its preferences.
+std::filesystem::path SettingsPath( const VHostOptions& i_rOptions = {} );
 
 /// Everything that the stand-alone host hands to a plug-in, made in the right order and given up in the reverse one.
 ///
@@ -61,9 +65,13 @@ public:
   const std::shared_ptr< VQuickHost >& Quick() const;
   VPreferencesFile& Preferences();
   VUndoStack& Undo();
-  /// The settings, with the entries of all preferences. Shut down after everything else, as this object ends.
+  /// The settings, as they were read from the settings file, with the entries of all preferences. Shut down after
+  /// everything else, as this object ends.
   const std::shared_ptr< ZEK::IStore >& Store() const;
   VPreferenceEditor& PreferenceEditor();
+  /// Keeps the settings only after `StartSaving`: a program that takes pictures leaves the user's file alone. What is
+  /// not saved when this object ends is saved then.
+  VSettingsFile& Settings();
   ZEK::VFlowStateFactoryRef StateFactory() const;
   ZEK::VFlowStoreRef ItemStore() const;
   const std::shared_ptr< ZEK::IFlowStateCacheManager >& CacheManager() const;
