@@ -1,11 +1,10 @@
-#include <HostSettings/SettingsCommand.h>
+#include <HostServices/VHost.h>
 #include <HostSettings/SettingsLine.h>
 #include <HostWindow/CommandLine.h>
 #include <HostWindow/Display.h>
 #include <HostWindow/Headless.h>
 #include <HostWindow/MainWindow.h>
 
-#include <QtCore/QStandardPaths>
 #include <QtWidgets/QApplication>
 #include <QtWidgets/QStyleFactory>
 
@@ -43,10 +42,8 @@ void TurnIntoPictures( HostWindow::VCommandLine& io_rLine )
 int RunSettings( int i_Count, char** i_ppArguments )
 {
   QCoreApplication::setApplicationName( "harrow" );
-  const QString Folder = QStandardPaths::writableLocation( QStandardPaths::AppConfigLocation );
   return HostSettings::RunSettingsLine( { i_ppArguments + 2, i_ppArguments + i_Count },
-                                        Folder.toStdString() + "/" + HostSettings::SettingsFileName, std::cout,
-                                        std::cerr );
+                                        HostServices::SettingsPath().string(), std::cout, std::cerr );
 }
 
 int Run( int i_Count, char** i_ppArguments )

@@ -27,19 +27,34 @@ void VMainWindow::SaveLayout()
   rPreferences.SetLayout( pLayoutName, QJsonObject{ { "windows", Windows } } );
   rPreferences.SetGeometry( pGeometryName, saveGeometry() );
   rPreferences.SetGeometry( pStateName, saveState( StateVersion ) );
-  rPreferences.SetValue( "altToSelect", AltToSelect() );
   (void)rPreferences.Save();
+}
+
+/// Earlier versions kept it here. Once the settings file has it, it is no longer needed.
+void VMainWindow::TakeOverAltToSelect()
+{
+  const char* const pKey = "altToSelect";
+  const QJsonValue Alt = m_rSession.Host().Preferences().Value( pKey );
+  if ( !Alt.isBool() )
+  {
+    return;
+  }
+  const auto pEntry = m_Preferences.AltToSelect().Entry();
+  const ZEK::VStoreWriteScope Scope( *m_rSession.Host().Store() );
+  if ( ( Scope->Flags( pEntry ) & ZEK::EUsingDefault ) != 0 )
+  {
+    (void)Scope->SetValue( pEntry, ZEK::IO::MakeValue( Alt.toBool() ) );
+  }
+  else
+  {
+    m_rSession.Host().Preferences().SetValue( pKey, QJsonValue::Undefined );
+  }
 }
 
 void VMainWindow::RestoreLayout()
 {
   auto& rPreferences = m_rSession.Host().Preferences();
-  const QJsonValue Alt = rPreferences.Value( "altToSelect" );
-  if ( Alt.isBool() && Alt.toBool() != AltToSelect() )
-  {
-    const ZEK::VStoreWriteScope Scope( *m_rSession.Host().Store() );
-    (void)Scope->SetValue( m_Preferences.AltToSelect().Entry(), ZEK::IO::MakeValue( Alt.toBool() ) );
-  }
+  TakeOverAltToSelect();
   for ( const QJsonValue& rValue : rPreferences.Layout( pLayoutName )["windows"].toArray() )
   {
     const QJsonObject Window = rValue.toObject();

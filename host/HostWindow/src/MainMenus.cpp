@@ -53,6 +53,13 @@ void VMainWindow::MakeFileMenu()
              m_pOpenedMenu->setEnabled( !m_Opened.empty() );
            } );
   pMenu->addSeparator();
+  QAction* pSave = pMenu->addAction( tr( "&Save Settings" ), this,
+                                     [this]
+                                     {
+                                       m_rSession.Host().Settings().Request();
+                                     } );
+  pSave->setToolTip( tr( "Settings are saved by themselves two seconds after a change, too" ) );
+  pMenu->addSeparator();
   QAction* pQuit = pMenu->addAction( tr( "&Quit" ), this, &QWidget::close );
   pQuit->setShortcut( QKeySequence( Qt::CTRL | Qt::Key_Q ) );
 }

@@ -33,7 +33,28 @@ void VMainWindow::WatchPreferences()
         m_pMessages->ShowMessage( i_rWhy, true );
       },
       nullptr );
+  m_SettingsConnection = rHost.Settings().MessageChanged().Connect(
+      [this]
+      {
+        ShowSettingsMessage();
+      },
+      rHost.Postal() );
+  ShowSettingsMessage();
   ShowAltToSelect();
+}
+
+void VMainWindow::ShowSettingsMessage()
+{
+  const QString Text = QString::fromStdString( m_rSession.Host().Settings().Message() );
+  if ( !Text.isEmpty() )
+  {
+    m_pMessages->ShowMessage( Text, true );
+  }
+  else if ( m_pMessages->Text() == m_SettingsMessage )
+  {
+    m_pMessages->hide();
+  }
+  m_SettingsMessage = Text;
 }
 
 void VMainWindow::ShowPreferences()

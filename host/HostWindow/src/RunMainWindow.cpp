@@ -41,6 +41,8 @@ VRunResult RunMainWindow( const VCommonOptions& i_rCommon, const std::vector< st
   }
   Window.OpenFiles( Files );
   Window.show();
+  // What the start itself has set is not a change by a person. What there is to tell is shown over everything else.
+  (void)Session.Host().Settings().StartSaving();
   return { QApplication::exec(), {} };
 }
 

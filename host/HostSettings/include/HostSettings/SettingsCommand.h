@@ -9,9 +9,6 @@
 namespace HostSettings
 {
 
-/// The settings file of a user, in the folder of the program's configuration.
-inline constexpr const char* SettingsFileName = "settings.json";
-
 enum class ESettingsAction
 {
   Import, ///< add and replace what a document names, all or nothing

@@ -88,6 +88,7 @@ private:
   bool AltToSelect() const;
   void SetAltToSelect( bool i_bOn );
   void ShowAltToSelect();
+  void ShowSettingsMessage();
   /// A recording that was just read is shown, unless the operator wants to stay live.
   void ShowLoaded( const VOpened& i_rOpened );
   void ShowRecording( const VOpened& i_rOpened );
@@ -95,6 +96,7 @@ private:
   // MainLayout.cpp
   void SaveLayout();
   void RestoreLayout();
+  void TakeOverAltToSelect();
 
   VSession& m_rSession;
   ZEK::ICoreUserPreferencesLayout m_Preferences;
@@ -126,6 +128,8 @@ private:
   ZEK::VConnection m_FactoriesConnection;
   ZEK::VConnection m_AltToSelectConnection;
   ZEK::VConnection m_FailedConnection;
+  ZEK::VConnection m_SettingsConnection;
+  QString m_SettingsMessage; ///< as it was shown
 };
 
 /// Opens the window and runs the program until it is closed. Needs the application object.
