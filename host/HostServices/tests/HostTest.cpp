@@ -4,6 +4,7 @@
 #include <TestSupport/Calls.h>
 #include <TestSupport/LogGuard.h>
 #include <TestSupport/Paths.h>
+#include <ZEK/Serialiser.h>
 
 #include <QtCore/QCoreApplication>
 #include <QtQml/QQmlComponent>
@@ -67,6 +68,27 @@ TEST_F( Host, OffersContextsOverItsCaches )
   ZEK::VFlowStateRef Fetched;
   ASSERT_TRUE( pLive->Cache()->Fetch( Fetched, 31, 2, 0 ) );
   EXPECT_EQ( Fetched->GetKey().Frame, 7 );
+}
+
+TEST_F( Host, KeepsSettingsOfAProgramThatSavesThem )
+{
+  const auto Path = HostServices::SettingsPath( Options() );
+  EXPECT_EQ( Path, m_Folder.Path() / "settings.json" );
+  for ( const bool bSaves : { false, true } )
+  {
+    VHost Each( Options() );
+    ASSERT_TRUE( !bSaves || Each.Settings().StartSaving().IsOk() );
+    QString Why;
+    const auto pEntry = Each.Store()->GetEntry( "Preferences/Core/AltToSelect" );
+    ASSERT_EQ( Each.PreferenceEditor().Set( pEntry, ZEK::IO::MakeValue( false ), Why ), ZEK::IResult::Ok );
+    EXPECT_FALSE( std::filesystem::exists( Path ) );
+  }
+  ASSERT_TRUE( std::filesystem::exists( Path ) );
+  VHost Each( Options() );
+  const ZEK::VStoreReadScope Scope( *Each.Store() );
+  const auto pEntry = Each.Store()->GetEntry( "Preferences/Core/AltToSelect" );
+  EXPECT_EQ( Scope->VerifiedValue( pEntry ), ZEK::IO::MakeValue( false ) );
+  EXPECT_EQ( Scope->DefaultValue( pEntry ), ZEK::IO::MakeValue( true ) );
 }
 
 TEST_F( Host, FeatureFlagsTakeProfilesAndWords )
