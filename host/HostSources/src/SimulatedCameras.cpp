@@ -29,6 +29,8 @@ constexpr std::uint32_t Dark = FaultBit( ESimulatedFault::Missing ) | FaultBit( 
                                FaultBit( ESimulatedFault::Disabled );
 constexpr std::uint32_t Unfit = FaultBit( ESimulatedFault::Bumped ) | FaultBit( ESimulatedFault::Uncalibrated ) |
                                 FaultBit( ESimulatedFault::NotContributing );
+constexpr std::size_t CommonRows = 6;
+constexpr std::uint64_t FramesOfFormat = 60;
 constexpr float WarmCamera = 41; // degrees Celsius
 
 /// The camera as it stands, which after a bump is not as it was calibrated.
@@ -76,6 +78,7 @@ VSimulatedCameras::VSimulatedCameras( const VSimulatedCaptureOptions& i_rOptions
                            Faults,
                            Hardware.Video,
                            !Hardware.Video && Camera % 4 == 3,
+                           {},
                            {} } );
   }
   for ( VCamera& rCamera : m_Cameras )
@@ -294,10 +297,10 @@ void VSimulatedCameras::AddCentroid( const VCamera& i_rCamera, std::uint32_t i_F
     Centroid.y = static_cast< f32 >( m_Discs[i_First].y );
     Centroid.radius = static_cast< f32 >( m_Discs[i_First].Radius );
   }
-  if ( io_rSets.pBlobs || io_rSets.pEdges )
+  if ( io_rSets.pBlobs )
   {
     m_Painter.Paint( m_Members, i_rCamera.Hardware.SensorWidth, i_rCamera.Hardware.SensorHeight,
-                     static_cast< std::int32_t >( Centroid.Id ), io_rSets.pBlobs, io_rSets.pEdges );
+                     static_cast< std::int32_t >( Centroid.Id ), *io_rSets.pBlobs, io_rSets.pEdges );
   }
   const VStageMarker& rMarker = i_rMarkers[m_Discs[Nearest].Marker];
   const bool bFits = ( i_rCamera.Faults & Unfit ) == 0 && rMarker.Reconstruction >= 0;
@@ -348,6 +351,10 @@ void VSimulatedCameras::AddFrame( const std::vector< VStageMarker >& i_rMarkers,
     Sets.pAssignments->Reconstruction.reserve( i_rMarkers.size() );
     if ( Sets.pBlobs )
     {
+      // Room for common discs, so that later frames seldom need more.
+      Sets.pBlobs->Blobs.reserve( i_rMarkers.size() );
+      Sets.pBlobs->Lines.reserve( i_rMarkers.size() * CommonRows );
+      Sets.pBlobs->Pixels.reserve( i_rMarkers.size() * CommonRows * CommonRows );
       Sets.pBlobs->Complete = true;
     }
     for ( std::uint32_t Disc = 0; Disc < m_Discs.size(); ++Disc )
@@ -365,6 +372,47 @@ void VSimulatedCameras::AddFrame( const std::vector< VStageMarker >& i_rMarkers,
       }
     }
   }
+}
+
+void VSimulatedCameras::AddVideo( const VMarkerStage& i_rStage, double i_Seconds, VItemMaker& io_rMaker,
+                                  IFlowState& io_rState )
+{
+  if ( m_rOptions.VideoCameras == 0 )
+  {
+    return;
+  }
+  // A little more, so that what falls on a frame is not before it.
+  const auto Number = static_cast< std::int64_t >( std::floor( i_Seconds * VideoRateHz + 1e-6 ) );
+  const double Seconds = static_cast< double >( Number ) / VideoRateHz;
+  const bool bNew = Number != m_VideoNumber;
+  if ( bNew )
+  {
+    i_rStage.At( Seconds, m_VideoMarkers );
+    m_VideoNumber = -1; // until all are made
+  }
+  for ( std::size_t Index = m_Cameras.size() - m_rOptions.VideoCameras; Index < m_Cameras.size(); ++Index )
+  {
+    VCamera& rCamera = m_Cameras[Index];
+    if ( ( rCamera.Faults & Dark ) != 0 )
+    {
+      continue;
+    }
+    if ( bNew )
+    {
+      auto* const pFrame = io_rMaker.MakeNamed< FlowVideoFrame >( rCamera.Video, EFlowNameDevice, rCamera.Name );
+      if ( !pFrame )
+      {
+        return;
+      }
+      const auto Turn = static_cast< std::uint64_t >( Number ) / FramesOfFormat + 5 * Index;
+      m_VideoPainter.Paint( rCamera.View, m_VideoMarkers );
+      m_VideoPainter.Pack( m_rOptions.VideoFormat.value_or( static_cast< EPixelFormat >( Turn % PixelFormats ) ),
+                           *pFrame );
+      pFrame->PresentationTime = Seconds;
+    }
+    io_rState.AddItem( rCamera.Video );
+  }
+  m_VideoNumber = Number;
 }
 
 } // namespace HostSources::Simulation

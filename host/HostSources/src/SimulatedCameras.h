@@ -4,6 +4,7 @@
 #include "SimulatedItems.h"
 #include "SimulatedLens.h"
 #include "SimulatedMarkers.h"
+#include "SimulatedVideo.h"
 
 #include <CoreMoxelTypes/FlowTypes.h>
 
@@ -30,6 +31,9 @@ public:
   void AddFrame( const std::vector< VStageMarker >& i_rMarkers, VItemMaker& io_rMaker, ZEK::IFlowState& io_rState,
                  CoreMoxelTypes::VReconstructionSet& io_rPoints );
 
+  /// Video frames come at a rate of their own: between two of them the item stays.
+  void AddVideo( const VMarkerStage& i_rStage, double i_Seconds, VItemMaker& io_rMaker, ZEK::IFlowState& io_rState );
+
 private:
   struct VCamera
   {
@@ -41,6 +45,7 @@ private:
     bool bVideo = false;
     bool bEdges = false;
     std::vector< CoreMoxelTypes::u8 > Mask;
+    ZEK::VFlowItemRef Video; ///< the frame last made
   };
   /// The items of one camera in one frame.
   struct VFrameSets;
@@ -59,6 +64,9 @@ private:
   std::vector< std::uint32_t > m_Parents, m_Next, m_Last; ///< by disc
   std::vector< VDisc > m_Members;                         ///< of the centroid being made
   VDiscPainter m_Painter;
+  std::int64_t m_VideoNumber = -1; ///< of the frames last made
+  std::vector< VStageMarker > m_VideoMarkers;
+  VVideoPainter m_VideoPainter;
 };
 
 } // namespace HostSources::Simulation

@@ -12,15 +12,32 @@ namespace
 
 constexpr double Rim = 0.5; // px: how far light falls beyond the radius
 
-u8 Grey( std::span< const VDisc > i_Discs, int i_Column, int i_Row )
+int Ceiling( double i_Value )
 {
-  double Most = 0;
-  for ( const VDisc& rDisc : i_Discs )
+  const int Whole = static_cast< int >( i_Value );
+  return Whole + ( Whole < i_Value ? 1 : 0 );
+}
+int Floor( double i_Value )
+{
+  const int Whole = static_cast< int >( i_Value );
+  return Whole - ( Whole > i_Value ? 1 : 0 );
+}
+
+/// Brightens the pixels of a row, from a column on.
+void Shine( const VDisc& i_rDisc, int i_Row, int i_First, std::span< u8 > io_Pixels )
+{
+  constexpr float Range = 255 - VDiscPainter::Threshold;
+  const double Outer = i_rDisc.Radius + Rim, Y = i_Row - i_rDisc.y;
+  const auto Fall = static_cast< float >( Range / ( 2 * i_rDisc.Radius ) );
+  const auto Top = static_cast< float >( Outer * Outer - Y * Y ) * Fall;
+  float X = static_cast< float >( i_First - i_rDisc.x );
+  for ( u8& rPixel : io_Pixels )
   {
-    const double X = i_Column - rDisc.x, Y = i_Row - rDisc.y, Outer = rDisc.Radius + Rim;
-    Most = std::max( Most, ( Outer * Outer - X * X - Y * Y ) / ( 2 * rDisc.Radius ) );
+    const float Light = std::clamp( Top - X * X * Fall, 0.0F, Range );
+    const auto Grey = static_cast< u8 >( static_cast< float >( VDiscPainter::Threshold ) + 0.5F + Light );
+    rPixel = std::max( rPixel, Grey );
+    X += 1;
   }
-  return static_cast< u8 >( VDiscPainter::Threshold + ( 255 - VDiscPainter::Threshold ) * std::min( Most, 1.0 ) + 0.5 );
 }
 
 } // namespace
@@ -37,8 +54,8 @@ void VDiscPainter::FindSpans( std::span< const VDisc > i_Discs, int i_Row, int i
       continue;
     }
     const double Half = std::sqrt( HalfSq ), Edge = std::max( Half - Rim, 0.0 );
-    const int First = std::max( static_cast< int >( std::ceil( rDisc.x - Half ) ), 0 );
-    const int Last = std::min( static_cast< int >( std::floor( rDisc.x + Half ) ), i_Width - 1 );
+    const int First = std::max( Ceiling( rDisc.x - Half ), 0 );
+    const int Last = std::min( Floor( rDisc.x + Half ), i_Width - 1 );
     if ( First <= Last )
     {
       m_Spans.push_back(
@@ -74,7 +91,7 @@ void VDiscPainter::FindSpans( std::span< const VDisc > i_Discs, int i_Row, int i
 }
 
 void VDiscPainter::Paint( std::span< const VDisc > i_Discs, std::uint32_t i_Width, std::uint32_t i_Height,
-                          std::int32_t i_Centroid, VGreyscaleBlobSet* io_pBlobs, VEdgePairSet* io_pEdges )
+                          std::int32_t i_Centroid, VGreyscaleBlobSet& io_rBlobs, VEdgePairSet* io_pEdges )
 {
   double Top = i_Height, Bottom = -1;
   for ( const VDisc& rDisc : i_Discs )
@@ -82,37 +99,33 @@ void VDiscPainter::Paint( std::span< const VDisc > i_Discs, std::uint32_t i_Widt
     Top = std::min( Top, rDisc.y - rDisc.Radius - Rim );
     Bottom = std::max( Bottom, rDisc.y + rDisc.Radius + Rim );
   }
-  const int FirstRow = std::max( static_cast< int >( std::ceil( Top ) ), 0 );
-  const int LastRow = std::min( static_cast< int >( std::floor( Bottom ) ), static_cast< int >( i_Height ) - 1 );
-  const std::size_t FirstLine = io_pBlobs ? io_pBlobs->Lines.size() : 0;
+  const int FirstRow = std::max( Ceiling( Top ), 0 );
+  const int LastRow = std::min( Floor( Bottom ), static_cast< int >( i_Height ) - 1 );
+  const std::size_t FirstLine = io_rBlobs.Lines.size();
   for ( int Row = FirstRow; Row <= LastRow; ++Row )
   {
     FindSpans( i_Discs, Row, static_cast< int >( i_Width ) );
     for ( const VSpan& rSpan : m_Spans )
     {
+      const auto Length = static_cast< std::size_t >( rSpan.Last - rSpan.First + 1 );
+      const std::size_t First = io_rBlobs.Pixels.size();
+      io_rBlobs.Pixels.resize( First + Length );
+      const std::span< u8 > Pixels( io_rBlobs.Pixels.data() + First, Length );
+      for ( const VDisc& rDisc : i_Discs )
+      {
+        Shine( rDisc, Row, rSpan.First, Pixels );
+      }
+      io_rBlobs.Lines.push_back( { static_cast< u16 >( rSpan.First ), static_cast< u16 >( Row ),
+                                   static_cast< u16 >( Length ), static_cast< u32 >( First ) } );
       if ( io_pEdges )
       {
-        io_pEdges->Pairs.push_back( { static_cast< u16 >( Row ), rSpan.Left, rSpan.Right,
-                                      Grey( i_Discs, rSpan.First, Row ), Grey( i_Discs, rSpan.Last, Row ) } );
-      }
-      if ( !io_pBlobs )
-      {
-        continue;
-      }
-      io_pBlobs->Lines.push_back( { static_cast< u16 >( rSpan.First ), static_cast< u16 >( Row ),
-                                    static_cast< u16 >( rSpan.Last - rSpan.First + 1 ),
-                                    static_cast< u32 >( io_pBlobs->Pixels.size() ) } );
-      for ( int Column = rSpan.First; Column <= rSpan.Last; ++Column )
-      {
-        io_pBlobs->Pixels.push_back( Grey( i_Discs, Column, Row ) );
+        io_pEdges->Pairs.push_back(
+            { static_cast< u16 >( Row ), rSpan.Left, rSpan.Right, Pixels.front(), Pixels.back() } );
       }
     }
   }
-  if ( io_pBlobs )
-  {
-    io_pBlobs->Blobs.push_back(
-        { static_cast< u32 >( FirstLine ), static_cast< u32 >( io_pBlobs->Lines.size() - FirstLine ), i_Centroid } );
-  }
+  io_rBlobs.Blobs.push_back(
+      { static_cast< u32 >( FirstLine ), static_cast< u32 >( io_rBlobs.Lines.size() - FirstLine ), i_Centroid } );
 }
 
 } // namespace HostSources::Simulation

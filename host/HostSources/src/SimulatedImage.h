@@ -23,9 +23,9 @@ public:
   /// A pixel's grey value for a disc: bright within, falling to the threshold over the pixel at its rim.
   static constexpr int Threshold = 40;
 
-  /// Adds one blob of discs that touch. Either set may be null.
+  /// Adds one blob of discs that touch, and its edges where they are wanted.
   void Paint( std::span< const VDisc > i_Discs, std::uint32_t i_Width, std::uint32_t i_Height, std::int32_t i_Centroid,
-              CoreMoxelTypes::VGreyscaleBlobSet* io_pBlobs, CoreMoxelTypes::VEdgePairSet* io_pEdges );
+              CoreMoxelTypes::VGreyscaleBlobSet& io_rBlobs, CoreMoxelTypes::VEdgePairSet* io_pEdges );
 
 private:
   /// What of a row one disc, or several that meet there, cover.

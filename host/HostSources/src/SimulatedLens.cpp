@@ -69,7 +69,8 @@ bool VSensorView::Project( const D3& i_rPoint, VSensorPoint& o_rPoint ) const
     return false;
   }
   const auto& rCentre = m_Lens.LensCalibration().Centre;
-  const double Slope = m_Lens.Slope( std::hypot( Raw.x - rCentre.x, Raw.y - rCentre.y ) );
+  const double OffX = Raw.x - rCentre.x, OffY = Raw.y - rCentre.y;
+  const double Slope = m_Lens.Slope( std::sqrt( OffX * OffX + OffY * OffY ) );
   o_rPoint = { Raw.x, Raw.y, Depth, m_Focal / Depth / Slope };
   return true;
 }

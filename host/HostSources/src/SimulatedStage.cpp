@@ -64,14 +64,14 @@ u32 Mixed( u32 i_Colour, u32 i_Towards, double i_Share )
   return Result;
 }
 
-u32 PerformerColour( u32 i_Performer )
+} // namespace
+
+std::uint32_t PerformerColour( std::uint32_t i_Performer )
 {
   constexpr u32 Colours[] = { 0xFF4FB4FFu, 0xFFFFB84Fu, 0xFF7ED957u, 0xFFC77DFFu,
                               0xFF5CE1E6u, 0xFF6B6BFFu, 0xFFE6C229u, 0xFFB0B0B0u };
   return Colours[i_Performer % std::size( Colours )];
 }
-
-} // namespace
 
 std::string PerformerName( std::uint32_t i_Performer )
 {

@@ -19,6 +19,7 @@ inline constexpr std::size_t ObjectMarkers = 10; ///< five of the prop, five of 
 inline constexpr double FloorHalf = 3000;        ///< mm
 
 std::string PerformerName( std::uint32_t i_Performer );
+std::uint32_t PerformerColour( std::uint32_t i_Performer );
 VWalkerStyle PerformerStyle( const VSimulatedCaptureOptions& i_rOptions, std::uint32_t i_Performer );
 
 void FillCamera( std::uint32_t i_Camera, std::uint32_t i_Count, double i_RateHz,

@@ -165,6 +165,7 @@ void VSimulatedCapture::VImpl::AddPoints( double i_Seconds, std::int64_t i_Index
     AddPoint( rMarker, i_Index, *pSet );
   }
   Cameras.AddFrame( Markers, Maker, i_rState, *pSet );
+  Cameras.AddVideo( Stage, i_Seconds, Maker, i_rState );
   i_rState.AddItem( Item );
   AddLabels( i_rState );
 }

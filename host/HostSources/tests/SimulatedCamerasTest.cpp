@@ -337,3 +337,128 @@ TEST( SimulatedCameras, FaultsShowInTheCameraThatHasThemAndInNoOther )
     }
   }
 }
+
+namespace
+{
+
+using VPicture = std::vector< std::array< double, 3 > >; // R, G, B; 0 to 255
+
+/// As a reader of the format takes it; what a format does not tell of a pixel is not a number.
+VPicture Decoded( const VVideoFrame& i_rFrame )
+{
+  const std::vector< u8 >& rData = *i_rFrame.Data;
+  const auto At = [&]( int i_Plane, std::size_t i_X, std::size_t i_Y )
+  {
+    return static_cast< double >( rData.at( i_rFrame.Offset[i_Plane] + i_Y * i_rFrame.Stride[i_Plane] + i_X ) );
+  };
+  const double None = std::nan( "" );
+  VPicture Picture;
+  for ( std::size_t Y = 0; Y < i_rFrame.Height; ++Y )
+  {
+    for ( std::size_t X = 0; X < i_rFrame.Width; ++X )
+    {
+      double L = None, B = 128, R = 128;
+      std::array< double, 3 > Colour{ None, None, None };
+      const std::size_t Pair = X / 2 * 4;
+      switch ( i_rFrame.Format )
+      {
+      case EPixelFormat::Luminance8:
+      case EPixelFormat::Luminance16:
+        Colour[0] = i_rFrame.Format == EPixelFormat::Luminance8
+                        ? At( 0, X, Y )
+                        : ( At( 0, 2 * X, Y ) + 256 * At( 0, 2 * X + 1, Y ) ) / 257;
+        Colour[1] = Colour[2] = Colour[0];
+        break;
+      case EPixelFormat::YUYV:
+        L = At( 0, 2 * X, Y ), B = At( 0, Pair + 1, Y ), R = At( 0, Pair + 3, Y );
+        break;
+      case EPixelFormat::UYVY:
+        L = At( 0, 2 * X + 1, Y ), B = At( 0, Pair, Y ), R = At( 0, Pair + 2, Y );
+        break;
+      case EPixelFormat::I420:
+        L = At( 0, X, Y ), B = At( 1, X / 2, Y / 2 ), R = At( 2, X / 2, Y / 2 );
+        break;
+      case EPixelFormat::NV12:
+        L = At( 0, X, Y ), B = At( 1, X / 2 * 2, Y / 2 ), R = At( 1, X / 2 * 2 + 1, Y / 2 );
+        break;
+      default:
+      {
+        const char* const pSquares[] = { "RGGB", "GRBG", "GBRG", "BGGR" };
+        const char Letter = pSquares[static_cast< u32 >( i_rFrame.Format ) - 2][Y % 2 * 2 + X % 2];
+        Colour[Letter == 'R' ? 0 : Letter == 'G' ? 1 : 2] = At( 0, X, Y );
+      }
+      }
+      if ( !std::isnan( L ) )
+      {
+        const double Light = ( L - 16 ) * 255 / 219, Blue = ( B - 128 ) * 255 / 224, Red = ( R - 128 ) * 255 / 224;
+        Colour = { Light + 1.402 * Red, Light - 0.344136 * Blue - 0.714136 * Red, Light + 1.772 * Blue };
+      }
+      Picture.push_back( Colour );
+    }
+  }
+  return Picture;
+}
+
+} // namespace
+
+TEST( SimulatedCameras, VideoIsTheSamePictureInEveryFormat )
+{
+  constexpr std::int64_t Frame = 1001;
+  const auto VideoOf = [&]( EPixelFormat i_Format, VFlowStateRef& o_rState )
+  {
+    VSimulatedCapture Capture( { .RateHz = 100, .VideoFormat = i_Format } );
+    o_rState = StateOf( Capture, Frame );
+    const auto Frames = ByCamera< VVideoFrame >( *o_rState, 0x1007 );
+    EXPECT_EQ( Frames.size(), 2u );
+    return Frames.at( "Camera 12" );
+  };
+  VFlowStateRef Kept;
+  const VPicture Reference = Decoded( *VideoOf( EPixelFormat::YUYV, Kept ) );
+  for ( u32 Format = 0; Format < 10; ++Format )
+  {
+    SCOPED_TRACE( Format );
+    VFlowStateRef State;
+    const VVideoFrame* pFrame = VideoOf( static_cast< EPixelFormat >( Format ), State );
+    ASSERT_EQ( static_cast< u32 >( pFrame->Format ), Format );
+    EXPECT_NEAR( pFrame->PresentationTime, 300 / 30.0, 1e-9 );
+    const VPicture Picture = Decoded( *pFrame );
+    ASSERT_EQ( Picture.size(), Reference.size() );
+    double Error = 0, Count = 0;
+    for ( std::size_t Pixel = 0; Pixel < Picture.size(); ++Pixel )
+    {
+      const auto& rGood = Reference[Pixel];
+      const double Grey = 0.299 * rGood[0] + 0.587 * rGood[1] + 0.114 * rGood[2];
+      for ( std::size_t Channel = 0; Channel < 3; ++Channel )
+      {
+        if ( !std::isnan( Picture[Pixel][Channel] ) )
+        {
+          Error += std::abs( Picture[Pixel][Channel] - ( Format < 2 ? Grey : rGood[Channel] ) );
+          ++Count;
+        }
+      }
+    }
+    EXPECT_GE( Count, Picture.size() );
+    EXPECT_LT( Error / Count, 2.5 ) << "grey values";
+  }
+}
+
+TEST( SimulatedCameras, VideoKeepsItsOwnRateAndGoesThroughAllFormats )
+{
+  VSimulatedCapture Capture( { .RateHz = 120 } ), Again( { .RateHz = 120 } );
+  std::set< EPixelFormat > Formats;
+  for ( std::int64_t Frame = 0; Frame < 2400; Frame += 240 )
+  {
+    const auto First = StateOf( Capture, Frame ), Held = StateOf( Capture, Frame + 3 ),
+               Next = StateOf( Capture, Frame + 4 );
+    ASSERT_EQ( ItemsOf( *First, 0x1007 ), ItemsOf( *Held, 0x1007 ) );
+    ASSERT_NE( ItemsOf( *First, 0x1007 ), ItemsOf( *Next, 0x1007 ) );
+    const auto Frames = ByCamera< VVideoFrame >( *First, 0x1007 );
+    Formats.insert( Frames.at( "Camera 11" )->Format );
+    // Asked for in the middle of the frame, the picture is that of its beginning.
+    const auto Middle = StateOf( Again, Frame + 2 );
+    ASSERT_EQ( *ByCamera< VVideoFrame >( *Middle, 0x1007 ).at( "Camera 11" )->Data, *Frames.at( "Camera 11" )->Data );
+    ASSERT_FALSE( ByCamera< VCentroidSet >( *First, 0x1003 ).contains( "Camera 11" ) );
+    ASSERT_TRUE( ByCamera< VCameraHardware >( *First, 0x1000 ).at( "Camera 11" )->Video );
+  }
+  EXPECT_EQ( Formats.size(), 10u );
+}
