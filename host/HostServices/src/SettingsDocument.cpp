@@ -167,13 +167,14 @@ IResult KeepAside( const std::string& i_rPath, bool i_bCopy, std::string& o_rKep
   {
     return IResult::NotPermitted;
   }
-  const std::string Stem =
-      ( File.parent_path() / File.stem() ).string() +
-      QDateTime::currentDateTime().toString( QStringLiteral( "'.kept-'yyyyMMdd-HHmmss" ) ).toStdString();
+  std::string Stem = ( File.parent_path() / File.stem() ).string();
+  Stem.append( QDateTime::currentDateTime().toString( QStringLiteral( "'.kept-'yyyyMMdd-HHmmss" ) ).toStdString() );
   IResult Result = IResult::AlreadyPresent;
   for ( int Number = 1; Result == IResult::AlreadyPresent && Number < MostKept; ++Number )
   {
-    o_rKept = Stem + ( Number > 1 ? "-" + std::to_string( Number ) : std::string() ) + File.extension().string();
+    o_rKept = Stem;
+    o_rKept.append( Number > 1 ? std::string( "-" ).append( std::to_string( Number ) ) : std::string() );
+    o_rKept.append( File.extension().string() );
     Result = i_bCopy ? CopyAside( File.string(), o_rKept ) : MoveAside( File.string(), o_rKept );
   }
   return Result;

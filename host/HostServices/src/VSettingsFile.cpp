@@ -168,7 +168,8 @@ struct VSettingsFile::VState
   {
     if ( i_Result.IsError() )
     {
-      std::string Text = "The settings could not be saved to \"" + Path.string() + "\": " + i_Result.Text();
+      std::string Text = std::string( "The settings could not be saved to \"" ).append( Path.string() );
+      Text.append( "\": " ).append( i_Result.Text() );
       Tell( Text.append( i_bLast ? ". What was changed since they were saved is lost."
                                  : ". They stay as they are in the program, and saving is tried again." ),
             true );
@@ -183,7 +184,6 @@ struct VSettingsFile::VState
   /// Empty when there was nothing to keep.
   std::string Keep( IResult& o_rResult )
   {
-    const std::string File = "The settings in \"" + Path.string() + "\"";
     const bool bPartial = Loaded == IResult::OkButPartial;
     if ( Loaded == IResult::Ok || Loaded == IResult::FileNotFound )
     {
@@ -191,23 +191,22 @@ struct VSettingsFile::VState
     }
     std::string Kept;
     o_rResult = KeepAside( Path.string(), bPartial, Kept );
-    const std::string Trouble =
-        bPartial ? File + " could not all be used" : File + " could not be read (" + WhyNotLoaded + ")";
+    std::string Text = std::string( "The settings in \"" ).append( Path.string() );
+    Text.append( bPartial ? "\" could not all be used"
+                          : std::string( "\" could not be read (" ).append( WhyNotLoaded ).append( ")" ) );
     if ( o_rResult.IsError() )
     {
-      return Trouble + ", and not be kept under another name (" + o_rResult.Text() +
-             "). Nothing is saved over them: what you change holds until the program ends.";
+      Text.append( ", and not be kept under another name (" ).append( o_rResult.Text() );
+      return Text.append( "). Nothing is saved over them: what you change holds until the program ends." );
     }
-    return Trouble +
-           ( bPartial ? ". The file as it was is kept as \"" : ". The defaults hold. The file is kept as \"" ) + Kept +
-           "\".";
+    Text.append( bPartial ? ". The file as it was is kept as \"" : ". The defaults hold. The file is kept as \"" );
+    return Text.append( Kept ).append( "\"." );
   }
 
   const std::shared_ptr< ZEK::IStore > pStore;
   const std::filesystem::path Path;
   IResult Loaded = IResult::NotAvailable;
   std::string WhyNotLoaded = "it was not loaded";
-  std::shared_ptr< ZEK::IStore > pRead;   ///< what the file said, until saving starts
   std::optional< std::string > SavedText; ///< of the worker, once it runs
   ZEK::VConnection Changes;
   std::thread Worker;

@@ -24,7 +24,7 @@ namespace HostServices
 /// A file that could not be taken in as it stands is kept under a dated name, never over another file. Where that is
 /// not possible nothing is saved to its name.
 ///
-/// Thread: that which makes it, save for `Request`, `IsPending` and `Message`, which are for any.
+/// Thread: that which makes it, save for `IsPending` and `Message`, which are for any.
 class VSettingsFile
 {
 public:
