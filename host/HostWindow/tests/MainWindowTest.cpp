@@ -282,6 +282,49 @@ TEST_F( MainWindow, TheLayoutComesBackAtTheNextStart )
   EXPECT_EQ( m_pWindow->size(), QSize( 901, 703 ) );
 }
 
+TEST_F( MainWindow, SettingsComeBackAndOnesThatCouldNotBeReadAreKeptAndTold )
+{
+  const auto Path = HostServices::SettingsPath();
+  const auto AltToSelect = [&]
+  {
+    ZEK::IStore& rStore = *m_pSession->Host().Store();
+    const ZEK::VStoreReadScope Scope( rStore );
+    return Scope->VerifiedValue( rStore.GetEntry( "Preferences/Core/AltToSelect" ) ) == ZEK::IO::MakeValue( true );
+  };
+  // Earlier versions kept it elsewhere.
+  m_pSession->Host().Preferences().SetValue( "altToSelect", false );
+  ASSERT_TRUE( m_pSession->Host().Preferences().Save().IsOk() );
+  std::ofstream( Path ) << "{ broken";
+  End();
+  Begin();
+  EXPECT_FALSE( AltToSelect() );
+  ASSERT_TRUE( m_pSession->Host().Settings().StartSaving().IsOk() );
+  EXPECT_TRUE( SpinUntil(
+      [&]
+      {
+        return m_pWindow->Messages().isVisible() && m_pWindow->Messages().Text().contains( "The file is kept as" );
+      } ) )
+      << m_pWindow->Messages().Text().toStdString();
+  EXPECT_FALSE( std::filesystem::exists( Path ) );
+  for ( QAction* pAction : m_pWindow->findChildren< QAction* >() )
+  {
+    if ( pAction->text() == "&Save Settings" )
+    {
+      pAction->trigger();
+    }
+  }
+  EXPECT_TRUE( SpinUntil(
+      [&]
+      {
+        return std::filesystem::exists( Path );
+      } ) );
+  Prefer( "AltToSelect", true );
+  End();
+  Begin();
+  EXPECT_TRUE( AltToSelect() ) << "what was saved holds against what was kept elsewhere";
+  EXPECT_TRUE( m_pSession->Host().Preferences().Value( "altToSelect" ).isUndefined() );
+}
+
 TEST_F( MainWindow, TheStatusLineNamesWhatIsUnderThePointerBeforeWhatIsSelected )
 {
   auto* pLabel = m_pWindow->findChild< QLabel* >( "Selection" );
