@@ -187,14 +187,14 @@ TEST_F( CameraDrawData, BuffersAreKeptForWhoHoldsThemAndFramesAllocateNothing )
   std::vector< VFlowItemRef > Slow;
   for ( int Number = 0; Number < 20; ++Number )
   {
-    Slow.push_back( Hard( "c" + std::to_string( Number ) ) );
-    Slow.push_back( Item< FlowCameraCalibration >( Calibration(), "c" + std::to_string( Number ) ) );
+    Slow.push_back( Hard( std::to_string( Number ) ) );
+    Slow.push_back( Item< FlowCameraCalibration >( Calibration(), std::to_string( Number ) ) );
   }
   const auto Moved = [&]( float i_Step, std::vector< VFlowItemRef > i_Items )
   {
     for ( int Number = 0; Number < 20; ++Number )
     {
-      i_Items.push_back( Item< FlowCentroidSet >( Centroids( 30, i_Step ), "c" + std::to_string( Number ) ) );
+      i_Items.push_back( Item< FlowCentroidSet >( Centroids( 30, i_Step ), std::to_string( Number ) ) );
     }
     return Maker.State( ++Frame, i_Items );
   };
