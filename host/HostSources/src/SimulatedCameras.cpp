@@ -14,24 +14,17 @@ namespace HostSources::Simulation
 namespace
 {
 
-constexpr std::uint32_t CellSize = 32; // px
-constexpr std::size_t MostMasked = 3;  // cameras opposite whose lamps are masked
-constexpr double LampRadius = 12;      // px
-constexpr double Hidden = -0.7;        // cosine below which a body stands between
-constexpr double SmallDisc = 1.2;      // px
+constexpr std::size_t MostMasked = 3; // cameras opposite whose lamps are masked
+constexpr double LampRadius = 12;     // px
+constexpr double Hidden = -0.7;       // cosine below which a body stands between
+constexpr double SmallDisc = 1.2;     // px
 constexpr std::uint32_t None = 0xFFFFFFFF;
-constexpr std::uint32_t FaultBit( ESimulatedFault i_Fault )
-{
-  const auto Bit = static_cast< std::uint32_t >( i_Fault );
-  return Bit < 32 ? 1u << Bit : 0;
-}
 constexpr std::uint32_t Dark = FaultBit( ESimulatedFault::Missing ) | FaultBit( ESimulatedFault::Disconnected ) |
                                FaultBit( ESimulatedFault::Disabled );
 constexpr std::uint32_t Unfit = FaultBit( ESimulatedFault::Bumped ) | FaultBit( ESimulatedFault::Uncalibrated ) |
                                 FaultBit( ESimulatedFault::NotContributing );
 constexpr std::size_t CommonRows = 6;
 constexpr std::uint64_t FramesOfFormat = 60;
-constexpr float WarmCamera = 41; // degrees Celsius
 
 /// The camera as it stands, which after a bump is not as it was calibrated.
 VCameraCalibration Standing( VCameraCalibration i_Calibration, std::uint32_t i_Faults )
@@ -117,77 +110,6 @@ void VSimulatedCameras::MakeMask( VCamera& io_rCamera ) const
                    u8{ 0xFF } );
     }
   }
-}
-
-void VSimulatedCameras::AddSlowItems( VItemMaker& io_rMaker, std::vector< VFlowItemRef >& io_rSlow ) const
-{
-  for ( std::size_t Index = 0; Index < m_Cameras.size(); ++Index )
-  {
-    const VCamera& rCamera = m_Cameras[Index];
-    const auto Has = [&]( ESimulatedFault i_Fault )
-    {
-      return ( rCamera.Faults & FaultBit( i_Fault ) ) != 0;
-    };
-    io_rMaker.AddSlow< FlowCameraHardware >( io_rSlow, EFlowNameDevice, rCamera.Name, rCamera.Hardware );
-    VCameraSettings Settings;
-    Settings.Values = { { "Name", rCamera.Name },
-                        { "UserId", static_cast< std::int64_t >( Index + 1 ) },
-                        { "Connected", !Has( ESimulatedFault::Disconnected ) && !Has( ESimulatedFault::Missing ) },
-                        { "Enabled", !Has( ESimulatedFault::Disabled ) },
-                        { "Missing", Has( ESimulatedFault::Missing ) },
-                        { "Contributing", !Has( ESimulatedFault::NotContributing ) },
-                        { "SensorMode", std::string( "Full" ) },
-                        { "AudioChannels", std::int64_t{ 0 } },
-                        { "GammaCorrection", 1.0 },
-                        { "VideoSaturation", 1.0 },
-                        { "Threshold", std::int64_t{ VDiscPainter::Threshold } } };
-    io_rMaker.AddSlow< FlowCameraSettings >( io_rSlow, EFlowNameDevice, rCamera.Name, std::move( Settings ) );
-    if ( !Has( ESimulatedFault::Uncalibrated ) )
-    {
-      io_rMaker.AddSlow< FlowCameraCalibration >( io_rSlow, EFlowNameDevice, rCamera.Name, rCamera.Calibration );
-    }
-    if ( !rCamera.Mask.empty() )
-    {
-      VCameraMaskGrid Mask{ static_cast< u16 >( rCamera.Hardware.SensorWidth / CellSize ),
-                            static_cast< u16 >( rCamera.Hardware.SensorHeight / CellSize ), CellSize, CellSize,
-                            rCamera.Mask };
-      io_rMaker.AddSlow< FlowCameraMaskGrid >( io_rSlow, EFlowNameDevice, rCamera.Name, std::move( Mask ) );
-    }
-    AddHealth( rCamera, Index, io_rMaker, io_rSlow );
-  }
-}
-
-void VSimulatedCameras::AddHealth( const VCamera& i_rCamera, std::size_t i_Index, VItemMaker& io_rMaker,
-                                   std::vector< VFlowItemRef >& io_rSlow ) const
-{
-  const bool bBumped = ( i_rCamera.Faults & FaultBit( ESimulatedFault::Bumped ) ) != 0;
-  const bool bHot = ( i_rCamera.Faults & FaultBit( ESimulatedFault::Hot ) ) != 0;
-  const bool bWarned = ( i_rCamera.Faults & FaultBit( ESimulatedFault::Warned ) ) != 0;
-  const VHash Hash = VHash( m_rOptions.Seed ).With( 0x4865 ).With( i_Index );
-  const auto Spread = static_cast< f32 >( Hash.Uniform() );
-  const f32 Temperature = WarmCamera + 2 * Spread;
-  if ( !( i_rCamera.Faults & FaultBit( ESimulatedFault::Uncalibrated ) ) )
-  {
-    VCameraCalibrationHealth Health;
-    Health.AvgReprojectionError = bBumped ? 6.0 : 0.08 + 0.1 * Spread;
-    Health.Score = bBumped ? 0.95F : 0.05F + 0.2F * Spread;
-    Health.ScoreConfidence = 0.9F;
-    Health.NumResiduals = 4000 + static_cast< u32 >( 2000 * Spread );
-    Health.CentroidConnectionScore = bBumped ? 0.9F : 0.1F * Spread;
-    Health.CentroidConnectionScoreConfidence = 0.9F;
-    Health.IsBumped = bBumped;
-    io_rMaker.AddSlow< FlowCameraCalibrationHealth >( io_rSlow, EFlowNameDevice, i_rCamera.Name, Health );
-    io_rMaker.AddSlow< FlowCameraCalibrationDetails >( io_rSlow, EFlowNameDevice, i_rCamera.Name,
-                                                       { Temperature - 0.6F, Temperature, true, 0 } );
-  }
-  // The way down on the ring, in the camera's own axes, is the same for all but the tilt.
-  const f32 Tilt = static_cast< f32 >( std::atan2( i_rCamera.Calibration.Position.z - 900, 4800.0 ) );
-  io_rMaker.AddSlow< FlowCameraPhysicalStatus >( io_rSlow, EFlowNameDevice, i_rCamera.Name,
-                                                 { bBumped, bBumped ? 3.0F : 0.0F, 0 } );
-  io_rMaker.AddSlow< FlowCameraPhysicalSensorData >(
-      io_rSlow, EFlowNameDevice, i_rCamera.Name,
-      { Temperature + ( bHot ? 25 : 0 ), { 0, std::cos( Tilt ), std::sin( Tilt ) }, 5 } );
-  io_rMaker.AddSlow< FlowCameraWarnings >( io_rSlow, EFlowNameDevice, i_rCamera.Name, { bWarned ? 0xFFu : 0u } );
 }
 
 void VSimulatedCameras::See( const VCamera& i_rCamera, const std::vector< VStageMarker >& i_rMarkers )

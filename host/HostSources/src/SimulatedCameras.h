@@ -15,6 +15,15 @@
 namespace HostSources::Simulation
 {
 
+inline constexpr std::uint32_t CellSize = 32; ///< px, of a mask
+
+/// 0 for a fault that nobody knows.
+constexpr std::uint32_t FaultBit( ESimulatedFault i_Fault )
+{
+  const auto Bit = static_cast< std::uint32_t >( i_Fault );
+  return Bit < 32 ? 1u << Bit : 0;
+}
+
 /// What the cameras of the capture are and see. The last of them are video cameras, which see no markers.
 ///
 /// A centroid is the exact image of a marker's true place; discs that touch are one centroid, which belongs to the

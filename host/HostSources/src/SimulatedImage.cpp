@@ -42,6 +42,41 @@ void Shine( const VDisc& i_rDisc, int i_Row, int i_First, std::span< u8 > io_Pix
 
 } // namespace
 
+/// As for discs that touch, but for nearly every centroid of nearly every frame.
+void VDiscPainter::PaintOne( const VDisc& i_rDisc, std::uint32_t i_Width, std::uint32_t i_Height,
+                             VGreyscaleBlobSet& io_rBlobs, VEdgePairSet* io_pEdges )
+{
+  const double Outer = i_rDisc.Radius + Rim;
+  const int FirstRow = std::max( Ceiling( i_rDisc.y - Outer ), 0 );
+  const int LastRow = std::min( Floor( i_rDisc.y + Outer ), static_cast< int >( i_Height ) - 1 );
+  const auto Side = static_cast< std::size_t >( 2 * Outer ) + 1;
+  std::size_t Pixel = io_rBlobs.Pixels.size();
+  io_rBlobs.Pixels.resize( Pixel + Side * Side );
+  for ( int Row = FirstRow; Row <= LastRow; ++Row )
+  {
+    const double Down = Row - i_rDisc.y, Half = std::sqrt( std::max( Outer * Outer - Down * Down, 0.0 ) );
+    const int First = std::max( Ceiling( i_rDisc.x - Half ), 0 );
+    const int Last = std::min( Floor( i_rDisc.x + Half ), static_cast< int >( i_Width ) - 1 );
+    if ( First > Last )
+    {
+      continue;
+    }
+    const auto Length = static_cast< std::size_t >( Last - First + 1 );
+    const std::span< u8 > Pixels( io_rBlobs.Pixels.data() + Pixel, Length );
+    Shine( i_rDisc, Row, First, Pixels );
+    io_rBlobs.Lines.push_back( { static_cast< u16 >( First ), static_cast< u16 >( Row ), static_cast< u16 >( Length ),
+                                 static_cast< u32 >( Pixel ) } );
+    Pixel += Length;
+    if ( io_pEdges )
+    {
+      const double Edge = std::max( Half - Rim, 0.0 );
+      io_pEdges->Pairs.push_back( { static_cast< u16 >( Row ), static_cast< f32 >( i_rDisc.x - Edge ),
+                                    static_cast< f32 >( i_rDisc.x + Edge ), Pixels.front(), Pixels.back() } );
+    }
+  }
+  io_rBlobs.Pixels.resize( Pixel );
+}
+
 void VDiscPainter::FindSpans( std::span< const VDisc > i_Discs, int i_Row, int i_Width )
 {
   m_Spans.clear();
@@ -93,6 +128,22 @@ void VDiscPainter::FindSpans( std::span< const VDisc > i_Discs, int i_Row, int i
 void VDiscPainter::Paint( std::span< const VDisc > i_Discs, std::uint32_t i_Width, std::uint32_t i_Height,
                           std::int32_t i_Centroid, VGreyscaleBlobSet& io_rBlobs, VEdgePairSet* io_pEdges )
 {
+  const std::size_t FirstLine = io_rBlobs.Lines.size();
+  if ( i_Discs.size() == 1 )
+  {
+    PaintOne( i_Discs[0], i_Width, i_Height, io_rBlobs, io_pEdges );
+  }
+  else
+  {
+    PaintAll( i_Discs, i_Width, i_Height, io_rBlobs, io_pEdges );
+  }
+  io_rBlobs.Blobs.push_back(
+      { static_cast< u32 >( FirstLine ), static_cast< u32 >( io_rBlobs.Lines.size() - FirstLine ), i_Centroid } );
+}
+
+void VDiscPainter::PaintAll( std::span< const VDisc > i_Discs, std::uint32_t i_Width, std::uint32_t i_Height,
+                             VGreyscaleBlobSet& io_rBlobs, VEdgePairSet* io_pEdges )
+{
   double Top = i_Height, Bottom = -1;
   for ( const VDisc& rDisc : i_Discs )
   {
@@ -101,7 +152,6 @@ void VDiscPainter::Paint( std::span< const VDisc > i_Discs, std::uint32_t i_Widt
   }
   const int FirstRow = std::max( Ceiling( Top ), 0 );
   const int LastRow = std::min( Floor( Bottom ), static_cast< int >( i_Height ) - 1 );
-  const std::size_t FirstLine = io_rBlobs.Lines.size();
   for ( int Row = FirstRow; Row <= LastRow; ++Row )
   {
     FindSpans( i_Discs, Row, static_cast< int >( i_Width ) );
@@ -124,8 +174,6 @@ void VDiscPainter::Paint( std::span< const VDisc > i_Discs, std::uint32_t i_Widt
       }
     }
   }
-  io_rBlobs.Blobs.push_back(
-      { static_cast< u32 >( FirstLine ), static_cast< u32 >( io_rBlobs.Lines.size() - FirstLine ), i_Centroid } );
 }
 
 } // namespace HostSources::Simulation

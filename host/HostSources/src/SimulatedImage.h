@@ -34,6 +34,10 @@ private:
     int First = 0, Last = 0;
     float Left = 0, Right = 0; ///< of the rim, to a part of a pixel
   };
+  static void PaintOne( const VDisc& i_rDisc, std::uint32_t i_Width, std::uint32_t i_Height,
+                        CoreMoxelTypes::VGreyscaleBlobSet& io_rBlobs, CoreMoxelTypes::VEdgePairSet* io_pEdges );
+  void PaintAll( std::span< const VDisc > i_Discs, std::uint32_t i_Width, std::uint32_t i_Height,
+                 CoreMoxelTypes::VGreyscaleBlobSet& io_rBlobs, CoreMoxelTypes::VEdgePairSet* io_pEdges );
   void FindSpans( std::span< const VDisc > i_Discs, int i_Row, int i_Width );
 
   std::vector< VSpan > m_Spans;
