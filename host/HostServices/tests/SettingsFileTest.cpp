@@ -58,6 +58,14 @@ public:
     return Fails( m_WriteError ) ? -1 : IFileSystemCalls::Write( i_File, i_pBytes, i_Size );
   }
   int Sync( int ) override { return 0; }
+  int Lock( int i_File, int i_Operation ) override
+  {
+    if ( m_BeforeLock )
+    {
+      m_BeforeLock();
+    }
+    return IFileSystemCalls::Lock( i_File, i_Operation );
+  }
   int RenameNoReplace( const char* i_pFrom, const char* i_pTo ) override
   {
     return Fails( m_MoveError ) ? -1 : IFileSystemCalls::RenameNoReplace( i_pFrom, i_pTo );
@@ -84,6 +92,7 @@ public:
   std::atomic< int > m_OpenError = 0;
   std::atomic< int > m_WriteError = 0;
   std::atomic< int > m_MoveError = 0;
+  std::function< void() > m_BeforeLock;
 
 private:
   static bool Fails( int i_Error )
@@ -468,4 +477,25 @@ TEST_F( Settings, NobodyWaitsForADiskAndTheEndSavesWhatCameMeanwhile )
   EXPECT_EQ( End.get(), IResult::Ok );
   EXPECT_EQ( m_Calls.m_Saves, 2 );
   EXPECT_EQ( VRun( m_Path ).Get( pOld ), MakeValue( 2 ) );
+}
+
+TEST_F( Settings, TheEndWaitsAMomentForAnotherProgramThatSaves )
+{
+  VRun Run( m_Path );
+  ASSERT_EQ( Run.m_File.StartSaving(), IResult::Ok );
+  std::unique_ptr< UtilsFileSystem::VSaveLock > pOther;
+  ASSERT_TRUE( UtilsFileSystem::VSaveLock::Take( m_Path.string(), pOther ).IsOk() );
+  Run.Set( pAlt, false );
+  int Tries = 0;
+  m_Calls.m_BeforeLock = [&]
+  {
+    if ( ++Tries == 3 )
+    {
+      pOther.reset();
+    }
+  };
+  EXPECT_EQ( Run.m_File.Finish(), IResult::Ok );
+  EXPECT_GE( Tries, 3 ) << "giving the lock up is a call, too";
+  EXPECT_TRUE( Run.m_File.Message().empty() ) << Run.m_File.Message();
+  EXPECT_EQ( VRun( m_Path ).Get( pAlt ), MakeValue( false ) );
 }
