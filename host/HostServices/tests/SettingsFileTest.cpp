@@ -60,10 +60,7 @@ public:
   int Sync( int ) override { return 0; }
   int Lock( int i_File, int i_Operation ) override
   {
-    if ( m_BeforeLock )
-    {
-      m_BeforeLock();
-    }
+    m_BeforeLock();
     return IFileSystemCalls::Lock( i_File, i_Operation );
   }
   int RenameNoReplace( const char* i_pFrom, const char* i_pTo ) override
@@ -92,7 +89,7 @@ public:
   std::atomic< int > m_OpenError = 0;
   std::atomic< int > m_WriteError = 0;
   std::atomic< int > m_MoveError = 0;
-  std::function< void() > m_BeforeLock;
+  std::function< void() > m_BeforeLock = [] {};
 
 private:
   static bool Fails( int i_Error )
