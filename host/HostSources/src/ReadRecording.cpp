@@ -1,6 +1,7 @@
 #include <HostSources/ReadRecording.h>
 
 #include <HostSources/VC3dReader.h>
+#include <HostSources/VFolderReader.h>
 #include <HostSources/VTrcReader.h>
 
 #include "ReaderSupport.h"
@@ -56,6 +57,11 @@ ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_
 {
   o_rRecording = {};
   o_rMessage.clear();
+  std::error_code Ignored;
+  if ( std::filesystem::is_directory( i_rPath, Ignored ) )
+  {
+    return ReadFolder( i_rPath, o_rRecording, o_rMessage, i_rProgress );
+  }
   VFileSource Source;
   const ZEK::IResult Opened = Source.Open( i_rPath, o_rMessage );
   if ( Opened.IsError() )

@@ -143,6 +143,67 @@ void WritePlates( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
   io_rWriter.EndArray();
 }
 
+VRecordingInfo::VCamera DescribeCamera( const VRecordingCamera& i_rCamera, std::int64_t i_Frames )
+{
+  VRecordingInfo::VCamera Camera;
+  Camera.Name = i_rCamera.Camera.Name;
+  Camera.Width = i_rCamera.Camera.Hardware.SensorWidth;
+  Camera.Height = i_rCamera.Camera.Hardware.SensorHeight;
+  Camera.bCalibrated = i_rCamera.Camera.Calibration.has_value();
+  Camera.DetectionCount = i_rCamera.Detections.size();
+  for ( const VRecordingDetection& rSeen : i_rCamera.Detections )
+  {
+    Camera.KnownCount += rSeen.Point >= 0;
+  }
+  for ( std::int64_t Frame = 0; Frame < i_Frames; ++Frame )
+  {
+    Camera.FramesSeen += !i_rCamera.Frame( Frame ).empty();
+  }
+  Camera.MeasuredCount = i_rCamera.MeasuredCount;
+  Camera.MeanDistance = i_rCamera.MeanDistance;
+  Camera.WorstDistance = i_rCamera.WorstDistance;
+  return Camera;
+}
+
+std::string CameraText( const VRecordingInfo::VCamera& i_rCamera )
+{
+  std::string Line = Format( "  %s, %u x %u, %s, %llu detections in %llu frames, %llu of them of known points",
+                             i_rCamera.Name.substr( 0, 200 ).c_str(), i_rCamera.Width, i_rCamera.Height,
+                             i_rCamera.bCalibrated ? "calibrated" : "uncalibrated",
+                             static_cast< unsigned long long >( i_rCamera.DetectionCount ),
+                             static_cast< unsigned long long >( i_rCamera.FramesSeen ),
+                             static_cast< unsigned long long >( i_rCamera.KnownCount ) );
+  if ( i_rCamera.MeasuredCount > 0 )
+  {
+    Line += Format( ", %.3f px from the projected points (worst %.1f px)", i_rCamera.MeanDistance,
+                    i_rCamera.WorstDistance );
+  }
+  return Line + "\n";
+}
+
+void WriteCameras( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
+{
+  io_rWriter.Key( "cameras" );
+  io_rWriter.StartArray();
+  for ( const VRecordingInfo::VCamera& rCamera : i_rInfo.Cameras )
+  {
+    io_rWriter.StartObject();
+    Text( io_rWriter, "name", rCamera.Name );
+    Integer( io_rWriter, "width", rCamera.Width );
+    Integer( io_rWriter, "height", rCamera.Height );
+    io_rWriter.Key( "calibrated" );
+    io_rWriter.Bool( rCamera.bCalibrated );
+    Integer( io_rWriter, "detections", static_cast< std::int64_t >( rCamera.DetectionCount ) );
+    Integer( io_rWriter, "detectionsOfPoints", static_cast< std::int64_t >( rCamera.KnownCount ) );
+    Integer( io_rWriter, "framesSeen", static_cast< std::int64_t >( rCamera.FramesSeen ) );
+    Integer( io_rWriter, "measured", static_cast< std::int64_t >( rCamera.MeasuredCount ) );
+    Number( io_rWriter, "meanDistance", rCamera.MeanDistance );
+    Number( io_rWriter, "worstDistance", rCamera.WorstDistance );
+    io_rWriter.EndObject();
+  }
+  io_rWriter.EndArray();
+}
+
 void WriteAnalogAndEvents( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
 {
   Number( io_rWriter, "analogRateHz", i_rInfo.AnalogRateHz );
@@ -251,9 +312,10 @@ VRecordingInfo DescribeRecording( const VRecording& i_rRecording )
 {
   VRecordingInfo Info;
   Info.Name = i_rRecording.Name;
-  Info.Format = i_rRecording.Format == ERecordingFormat::C3d   ? "C3D"
-                : i_rRecording.Format == ERecordingFormat::Trc ? "TRC"
-                                                               : "none";
+  Info.Format = i_rRecording.Format == ERecordingFormat::C3d      ? "C3D"
+                : i_rRecording.Format == ERecordingFormat::Trc    ? "TRC"
+                : i_rRecording.Format == ERecordingFormat::Folder ? "folder"
+                                                                  : "none";
   Info.Form = i_rRecording.Form;
   Info.Unit = i_rRecording.Unit;
   Info.PointCount = i_rRecording.PointCount();
@@ -277,6 +339,10 @@ VRecordingInfo DescribeRecording( const VRecording& i_rRecording )
   for ( const VForcePlate& rPlate : i_rRecording.ForcePlates )
   {
     Info.ForcePlates.push_back( DescribePlate( rPlate, i_rRecording.AnalogPerFrame ) );
+  }
+  for ( const VRecordingCamera& rCamera : i_rRecording.Cameras )
+  {
+    Info.Cameras.push_back( DescribeCamera( rCamera, i_rRecording.FrameCount ) );
   }
   return Info;
 }
@@ -302,6 +368,10 @@ std::string VRecordingInfo::Text() const
   for ( const VPlate& rPlate : ForcePlates )
   {
     Lines += ( &rPlate == &ForcePlates.front() ? "Plates:\n" : "" ) + PlateText( rPlate );
+  }
+  for ( const VCamera& rCamera : Cameras )
+  {
+    Lines += ( &rCamera == &Cameras.front() ? "Cameras:\n" : "" ) + CameraText( rCamera );
   }
   for ( const VRecordingEvent& rEvent : Events )
   {
@@ -333,6 +403,7 @@ std::string VRecordingInfo::Json() const
   WritePoints( Writer, *this );
   HostSources::Text( Writer, "upAxis", UpAxis == EUpAxis::Y ? "y" : "z" );
   HostSources::Text( Writer, "upAxisReason", UpAxisReason );
+  WriteCameras( Writer, *this );
   WriteAnalogAndEvents( Writer, *this );
   Texts( Writer, "notes", Notes );
   Writer.EndObject();

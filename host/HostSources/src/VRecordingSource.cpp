@@ -1,5 +1,7 @@
 #include <HostSources/VRecordingSource.h>
 
+#include "RecordingCameras.h"
+#include "RecordingItems.h"
 #include "RecordingSubjects.h"
 
 #include <CoreMoxelTypes/Device.h>
@@ -9,35 +11,12 @@
 #include <algorithm>
 #include <bit>
 #include <cmath>
-#include <cstring>
 
 namespace HostSources
 {
 namespace
 {
 using namespace CoreMoxelTypes;
-
-template < typename T >
-bool SameBits( std::span< const T > i_A, std::span< const T > i_B )
-{
-  return i_A.size() == i_B.size() &&
-         ( i_A.data() == i_B.data() || std::memcmp( i_A.data(), i_B.data(), i_A.size_bytes() ) == 0 );
-}
-
-/// Makes an item of flow type `TFlow` and gives its payload, or null after a failure, which stays in `io_rResult`.
-template < typename TFlow >
-typename ZEK::FlowValueType< TFlow >::type* MakeItem( const VStateMaker& i_rMaker, ZEK::VFlowItemRef& o_rItem,
-                                                      ZEK::IResult& io_rResult )
-{
-  o_rItem.Reset();
-  i_rMaker.Store->CreateItem( io_rResult, ZEK::FlowValueType< TFlow >::Descriptor, o_rItem );
-  auto* pPayload = ZEK::FlowMutablePayload< typename ZEK::FlowValueType< TFlow >::type >( o_rItem.Get() );
-  if ( !pPayload && io_rResult.IsOk() )
-  {
-    io_rResult = ZEK::IResult::InvalidType;
-  }
-  return io_rResult.IsOk() ? pPayload : nullptr;
-}
 
 /// Whole metres that hold the data, and three metres each way at least; the second axis is z where y is up.
 VVolumeProperties FloorOf( const VRecordingBounds& i_rBounds, EUpAxis i_Up )
@@ -80,6 +59,7 @@ public:
   explicit VState( const VRecording& i_rRecording )
     : m_rRecording( i_rRecording )
     , m_Subjects( SubjectsOf( i_rRecording ) )
+    , m_Cameras( i_rRecording, m_Subjects )
   {
   }
 
@@ -98,6 +78,7 @@ private:
 
   const VRecording& m_rRecording;
   const VRecordingSubjects m_Subjects;
+  VRecordingCameras m_Cameras;
   ZEK::VFlowStoreRef m_Store; ///< that made the items
   EUpAxis m_Up = EUpAxis::Z;
   std::vector< ZEK::VFlowItemRef > m_Slow;
@@ -186,6 +167,7 @@ ZEK::IResult VRecordingSource::VState::MakeSlowItems( const VStateMaker& i_rMake
   m_PointsOf = m_LabelsOf = -1;
   ZEK::IResult Result = MakeAxisItems( i_rMaker, i_Up );
   Result = Result.IsOk() ? MakeSubjectItems( i_rMaker ) : Result;
+  Result = Result.IsOk() ? m_Cameras.MakeSlowItems( i_rMaker, m_Slow ) : Result;
   ZEK::VFlowItemRef Item;
   for ( const VForcePlate& rPlate : m_rRecording.ForcePlates )
   {
@@ -293,7 +275,7 @@ ZEK::IResult VRecordingSource::VState::MakeFastItems( const VStateMaker& i_rMake
   {
     Result = MakeLabels( i_rMaker, i_Index );
   }
-  return Result;
+  return Result.IsOk() ? m_Cameras.MakeFastItems( i_rMaker, i_Index ) : Result;
 }
 
 ZEK::IResult VRecordingSource::VState::AddSamples( const VStateMaker& i_rMaker, std::int64_t i_Index,
@@ -331,6 +313,7 @@ void VRecordingSource::VState::AddItems( const ZEK::VFlowTimeKey& i_rSlowKey, ZE
   {
     io_rState.AddItem( m_Labels );
   }
+  m_Cameras.AddItems( io_rState );
   for ( const ZEK::VFlowItemRef& rItem : m_Slow )
   {
     io_rState.AddItemAt( rItem, i_rSlowKey );

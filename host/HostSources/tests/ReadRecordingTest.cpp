@@ -52,10 +52,12 @@ TEST_F( ReadFile, WhatCannotBeReadIsNamed )
 {
   const auto Pipe = m_Folder.Path() / "pipe.c3d";
   ASSERT_EQ( mkfifo( Pipe.c_str(), 0600 ), 0 );
+  const auto Bare = m_Folder.Path() / "bare";
+  std::filesystem::create_directory( Bare );
   const auto Other = Bytes( "hello, world" );
   const std::tuple< std::filesystem::path, ZEK::IResult, const char* > Cases[] = {
       { m_Folder.Path() / "none.c3d", ZEK::IResult::FileNotFound, "found no such file" },
-      { m_Folder.Path(), ZEK::IResult::FileIOFailure, "found a folder" },
+      { Bare, ZEK::IResult::FileIOFailure, "found a folder" },
       { Pipe, ZEK::IResult::FileIOFailure, "no plain file" },
       { Save( "empty.trc", {} ), ZEK::IResult::EndOfData, "byte offset 0: expected" },
       { Save( "other.txt", Other ), ZEK::IResult::InvalidFormat, "found neither" },

@@ -30,6 +30,17 @@ struct VRecordingInfo
     CoreMoxelTypes::D3 PeakCentre; ///< mm, world; NaN where there is none
   };
 
+  struct VCamera
+  {
+    std::string Name;
+    std::uint32_t Width = 0, Height = 0; ///< px
+    bool bCalibrated = false;
+    std::uint64_t DetectionCount = 0, KnownCount = 0; ///< known: of a point of the recording
+    std::uint64_t FramesSeen = 0;                     ///< frames with a detection
+    std::uint64_t MeasuredCount = 0;
+    double MeanDistance = 0, WorstDistance = 0; ///< of detections from projected points, px
+  };
+
   std::string Name, Format, Form, Unit;
   std::uint64_t PointCount = 0;
   std::vector< std::string > Labels;
@@ -41,6 +52,7 @@ struct VRecordingInfo
   double AnalogRateHz = 0;
   std::vector< VAnalogChannel > AnalogChannels;
   std::vector< VPlate > ForcePlates;
+  std::vector< VCamera > Cameras;
   std::vector< VRecordingEvent > Events;
   EUpAxis UpAxis = EUpAxis::Z;
   std::string UpAxisReason;

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <HostSources/IFrameSource.h>
+#include <HostSources/VRecordingCamera.h>
 
 #include <CoreMoxelTypes/Basic.h>
 
@@ -18,7 +19,8 @@ enum class ERecordingFormat : std::uint32_t
 {
   Unknown,
   C3d,
-  Trc
+  Trc,
+  Folder
 };
 
 /// One point in one frame, in millimetres; all of it NaN where the point is missing.
@@ -113,6 +115,7 @@ struct VRecording
   std::vector< float > Analog; ///< scaled; sample after sample, one a channel
 
   std::vector< VForcePlate > ForcePlates;
+  std::vector< VRecordingCamera > Cameras;
   std::vector< VRecordingEvent > Events;
   std::vector< std::string > Notes; ///< what was odd about the file, as sentences
 

@@ -16,8 +16,9 @@ namespace HostSources
 /// A state holds every valid point in one `FlowReconstructionSet` (Id: number of the point, from 1; points without a
 /// column are numbered on from there), and the named ones in a `FlowReconstructionLabelSet` with one `FlowSubject` a
 /// prefix "Subject:" (the file's stem where there is none); `SubjectId` is the subject's `Id`, from 1, and `MarkerId`
-/// the index into its `Markers`. Beside them stand the up axis, the volume's floor, and each force plate with the
-/// samples of the frame. Coordinates stay as they are when y is up: the view is told by the up axis.
+/// the index into its `Markers`. Beside them stand the up axis, the volume's floor, each force plate with the samples
+/// of the frame, and each camera with its hardware, calibration, centroids, their labels and their assignments (index
+/// into the frame's reconstructions). Coordinates stay as they are when y is up: the view is told by the up axis.
 class VRecordingSource final : public IFrameSource
 {
 public:

@@ -1,0 +1,34 @@
+#pragma once
+
+#include <HostSources/VProgress.h>
+#include <HostSources/VRecording.h>
+
+#include <ZEK/Result.h>
+
+#include <filesystem>
+#include <string>
+
+namespace HostSources
+{
+
+struct VFolderOptions
+{
+  /// How the axes of the 3D points become those of the cameras' world: three letters, each with a sign or without, such
+  /// as "zxy" for world (x, y, z) = points' (z, x, y), or "x-zy". Empty: the turn by quarters of which the projected
+  /// points lie nearest to the detections.
+  std::string WorldAxes;
+};
+
+/// Reads a folder that holds what cameras saw, and joins it with its 3D points and its calibration.
+///
+/// Detections are a table (CSV with sync_index, cam_id, keypoint_id, img_loc_x and img_loc_y) or a folder a camera with
+/// a JSON file a frame (`people`, each with `pose_keypoints_2d`). Points are a table (x_coord, y_coord, z_coord;
+/// metres) or the first TRC or C3D file by name. The calibration is sought in the folder, then in its parent; a camera
+/// without one is there uncalibrated. Notes say what was taken.
+///
+/// Of several persons in the image, the one nearest to the projected points is taken for the subject.
+/// Failures are those of `ReadRecording`; a folder without anything to read is `FileIOFailure`.
+ZEK::IResult ReadFolder( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
+                         const VProgress& i_rProgress = {}, const VFolderOptions& i_rOptions = {} );
+
+} // namespace HostSources
