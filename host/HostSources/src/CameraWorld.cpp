@@ -19,6 +19,8 @@ using CoreMoxelTypes::D3;
 constexpr float LikelyEnough = 0.3f;
 /// A person further away than this part of the image's diagonal is another one.
 constexpr double PersonRange = 0.1;
+/// What a point counts for that a camera cannot see, px: one stray point must not decide for all.
+constexpr double FarAway = 1e4;
 /// What the search for the axes looks at, at the most.
 constexpr std::size_t SampledFrames = 200;
 
@@ -171,7 +173,7 @@ VMean PersonDistance( const VProjection& i_rProjection, std::span< const VRecord
     {
       const D3 Place = Turned( i_rTurn, static_cast< double >( rPoint.x ), static_cast< double >( rPoint.y ),
                                static_cast< double >( rPoint.z ) );
-      Mean.Sum += i_rProjection.Distance( Place, rSeen );
+      Mean.Sum += std::min( i_rProjection.Distance( Place, rSeen ), FarAway );
       ++Mean.Count;
     }
   }
@@ -258,7 +260,12 @@ bool FindAxisTurn( const VRecording& i_rRecording, VAxisTurn& o_rTurn, double& o
       o_rSecond = std::min( o_rSecond, All.Value() );
     }
   }
-  return std::isfinite( o_rDistance );
+  if ( !( o_rDistance < FarAway ) )
+  {
+    o_rTurn = {};
+    return false;
+  }
+  return true;
 }
 
 void TurnRecording( const VAxisTurn& i_rTurn, VRecording& io_rRecording )
