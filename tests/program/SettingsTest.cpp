@@ -4,6 +4,11 @@
 
 #include <gtest/gtest.h>
 
+#include <QtCore/QDeadlineTimer>
+#include <QtCore/QProcess>
+#include <QtCore/QThread>
+
+#include <csignal>
 #include <fstream>
 #include <iterator>
 
@@ -34,4 +39,49 @@ TEST( Program, SettingsGoInAndOutWithoutAWindow )
   EXPECT_EQ( Harrow( { "settings", "list" } ).Output, "x\ttrue\n" );
   EXPECT_EQ( Harrow( { "settings", "get", "nothing" } ).Complaints().size(), 1 );
   EXPECT_EQ( Harrow( { "settings", "frobnicate" } ).Exit, 2 );
+}
+
+namespace
+{
+/// The signals that a process handles itself, as a mask.
+std::uint64_t HandledSignals( qint64 i_Process )
+{
+  std::ifstream Status( "/proc/" + std::to_string( i_Process ) + "/status" );
+  for ( std::string Word; Status >> Word; )
+  {
+    if ( Word == "SigCgt:" && Status >> Word )
+    {
+      return std::stoull( Word, nullptr, 16 );
+    }
+  }
+  return 0;
+}
+} // namespace
+
+TEST( Program, ASessionThatEndsClosesTheWindowAndKeepsItsLayout )
+{
+  HARROW_NEEDS_MODULE();
+  const TestSupport::VTemporaryDir Folder;
+  QProcessEnvironment Own = Environment();
+  Own.insert( "XDG_CONFIG_HOME", QString::fromStdString( Folder.Path().string() ) );
+  QProcess Process;
+  Process.setProcessEnvironment( Own );
+  Process.start( QString::fromStdString( ( TestSupport::BinaryDir() / "bin" / "harrow" ).string() ), QStringList() );
+  ASSERT_TRUE( Process.waitForStarted() );
+  const QDeadlineTimer Patience( 120'000 );
+  while ( ( HandledSignals( Process.processId() ) & 1u << ( SIGTERM - 1 ) ) == 0 && !Patience.hasExpired() )
+  {
+    QThread::msleep( 50 );
+  }
+  Process.terminate();
+  EXPECT_TRUE( Process.waitForFinished( 120'000 ) );
+  EXPECT_EQ( Process.exitStatus(), QProcess::NormalExit );
+  EXPECT_EQ( Process.exitCode(), 0 );
+  int Kept = 0;
+  for ( const auto& rFile : std::filesystem::recursive_directory_iterator( Folder.Path() ) )
+  {
+    Kept += rFile.path().filename() == "preferences.json" ? 1 : 0;
+  }
+  EXPECT_EQ( Kept, 1 );
+  Process.kill();
 }

@@ -1,3 +1,5 @@
+#include "QuitSignals.h"
+
 #include <HostWindow/MainWindow.h>
 
 #include <QtWidgets/QApplication>
@@ -41,6 +43,7 @@ VRunResult RunMainWindow( const VCommonOptions& i_rCommon, const std::vector< st
   }
   Window.OpenFiles( Files );
   Window.show();
+  const VQuitSignals Signals;
   // What the start itself has set is not a change by a person. What there is to tell is shown over everything else.
   (void)Session.Host().Settings().StartSaving();
   return { QApplication::exec(), {} };
