@@ -46,7 +46,7 @@ namespace
 /// The signals that a process handles itself, as a mask.
 std::uint64_t HandledSignals( qint64 i_Process )
 {
-  std::ifstream Status( "/proc/" + std::to_string( i_Process ) + "/status" );
+  std::ifstream Status( std::string( "/proc/" ).append( std::to_string( i_Process ) ).append( "/status" ) );
   for ( std::string Word; Status >> Word; )
   {
     if ( Word == "SigCgt:" && Status >> Word )
