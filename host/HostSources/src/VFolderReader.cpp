@@ -237,7 +237,7 @@ void VJoin::NameCameras()
     const auto It = std::find_if( rKnown.begin(), rKnown.end(),
                                   [&]( const VCalibratedCamera& i_rKnown )
                                   {
-                                    return rCamera.Name.empty() ? i_rKnown.UserId == rCamera.Id
+                                    return rCamera.Name.empty() ? rCamera.Id >= 0 && i_rKnown.UserId == rCamera.Id
                                                                 : Plain( i_rKnown.Name ) == Plain( rCamera.Name );
                                   } );
     const auto Index = static_cast< std::size_t >( It - rKnown.begin() );

@@ -277,6 +277,44 @@ TEST_F( FolderRecording, WithoutCalibrationCentroidsAreThere )
   EXPECT_EQ( ByDevice< FlowCentroidLabelSet >( State( Source, 2 ) ).at( "left" )->Labels[0].MarkerId, 0xFFFFFFFFu );
 }
 
+TEST_F( FolderRecording, CutAndChangedFilesGiveFramesOrAReason )
+{
+  const std::string Table =
+      std::string( Head2d ) + "1,0,0,0,500,400\n1,0,0,1,600,400\n2,0,0,0,500,500\n3,0,0,1,500,400\n";
+  const std::string Frame = R"({"people": [{"pose_keypoints_2d": [10, 20, 0.5, 3e1, 4, 1]}, {"person_id": [-1]}]})";
+  Save( "cameras.toml", OneCamera );
+  const struct
+  {
+    const char* pFile;
+    const std::string& rText;
+  } Files[] = { { "tables/points2d.csv", Table }, { "frames/cam_0/frame.01.json", Frame } };
+  for ( const auto& rFile : Files )
+  {
+    for ( std::size_t Place = 0; Place <= rFile.rText.size(); ++Place )
+    {
+      for ( const char* const pChange : { "", "9e99", "{", "-\n" } )
+      {
+        // The first only cuts; the others stand where a character was.
+        std::string Text = rFile.rText.substr( 0, Place ) + pChange;
+        Text += *pChange && Place < rFile.rText.size() ? rFile.rText.substr( Place + 1 ) : "";
+        const auto Path = Save( rFile.pFile, Text );
+        VRecording Recording;
+        std::string Message;
+        const auto Folder = m_Folder.Path() / *std::filesystem::path( rFile.pFile ).begin();
+        const ZEK::IResult Result = ReadFolder( Folder, Recording, Message );
+        ASSERT_EQ( Result.IsError(), Recording.FrameCount == 0 ) << Text << Message;
+        ASSERT_EQ( Result == ZEK::IResult( ZEK::IResult::Ok ), Message.empty() ) << Text << Message;
+        const auto pRecording = std::make_shared< VRecording >( std::move( Recording ) );
+        VRecordingSource Source( pRecording );
+        for ( std::int64_t Index = 0; Index < std::min< std::int64_t >( Source.FrameCount(), 4 ); ++Index )
+        {
+          State( Source, Index );
+        }
+      }
+    }
+  }
+}
+
 TEST_F( FolderRecording, WhatCannotBeReadIsNamed )
 {
   const struct
