@@ -14,9 +14,10 @@ namespace HostSources
 /// Reads a recording file, or a folder as `ReadFolder` does; what a file is, is told by its content.
 ///
 /// A failure leaves `o_rRecording` empty and says in `o_rMessage` which file it was, where (byte offset or line) and
-/// what was expected: `FileNotFound`, `FileIOFailure` (unreadable, a folder of nothing known), `InvalidFormat`, `EndOfData` (empty, cut
-/// off before the first whole frame, no frames), `AllocationFailure`, `Canceled`. `OkButPartial` gives the frames that
-/// are there of a file that was cut off; the message says how many. What is odd but harmless is in the notes.
+/// what was expected: `FileNotFound`, `FileIOFailure` (unreadable, a folder of nothing known), `InvalidFormat`,
+/// `EndOfData` (empty, cut off before the first whole frame, no frames), `AllocationFailure`, `Canceled`.
+/// `OkButPartial` gives the frames that are there of a file that was cut off; the message says how many. What is odd
+/// but harmless is in the notes.
 ///
 /// Thread: any; the callback runs on the caller's thread.
 ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
