@@ -93,6 +93,15 @@ void AddCommon( CLI::App& io_rApp, VCommonOptions& o_rCommon )
   io_rApp.add_option( "--log", o_rCommon.LogLevel, "Log up to this level: 2 failures, 3 warnings, 6 details" )
       ->check( CLI::Range( 0, 9 ) )
       ->capture_default_str();
+  io_rApp.add_option( "--cameras", o_rCommon.Simulated.Cameras, "Cameras of the simulated capture" )
+      ->check( CLI::Range( 0, 256 ) )
+      ->capture_default_str();
+  io_rApp.add_option( "--performers", o_rCommon.Simulated.Performers, "Performers of the simulated capture" )
+      ->check( CLI::Range( 0, 16 ) )
+      ->capture_default_str();
+  io_rApp.add_option( "--rate", o_rCommon.Simulated.RateHz, "Frames of the simulated capture in a second" )
+      ->check( CLI::Range( 25.0, 1000.0 ) )
+      ->capture_default_str();
   AddOrdered( io_rApp, "--up", "The up axis, in place of the one found in the recording", "y|z",
               [&o_rCommon]( const std::string& i_rText ) -> std::string
               {

@@ -129,7 +129,7 @@ void VSession::GoLive()
   m_bLive = true;
   if ( !m_pLive )
   {
-    m_pLive = std::make_shared< HostSources::VSimulatedCapture >();
+    m_pLive = std::make_shared< HostSources::VSimulatedCapture >( m_Options.Simulated );
     m_pLivePump =
         std::make_unique< HostSources::VSourcePump >( m_pLive, m_pHost->Contexts()->LiveCache(), Maker( LiveClock ) );
     ApplyUpAxis( m_pLivePump.get(), m_pLive.get(), HostSources::EUpAxis::Z );

@@ -169,7 +169,7 @@ TEST( CommandLine, HelpListsEverySubcommandAndEveryAction )
   const VParsed Help = Parse( { "--help" } );
   EXPECT_EQ( Help.Result.Exit, EExitOk );
   for ( const char* pWord : { "open", "render", "info", "--plugin", "--content-root", "--flags", "--profile",
-                              "--developer", "--log", "--up", "Exit codes" } )
+                              "--developer", "--log", "--up", "--cameras", "--performers", "--rate", "Exit codes" } )
   {
     EXPECT_THAT( Help.Result.Output, HasSubstr( pWord ) );
   }

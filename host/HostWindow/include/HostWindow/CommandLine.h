@@ -3,6 +3,7 @@
 #include <HostWindow/ViewAction.h>
 
 #include <HostSources/IFrameSource.h>
+#include <HostSources/VSimulatedCapture.h>
 
 #include <cstdint>
 #include <filesystem>
@@ -43,6 +44,7 @@ struct VCommonOptions
   bool bCoreProfile = true;
   int LogLevel = 3;
   std::optional< HostSources::EUpAxis > Up;
+  HostSources::VSimulatedCaptureOptions Simulated;
 };
 
 struct VRenderOptions
