@@ -53,14 +53,14 @@ ZEK::IResult ReadTrcFile( VFileSource& io_rSource, const std::string& i_rName, V
 } // namespace
 
 ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
-                            const VProgress& i_rProgress )
+                            const VProgress& i_rProgress, const VFolderOptions& i_rFolder )
 {
   o_rRecording = {};
   o_rMessage.clear();
   std::error_code Ignored;
   if ( std::filesystem::is_directory( i_rPath, Ignored ) )
   {
-    return ReadFolder( i_rPath, o_rRecording, o_rMessage, i_rProgress );
+    return ReadFolder( i_rPath, o_rRecording, o_rMessage, i_rProgress, i_rFolder );
   }
   VFileSource Source;
   const ZEK::IResult Opened = Source.Open( i_rPath, o_rMessage );

@@ -102,6 +102,10 @@ void AddCommon( CLI::App& io_rApp, VCommonOptions& o_rCommon )
   io_rApp.add_option( "--rate", o_rCommon.Simulated.RateHz, "Frames of the simulated capture in a second" )
       ->check( CLI::Range( 25.0, 1000.0 ) )
       ->capture_default_str();
+  io_rApp
+      .add_option( "--world-axes", o_rCommon.Folder.WorldAxes,
+                   "How the axes of a folder's 3D points become those of its cameras, such as zxy or x-zy" )
+      ->type_name( "AXES" );
   AddOrdered( io_rApp, "--up", "The up axis, in place of the one found in the recording", "y|z",
               [&o_rCommon]( const std::string& i_rText ) -> std::string
               {
@@ -170,7 +174,7 @@ void AddActions( CLI::App& io_rApp, VRenderOptions& o_rRender )
 void AddRender( CLI::App& io_rApp, VRenderOptions& o_rRender )
 {
   io_rApp.add_option( "--window", o_rRender.Window, "The kind of window, such as 3d" )->capture_default_str();
-  io_rApp.add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC)" )
+  io_rApp.add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC, a folder of cameras)" )
       ->expected( 1, -1 )
       ->capture_default_str()
       ->type_name( "simulated|FILE" );
@@ -232,9 +236,10 @@ std::string CheckTogether( const VCommandLine& i_rLine )
 
 VParseResult ParseCommandLine( int i_Count, const char* const* i_ppArguments, VCommandLine& o_rLine )
 {
-  CLI::App App( "harrow shows motion-capture data: a simulated capture, or recordings in C3D and TRC files.\n"
-                "Without a subcommand it opens a window with a 3D view of the simulated capture.",
-                "harrow" );
+  CLI::App App(
+      "harrow shows motion-capture data: a simulated capture, or recordings (C3D, TRC, folders of what cameras saw).\n"
+      "Without a subcommand it opens a window with a 3D view of the simulated capture.",
+      "harrow" );
   App.set_version_flag( "--version", "harrow 1.0.0" );
   App.set_help_all_flag( "--help-all", "Print the help of every subcommand" );
   App.footer( pFooter );

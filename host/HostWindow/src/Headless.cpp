@@ -45,7 +45,8 @@ VRunResult OpenSource( VSession& io_rSession, const std::string& i_rSource, doub
   {
     const auto pRecording = std::make_shared< HostSources::VRecording >();
     std::string Message;
-    const ZEK::IResult Read = HostSources::ReadRecording( i_rSource, *pRecording, Message );
+    const ZEK::IResult Read =
+        HostSources::ReadRecording( i_rSource, *pRecording, Message, {}, io_rSession.Options().Folder );
     if ( Read.IsError() )
     {
       return Fail( EExitFile, Message.empty() ? i_rSource + ": " + Read.Text() : Message );
@@ -247,7 +248,8 @@ VRunResult RunRender( const VCommonOptions& i_rCommon, const VRenderOptions& i_r
   return RenderOne( Session, i_rRender, Window, QString::fromStdString( i_rRender.Output.string() ), Report );
 }
 
-VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson )
+VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson,
+                    const HostSources::VFolderOptions& i_rFolder )
 {
   VRunResult Result;
   std::vector< std::string > Texts;
@@ -255,7 +257,7 @@ VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson )
   {
     HostSources::VRecording Recording;
     std::string Message;
-    const ZEK::IResult Read = HostSources::ReadRecording( rFile, Recording, Message );
+    const ZEK::IResult Read = HostSources::ReadRecording( rFile, Recording, Message, {}, i_rFolder );
     if ( TellOfReading( rFile, Read, Message, Result ) )
     {
       const HostSources::VRecordingInfo Info = HostSources::DescribeRecording( Recording );

@@ -40,7 +40,7 @@ VMainWindow::VMainWindow( VSession& i_rSession, QWidget* i_pParent )
   : QMainWindow( i_pParent )
   , m_rSession( i_rSession )
   , m_Preferences( i_rSession.Host().Store() )
-  , m_Loader( i_rSession.Host().Postal() )
+  , m_Loader( i_rSession.Host().Postal(), i_rSession.Options().Folder )
 {
   setAcceptDrops( true );
   setDockNestingEnabled( true );

@@ -17,9 +17,11 @@ struct VRecordingLoader::VJob
   ZEK::IResult Result;
 };
 
-VRecordingLoader::VRecordingLoader( std::shared_ptr< ZEK::IPostalService > i_pPostal, QObject* i_pParent )
+VRecordingLoader::VRecordingLoader( std::shared_ptr< ZEK::IPostalService > i_pPostal,
+                                    HostSources::VFolderOptions i_Folder, QObject* i_pParent )
   : QObject( i_pParent )
   , m_pPostal( std::move( i_pPostal ) )
+  , m_Folder( std::move( i_Folder ) )
 {
 }
 
@@ -49,7 +51,7 @@ void VRecordingLoader::Load( const QString& i_rPath )
   m_pJob->Path = i_rPath;
   m_pJob->pLoader = this;
   m_Thread = std::thread(
-      [pPostal = m_pPostal, pJob = m_pJob]
+      [pPostal = m_pPostal, pJob = m_pJob, Folder = m_Folder]
       {
         int LastPercent = -1;
         const auto OnProgress = [&]( double i_Fraction )
@@ -69,8 +71,8 @@ void VRecordingLoader::Load( const QString& i_rPath )
           }
           return !pJob->bCancel;
         };
-        pJob->Result =
-            HostSources::ReadRecording( pJob->Path.toStdString(), *pJob->pRecording, pJob->Message, OnProgress );
+        pJob->Result = HostSources::ReadRecording( pJob->Path.toStdString(), *pJob->pRecording, pJob->Message,
+                                                   OnProgress, Folder );
         pPostal->Post(
             [pJob]
             {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <HostSources/VFolderReader.h>
 #include <HostSources/VProgress.h>
 #include <HostSources/VRecording.h>
 
@@ -11,7 +12,7 @@
 namespace HostSources
 {
 
-/// Reads a recording file, or a folder as `ReadFolder` does; what a file is, is told by its content.
+/// Reads a recording file, or a folder as `ReadFolder` does with the options; what a file is, is told by its content.
 ///
 /// A failure leaves `o_rRecording` empty and says in `o_rMessage` which file it was, where (byte offset or line) and
 /// what was expected: `FileNotFound`, `FileIOFailure` (unreadable, a folder of nothing known), `InvalidFormat`,
@@ -21,6 +22,6 @@ namespace HostSources
 ///
 /// Thread: any; the callback runs on the caller's thread.
 ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
-                            const VProgress& i_rProgress = {} );
+                            const VProgress& i_rProgress = {}, const VFolderOptions& i_rFolder = {} );
 
 } // namespace HostSources

@@ -19,7 +19,8 @@ struct VRunResult
 VRunResult RunRender( const VCommonOptions& i_rCommon, const VRenderOptions& i_rRender );
 
 /// Prints what each recording holds to stdout. Needs no application object. All files are tried.
-VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson );
+VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson,
+                    const HostSources::VFolderOptions& i_rFolder );
 
 /// Prints the cameras of each calibration, with the models that views draw them with, to stdout as JSON. Needs no
 /// application object. All files are tried.

@@ -39,6 +39,7 @@ public:
   /// The name under which a window of that kind is published: "3d" stands for "3D View". Empty when there is none.
   std::string FindWindowKind( const std::string& i_rText ) const;
 
+  const VCommonOptions& Options() const { return m_Options; }
   /// The views show the simulated capture.
   void GoLive();
   /// The views show this recording, from its first frame. Without `i_bShow` they stay live if they are, and show it
