@@ -108,8 +108,8 @@ TEST( Limits, OneMoreIsRefusedByImportAndExport )
   // By nesting, and by the names alone.
   EXPECT_EQ( Settings.Import( Deep( MaximumComponents + 1, R"({"Value":1,"Type":"Int32"})" ) ),
              IResult::InvalidFormat );
-  EXPECT_EQ( Settings.Import( Whole( "\"" + PathOf( 500 ) + R"(":{"Children":{")" + PathOf( 13 ) +
-                                     R"(":{"Value":1,"Type":"Int32"}}})" ) ),
+  EXPECT_EQ( Settings.Import( Whole( std::string( "\"" ).append( PathOf( 500 ) ) + R"(":{"Children":{")" +
+                                     PathOf( 13 ) + R"(":{"Value":1,"Type":"Int32"}}})" ) ),
              IResult::InvalidFormat );
   EXPECT_EQ( Settings.Import( Whole( R"("l":)" + Lists( 65 ) ) ), IResult::InvalidFormat );
   EXPECT_EQ( Settings.Text(), Whole( "" ) );
