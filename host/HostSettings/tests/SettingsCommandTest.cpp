@@ -156,24 +156,22 @@ TEST_F( Settings, LinesOfCommands )
     std::string m_Output;
     std::string m_Error;
   };
-  const VRow Rows[] = { { { "set", "a", "-7" }, 0, Ok, "" },
-                        { { "get", "a" }, 0, "-7\n", "" },
-                        { { "set", "--type", "String", "b", "--set" }, 0, Ok, "" },
-                        { { "set", "b", "--x=y", "--type=String" }, 0, Ok, "" },
-                        { { "set", "set", "set" }, 0, Ok, "" },
-                        { { "list" }, 0, "a\t-7\nb\t\"--x=y\"\nset\t\"set\"\n", "" },
-                        { { "get", "c" }, 5, "", "harrow: " + Text( IResult::NotFound ) + "\n" },
-                        { { "get", "a", "--store", m_Folder.Path() / "none" },
-                          5,
-                          "",
-                          "harrow: " + ( m_Folder.Path() / "none" ).string() + ": " + Text( IResult::FileNotFound ) +
-                              "\nharrow: " + Text( IResult::FileNotFound ) + "\n" },
-                        { { "set", "a" }, 2, "", "harrow: value is required\n" },
-                        { {}, 2, "", "harrow: A subcommand is required\n" },
-                        { { "set", "a", "1", "--typ" },
-                          2,
-                          "",
-                          "harrow: The following argument was not expected: --typ\n" } };
+  const VRow Rows[] = {
+      { { "set", "a", "-7" }, 0, Ok, "" },
+      { { "get", "a" }, 0, "-7\n", "" },
+      { { "set", "--type", "String", "b", "--set" }, 0, Ok, "" },
+      { { "set", "b", "--x=y", "--type=String" }, 0, Ok, "" },
+      { { "set", "set", "set" }, 0, Ok, "" },
+      { { "list" }, 0, "a\t-7\nb\t\"--x=y\"\nset\t\"set\"\n", "" },
+      { { "get", "c" }, 5, "", "harrow: " + Text( IResult::NotFound ) + "\n" },
+      { { "get", "a", "--store", m_Folder.Path() / "none" },
+        5,
+        "",
+        "harrow: " + ( m_Folder.Path() / "none" ).string() + ": " + Text( IResult::FileNotFound ) +
+            "\nharrow: " + Text( IResult::FileNotFound ) + "\n" },
+      { { "set", "a" }, 2, "", "harrow: value is required\n" },
+      { {}, 2, "", "harrow: A subcommand is required\n" },
+      { { "set", "a", "1", "--typ" }, 2, "", "harrow: The following argument was not expected: --typ\n" } };
   for ( const VRow& rRow : Rows )
   {
     std::ostringstream Output;
