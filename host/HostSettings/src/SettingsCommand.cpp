@@ -33,10 +33,10 @@ IResult ImportInto( StoreIO::VStoreImporterJson& io_rImporter, IStore& io_rStore
 }
 
 /// The settings file as a store, and back. With a lock nobody else saves the file in between.
-class VSettingsFile
+class VStoredSettings
 {
 public:
-  explicit VSettingsFile( std::string i_Path )
+  explicit VStoredSettings( std::string i_Path )
     : m_Path( std::move( i_Path ) )
   {
   }
@@ -116,7 +116,7 @@ IResult Import( const VSettingsCommand& i_rCommand, VSettingsOutcome& o_rOutcome
   }
   // A first run shows whether all of it is good.
   Result = ImportInto( Importer, *MakeStore() );
-  VSettingsFile File( i_rCommand.m_Store );
+  VStoredSettings File( i_rCommand.m_Store );
   if ( Result.IsOk() )
   {
     Result = File.LoadLocked( o_rOutcome.m_Errors );
@@ -132,7 +132,7 @@ IResult Import( const VSettingsCommand& i_rCommand, VSettingsOutcome& o_rOutcome
 
 IResult Export( const VSettingsCommand& i_rCommand, VSettingsOutcome& o_rOutcome )
 {
-  VSettingsFile File( i_rCommand.m_Store );
+  VStoredSettings File( i_rCommand.m_Store );
   IResult Result = File.Load( o_rOutcome.m_Errors );
   StoreIO::VStoreExporterJson Exporter;
   if ( Result.IsOk() )
@@ -153,7 +153,7 @@ const VTypedValue& ValueOf( const IStoreReader& i_rReader, Entry i_pEntry )
 
 IResult Get( const VSettingsCommand& i_rCommand, VSettingsOutcome& o_rOutcome )
 {
-  VSettingsFile File( i_rCommand.m_Store );
+  VStoredSettings File( i_rCommand.m_Store );
   const IResult Loaded = File.Load( o_rOutcome.m_Errors );
   if ( Loaded.IsError() )
   {
@@ -175,7 +175,7 @@ IResult Get( const VSettingsCommand& i_rCommand, VSettingsOutcome& o_rOutcome )
 
 IResult List( const VSettingsCommand& i_rCommand, VSettingsOutcome& o_rOutcome )
 {
-  VSettingsFile File( i_rCommand.m_Store );
+  VStoredSettings File( i_rCommand.m_Store );
   const IResult Loaded = File.Load( o_rOutcome.m_Errors );
   if ( Loaded.IsError() )
   {
@@ -241,7 +241,7 @@ IResult Set( const VSettingsCommand& i_rCommand, VSettingsOutcome& o_rOutcome )
   {
     return IResult::InvalidName;
   }
-  VSettingsFile File( i_rCommand.m_Store );
+  VStoredSettings File( i_rCommand.m_Store );
   IResult Result = File.LoadLocked( o_rOutcome.m_Errors );
   if ( Result.IsOk() )
   {

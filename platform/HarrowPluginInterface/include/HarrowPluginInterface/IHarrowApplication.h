@@ -35,7 +35,7 @@ class IHarrowApplication
 public:
   virtual ~IHarrowApplication() = default;
   virtual std::shared_ptr< IHarrowPaths > Paths() = 0;
-  /// Null until the host has a settings store.
+  /// Null in a host without settings.
   virtual std::shared_ptr< ZEK::IStore > Store() = 0;
   virtual std::shared_ptr< IWidgetService > WidgetService() = 0; ///< may be null
   virtual std::shared_ptr< ZEK::IPostalService > PostalService() = 0;
