@@ -211,6 +211,16 @@ void VMoxelScene::RenderPass( CoreGraphics::VRenderContext& io_rContext, const V
   io_rContext.CheckErrors();
 }
 
+void VMoxelScene::DrawTiles( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions )
+{
+  io_rContext.CheckErrors();
+  for ( const auto& rpType : m_RenderList )
+  {
+    rpType->RenderTiles( io_rContext, i_rOptions );
+  }
+  io_rContext.CheckErrors();
+}
+
 void VMoxelScene::DrawPost( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions )
 {
   io_rContext.CheckErrors();

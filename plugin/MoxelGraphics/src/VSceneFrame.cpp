@@ -229,12 +229,34 @@ void VSceneFrame::UpdateCamera()
   m_pController->Apply( *m_pContext );
 }
 
+void VSceneFrame::DrawAllTiles()
+{
+  if ( !m_Input.Tiles )
+  {
+    return;
+  }
+  for ( const VCameraTile& rTile : *m_Input.Tiles )
+  {
+    ApplyTile( rTile, *m_pContext );
+    m_Input.Options.OverlayCamera = rTile.DeviceURN;
+    m_pScene->DrawScene( *m_pContext, m_Input.Options );
+  }
+  m_Input.Options.OverlayCamera.clear();
+  const QRect Frame( QPoint( 0, 0 ), m_Size );
+  m_pContext->SetViewport( Frame );
+  m_pContext->SetScissor( Frame );
+  m_pScene->DrawTiles( *m_pContext, m_Input.Options );
+}
+
 void VSceneFrame::DrawView()
 {
   m_pScene->Clear( *m_pContext, m_Input.Options );
   m_pContext->SetLightVector( LightDirection( m_pContext->YUp() ) );
-  // A camera view draws its scene once for each tile of its grid, and without a grid not at all.
-  if ( !m_Input.Options.CameraView )
+  if ( m_Input.Options.CameraView )
+  {
+    DrawAllTiles();
+  }
+  else
   {
     m_pScene->DrawScene( *m_pContext, m_Input.Options );
   }

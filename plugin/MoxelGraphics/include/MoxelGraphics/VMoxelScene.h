@@ -113,6 +113,8 @@ public:
   void Clear( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   void DrawScene( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   void RenderPass( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, std::uint32_t i_Pass );
+  /// After the last tile of a camera view: every type draws what it collected from them.
+  void DrawTiles( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   void DrawPost( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   bool WantsPaint( const VSceneOptions& i_rOptions ) const;
   void Paint( QPainter& io_rPainter, CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <MoxelGraphics/ETracking.h>
+#include <MoxelGraphics/VCameraTile.h>
 #include <MoxelGraphics/VSceneOptions.h>
 #include <MoxelGraphics/VSelectionRegistry.h>
 
@@ -37,6 +38,7 @@ struct VFrameInput
   bool bVisible = true;
   bool bReporting = false; ///< measure with glFinish after each stage
   VSceneOptions Options;
+  VCameraTilesRef Tiles; ///< of a camera view; null: it shows nothing
   QPoint Pointer;
   QPoint BandStart;
   int PickMode = EPickNone;
@@ -122,6 +124,7 @@ private:
   void Draw( const QRect& i_rScissor );
   void Highlight();
   void DrawView();
+  void DrawAllTiles();
   void PaintOverlay( const QOpenGLFramebufferObject& i_rTarget );
 
   std::shared_ptr< VMoxelScene > m_pScene;
