@@ -15,6 +15,27 @@
 
 namespace MoxelGraphics
 {
+namespace
+{
+/// A rectangle of the frame in one of another size.
+QRect InFrame( const QRect& i_rRect, QSize i_From, QSize i_To )
+{
+  if ( i_From == i_To )
+  {
+    return i_rRect;
+  }
+  const auto X = [&]( int i_X )
+  {
+    return static_cast< int >( std::round( static_cast< double >( i_X ) * i_To.width() / i_From.width() ) );
+  };
+  const auto Y = [&]( int i_Y )
+  {
+    return static_cast< int >( std::round( static_cast< double >( i_Y ) * i_To.height() / i_From.height() ) );
+  };
+  const int Left = X( i_rRect.x() ), Bottom = Y( i_rRect.y() );
+  return { Left, Bottom, X( i_rRect.x() + i_rRect.width() ) - Left, Y( i_rRect.y() + i_rRect.height() ) - Bottom };
+}
+} // namespace
 
 bool VSceneFrame::IsBand() const
 {
@@ -77,15 +98,35 @@ void VSceneFrame::Highlight()
   m_pScene->SetHighlighted( bDrawn );
 }
 
-void VSceneFrame::Draw( const QRect& i_rScissor )
+const VCameraTile* VSceneFrame::TileUnder( QPoint i_Point ) const
+{
+  const bool bTiles = m_Input.Options.CameraView && m_Input.Tiles;
+  // A pointer at the very edge is rounded out of the frame.
+  const QPoint Inside( std::min( i_Point.x(), m_Size.width() - 1 ), std::min( i_Point.y(), m_Size.height() - 1 ) );
+  const int Index = bTiles ? TileAt( *m_Input.Tiles, { Inside.x(), m_Size.height() - 1 - Inside.y() } ) : -1;
+  return Index < 0 ? nullptr : &( *m_Input.Tiles )[static_cast< std::size_t >( Index )];
+}
+
+void VSceneFrame::Draw( const QRect& i_rScissor, const VCameraTile* i_pTile )
 {
   m_DirtyMask |= i_rScissor;
   m_pScene->Clear( *m_pContext, m_Input.Options, i_rScissor );
-  // What is not to be seen is not to be picked either.
   if ( !m_Input.Options.CameraView )
   {
     m_pScene->DrawScene( *m_pContext, m_Input.Options );
+    return;
   }
+  // What is not to be seen is not to be picked either.
+  const QRect Frame( QPoint( 0, 0 ), m_pContext->FrameSize() );
+  const QRect Part = i_pTile ? i_rScissor.intersected( InFrame( i_pTile->Rect, m_Size, Frame.size() ) ) : QRect();
+  if ( Part.isEmpty() )
+  {
+    return;
+  }
+  DrawTile( *i_pTile, InFrame( i_pTile->Viewport, m_Size, Frame.size() ), Part );
+  m_pContext->SetViewport( Frame );
+  m_pContext->SetScissor( i_rScissor );
+  m_pScene->DrawTiles( *m_pContext, m_Input.Options );
 }
 
 void VSceneFrame::PickPoint()
@@ -99,7 +140,7 @@ void VSceneFrame::PickPoint()
   }
   m_Pixels.assign( static_cast< std::size_t >( Window.width() ) * static_cast< std::size_t >( Window.height() ), 0 );
   m_pScene->SetIgnoredIds( {} );
-  Draw( Window );
+  Draw( Window, TileUnder( m_Input.Pointer ) );
   m_pContext->ReadPixels( Window, m_Pixels.data(), GL_RGBA );
 
   float Nearest = std::numeric_limits< float >::max();
@@ -127,10 +168,20 @@ void VSceneFrame::PickPoint()
 int VSceneFrame::PickBand()
 {
   constexpr double Scale = 0.5;
+  const VCameraTile* pTile = TileUnder( m_Input.Pointer );
+  // A hand that slips off all tiles goes on with the one where it began.
+  pTile = pTile ? pTile : TileUnder( m_Input.BandStart );
   const auto Scaled = [&]( QPoint i_Point )
   {
-    return QPoint( static_cast< int >( std::round( i_Point.x() * Scale ) ),
-                   static_cast< int >( std::round( ( m_Size.height() - i_Point.y() ) * Scale ) ) );
+    QPoint Point( i_Point.x(), m_Size.height() - i_Point.y() );
+    if ( pTile )
+    {
+      const QRect& rRect = pTile->Rect;
+      Point.setX( std::clamp( Point.x(), rRect.x(), rRect.x() + rRect.width() ) );
+      Point.setY( std::clamp( Point.y(), rRect.y(), rRect.y() + rRect.height() ) );
+    }
+    return QPoint( static_cast< int >( std::round( Point.x() * Scale ) ),
+                   static_cast< int >( std::round( Point.y() * Scale ) ) );
   };
   const QRect Frame( 0, 0, static_cast< int >( std::round( m_Size.width() * Scale ) ),
                      static_cast< int >( std::round( m_Size.height() * Scale ) ) );
@@ -155,7 +206,7 @@ int VSceneFrame::PickBand()
     }
   };
   Remember( true );
-  const int Layers = PickLayers( Band );
+  const int Layers = PickLayers( Band, pTile );
   Remember( false );
   m_pContext->SetFrameSize( m_Size );
   m_pContext->SetViewport( Viewport );
@@ -163,7 +214,7 @@ int VSceneFrame::PickBand()
   return Layers;
 }
 
-int VSceneFrame::PickLayers( const QRect& i_rBand )
+int VSceneFrame::PickLayers( const QRect& i_rBand, const VCameraTile* i_pTile )
 {
   constexpr int MaximumLayers = 16;
   m_Pixels.resize( static_cast< std::size_t >( i_rBand.width() ) * static_cast< std::size_t >( i_rBand.height() ) );
@@ -173,7 +224,7 @@ int VSceneFrame::PickLayers( const QRect& i_rBand )
   while ( bNew && Layers < MaximumLayers )
   {
     ++Layers;
-    Draw( i_rBand );
+    Draw( i_rBand, i_pTile );
     m_pContext->ReadPixels( i_rBand, m_Pixels.data(), GL_RGBA );
     bNew = false;
     std::uint32_t Last = 0;
@@ -188,14 +239,31 @@ int VSceneFrame::PickLayers( const QRect& i_rBand )
       Last = Id;
     }
   }
+  PickAnalytically( i_rBand, i_pTile );
+  m_pScene->SetIgnoredIds( {} );
+  return Layers;
+}
+
+void VSceneFrame::PickAnalytically( const QRect& i_rBand, const VCameraTile* i_pTile )
+{
+  if ( m_Input.Options.CameraView && !i_pTile )
+  {
+    return;
+  }
+  if ( i_pTile )
+  {
+    ApplyTile( *i_pTile, *m_pContext );
+    m_pContext->SetViewport( InFrame( i_pTile->Viewport, m_Size, m_pContext->FrameSize() ) );
+    m_pContext->SetScissor( i_rBand );
+    m_Input.Options.OverlayCamera = i_pTile->DeviceURN;
+  }
   m_Analytic.clear();
   m_pScene->PickInRect( *m_pContext, m_Input.Options, i_rBand, m_Analytic );
+  m_Input.Options.OverlayCamera.clear();
   for ( const std::uint32_t Id : m_Analytic )
   {
     Take( Id & EIdMask );
   }
-  m_pScene->SetIgnoredIds( {} );
-  return Layers;
 }
 
 bool VSceneFrame::Take( std::uint32_t i_Id )

@@ -2,6 +2,7 @@
 
 #include "VSynced.h"
 
+#include <MoxelGraphics/VCameraGrid.h>
 #include <MoxelGraphics/VMoxelScene.h>
 
 #include <CoreGraphics/VCameraController.h>
@@ -38,6 +39,12 @@ void VSceneFramebufferObject::MouseGesture( int i_Kind, const QMouseEvent& i_rEv
   if ( !m_Options.CameraView )
   {
     Gesture( { static_cast< VGesture::EKind >( i_Kind ), 0, Ratio(), std::unique_ptr< QEvent >( i_rEvent.clone() ) } );
+  }
+  else if ( VCameraGrid* const pGrid = Grid() )
+  {
+    i_Kind == VGesture::EPress  ? static_cast< void >( pGrid->MousePress( i_rEvent, Ratio() ) )
+    : i_Kind == VGesture::EMove ? static_cast< void >( pGrid->MouseMove( i_rEvent, Ratio() ) )
+                                : pGrid->MouseRelease( i_rEvent );
   }
 }
 
@@ -196,6 +203,10 @@ void VSceneFramebufferObject::mouseUngrabEvent()
         }
         return false;
       } );
+  if ( m_pCameraGrid )
+  {
+    m_pCameraGrid->EndGesture();
+  }
   // A camera that went on with its gesture would jump at the next press.
   const CoreGraphics::VCameraFields& rCamera = m_pHandCamera->Fields();
   if ( rCamera.panning || rCamera.orbiting || rCamera.zooming )
@@ -215,6 +226,11 @@ void VSceneFramebufferObject::mouseDoubleClickEvent( QMouseEvent* i_pEvent )
     // The first of the two clicks may still wait for its pick.
     m_bPreviewPicked = true;
   }
+  else if ( VCameraGrid* const pGrid = Grid() )
+  {
+    pGrid->DoubleClick( *i_pEvent, Ratio() );
+    Refresh();
+  }
 }
 
 void VSceneFramebufferObject::wheelEvent( QWheelEvent* i_pEvent )
@@ -223,13 +239,19 @@ void VSceneFramebufferObject::wheelEvent( QWheelEvent* i_pEvent )
   {
     Gesture( { VGesture::EWheel, 0, Ratio(), std::unique_ptr< QEvent >( i_pEvent->clone() ) } );
   }
+  else if ( VCameraGrid* const pGrid = Grid() )
+  {
+    pGrid->Wheel( *i_pEvent, Ratio() );
+  }
   i_pEvent->accept();
   Refresh();
 }
 
 void VSceneFramebufferObject::keyPressEvent( QKeyEvent* i_pEvent )
 {
-  const bool bTaken = !m_Options.CameraView && Gesture( { VGesture::EKey, i_pEvent->key(), Ratio(), nullptr } );
+  VCameraGrid* const pGrid = Grid();
+  const bool bTaken = m_Options.CameraView ? pGrid && pGrid->KeyPress( *i_pEvent )
+                                           : Gesture( { VGesture::EKey, i_pEvent->key(), Ratio(), nullptr } );
   TakeModifiers( i_pEvent->modifiers() );
   i_pEvent->setAccepted( bTaken );
   Refresh();

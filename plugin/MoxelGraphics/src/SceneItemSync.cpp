@@ -14,6 +14,11 @@ namespace
 {
 constexpr std::size_t ToolTipLines = 20;
 
+bool IsDevice( const ZEK::VSelectionItem& i_rItem )
+{
+  return i_rItem.Kind == ZEK::ESelectDevice;
+}
+
 QPoint DevicePoint( const QPointF& i_rPoint, double i_Ratio )
 {
   return { static_cast< int >( std::round( i_rPoint.x() * i_Ratio ) ),
@@ -104,6 +109,7 @@ void VSceneFramebufferObject::Exchange( VSceneFrame& io_rFrame )
   CollectOverlay( io_rFrame );
   PassGestures();
   TakeResult( io_rFrame );
+  ExchangeTiles( io_rFrame );
   GiveOrders( io_rFrame );
   *m_pHandCamera = *m_pController;
   if ( m_pManipulatorSource )
@@ -231,9 +237,15 @@ void VSceneFramebufferObject::ApplyPick( const VPickResult& i_rResult )
   m_PickedLabels = i_rResult.Labels;
   if ( pService )
   {
-    pService->Set(
-        ZEK::ISelectionService::EPrimary,
-        ZEK::EditSelection( pService->Get( ZEK::ISelectionService::EPrimary ), i_rResult.Selection, i_rResult.Edit ) );
+    const ZEK::VSelection Former = pService->Get( ZEK::ISelectionService::EPrimary );
+    ZEK::VSelection Selection = ZEK::EditSelection( Former, i_rResult.Selection, i_rResult.Edit );
+    // The selected cameras are those that a camera view shows: what is picked in their images leaves them selected.
+    if ( m_Options.CameraView && !std::any_of( i_rResult.Selection.begin(), i_rResult.Selection.end(), IsDevice ) )
+    {
+      std::erase_if( Selection, IsDevice );
+      std::copy_if( Former.begin(), Former.end(), std::inserter( Selection, Selection.begin() ), IsDevice );
+    }
+    pService->Set( ZEK::ISelectionService::EPrimary, std::move( Selection ) );
   }
   const bool bPreview = std::exchange( m_bPreviewPicked, false );
   if ( const QString URN = bPreview && m_pScene ? m_pScene->GetSelectedCameraURN() : QString(); !URN.isEmpty() )

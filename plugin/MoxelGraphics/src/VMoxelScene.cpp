@@ -11,6 +11,8 @@
 
 #include <QtGui/QPainter>
 
+#include <unordered_set>
+
 namespace MoxelGraphics
 {
 
@@ -253,7 +255,7 @@ void VMoxelScene::Paint( QPainter& io_rPainter, CoreGraphics::VRenderContext& io
       rpType->Paint( io_rPainter, io_rContext, i_rOptions );
     }
   }
-  if ( m_bDeveloperMode )
+  if ( m_bDeveloperMode && i_rOptions.OverlayCamera.isEmpty() )
   {
     PaintStatistics( io_rPainter, io_rContext );
   }
@@ -312,11 +314,13 @@ void VMoxelScene::AddRenderCallback( std::shared_ptr< VRenderCallback > i_pCallb
 
 void VMoxelScene::SetCameraDefinitions( std::vector< VCameraDefinition > i_Definitions )
 {
-  std::sort( i_Definitions.begin(), i_Definitions.end(),
-             []( const VCameraDefinition& i_rLeft, const VCameraDefinition& i_rRight )
-             {
-               return i_rLeft.DeviceURN < i_rRight.DeviceURN;
-             } );
+  std::stable_sort( i_Definitions.begin(), i_Definitions.end(), StandsBefore );
+  std::unordered_set< std::string > Met;
+  std::erase_if( i_Definitions,
+                 [&Met]( const VCameraDefinition& i_rDefinition )
+                 {
+                   return !Met.insert( i_rDefinition.DeviceURN ).second;
+                 } );
   if ( i_Definitions != m_CameraDefinitions )
   {
     m_CameraDefinitions = std::move( i_Definitions );

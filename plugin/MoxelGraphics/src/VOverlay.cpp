@@ -102,8 +102,7 @@ bool VOverlay::CollectCameras( VMoxelScene& io_rScene )
     const bool bPreselected = HoldsDevice( m_Preselected, rDefinition.DeviceURN );
     bHeld = bHeld || bSelected || bPreselected;
     const QVector4D Clip = ToClip( { rDefinition.Position[0], rDefinition.Position[1], rDefinition.Position[2] } );
-    const bool bTwice = !m_NewCameras.empty() && m_NewCameras.back().DeviceURN == rDefinition.DeviceURN;
-    if ( rDefinition.bCalibrated && !bTwice && IsInFront( Clip ) )
+    if ( rDefinition.bCalibrated && IsInFront( Clip ) )
     {
       const QPointF Place = ToItem( Clip );
       const auto Depth = static_cast< float >( ( Clip.z() / Clip.w() + 1 ) / 2 );

@@ -237,15 +237,25 @@ void VSceneFrame::DrawAllTiles()
   }
   for ( const VCameraTile& rTile : *m_Input.Tiles )
   {
-    ApplyTile( rTile, *m_pContext );
-    m_Input.Options.OverlayCamera = rTile.DeviceURN;
-    m_pScene->DrawScene( *m_pContext, m_Input.Options );
+    if ( !rTile.Rect.isEmpty() )
+    {
+      DrawTile( rTile, rTile.Viewport, rTile.Rect );
+    }
   }
-  m_Input.Options.OverlayCamera.clear();
   const QRect Frame( QPoint( 0, 0 ), m_Size );
   m_pContext->SetViewport( Frame );
   m_pContext->SetScissor( Frame );
   m_pScene->DrawTiles( *m_pContext, m_Input.Options );
+}
+
+void VSceneFrame::DrawTile( const VCameraTile& i_rTile, const QRect& i_rViewport, const QRect& i_rScissor )
+{
+  ApplyTile( i_rTile, *m_pContext );
+  m_pContext->SetViewport( i_rViewport );
+  m_pContext->SetScissor( i_rScissor );
+  m_Input.Options.OverlayCamera = i_rTile.DeviceURN;
+  m_pScene->DrawScene( *m_pContext, m_Input.Options );
+  m_Input.Options.OverlayCamera.clear();
 }
 
 void VSceneFrame::DrawView()
@@ -294,8 +304,31 @@ void VSceneFrame::PaintOverlay( const QOpenGLFramebufferObject& i_rTarget )
     Painter.setBrush( QColor( 75, 120, 170, 64 ) );
     Painter.drawRect( QRectF( m_Input.BandStart, m_Input.Pointer ).normalized() );
   }
+  PaintTiles( Painter );
   m_pScene->Paint( Painter, *m_pContext, m_Input.Options );
   Painter.end();
+}
+
+void VSceneFrame::PaintTiles( QPainter& io_rPainter )
+{
+  if ( !m_Input.Options.CameraView || !m_Input.Tiles || !m_pScene->WantsPaint( m_Input.Options ) )
+  {
+    return;
+  }
+  for ( const VCameraTile& rTile : *m_Input.Tiles )
+  {
+    const QRect& rRect = rTile.Rect;
+    io_rPainter.save();
+    io_rPainter.setClipRect( rRect.x(), m_Size.height() - rRect.y() - rRect.height(), rRect.width(), rRect.height() );
+    // The context's viewport is the painter's too.
+    io_rPainter.beginNativePainting();
+    ApplyTile( rTile, *m_pContext );
+    io_rPainter.endNativePainting();
+    m_Input.Options.OverlayCamera = rTile.DeviceURN;
+    m_pScene->Paint( io_rPainter, *m_pContext, m_Input.Options );
+    io_rPainter.restore();
+  }
+  m_Input.Options.OverlayCamera.clear();
 }
 
 void VSceneFrame::ReadGl( const QOpenGLFramebufferObject& i_rTarget )

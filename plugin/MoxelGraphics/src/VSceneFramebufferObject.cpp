@@ -5,6 +5,7 @@
 #include "VSceneFramebufferRenderer.h"
 #include "VSynced.h"
 
+#include <MoxelGraphics/VCameraGrid.h>
 #include <MoxelGraphics/VMoxelScene.h>
 
 #include <CoreGraphics/VCameraController.h>
@@ -93,7 +94,7 @@ void VSceneFramebufferObject::FollowWindow( QQuickWindow* i_pWindow )
                                     i_pWindow, &QQuickWindow::afterAnimating, this,
                                     [this]
                                     {
-                                      HandOver( this );
+                                      PrepareMeeting();
                                     },
                                     Qt::DirectConnection )
                               : QMetaObject::Connection();
@@ -104,6 +105,10 @@ void VSceneFramebufferObject::itemChange( ItemChange i_Change, const ItemChangeD
   if ( i_Change == ItemSceneChange )
   {
     FollowWindow( i_rData.window );
+  }
+  if ( i_Change == ItemSceneChange || i_Change == ItemDevicePixelRatioHasChanged )
+  {
+    ResizeGrid();
   }
   QQuickFramebufferObject::itemChange( i_Change, i_rData );
 }
@@ -181,12 +186,17 @@ void VSceneFramebufferObject::SetScene( QObject* i_pScene )
   m_pScene = std::move( pShared );
   m_pManipulatorSource = dynamic_cast< IManipulatorSource* >( m_pScene.get() );
   m_Manipulators = {};
+  m_pSynced->CameraGeneration = VSynced::NoGeneration;
   update();
 }
 
 void VSceneFramebufferObject::SetPreviewCamera( const QString& i_rURN )
 {
   Change( m_PreviewCamera, i_rURN, &VSceneFramebufferObject::PreviewCameraChanged );
+  if ( m_pCameraGrid && !i_rURN.isEmpty() )
+  {
+    m_pCameraGrid->SetShownCameras( { i_rURN } );
+  }
   update();
 }
 
@@ -262,6 +272,7 @@ void VSceneFramebufferObject::SetOptions( const VSceneOptions& i_rOptions )
   const bool bOtherAxis = i_rOptions.YUp != m_Options.YUp;
   m_Options = i_rOptions;
   WriteSceneOptions( m_Options, *m_pOptionsMap );
+  PassGridOptions();
   if ( m_pScene && bOtherAxis )
   {
     m_pScene->SetYUp( m_Options.YUp );
@@ -274,6 +285,7 @@ void VSceneFramebufferObject::OnSceneOptionsMapChanged( const QString& i_rKey, c
 {
   TakeOver( this );
   ReadSceneOptions( *m_pOptionsMap, m_Options );
+  PassGridOptions();
   if ( m_pScene && i_rKey == QLatin1String( "YUp" ) )
   {
     m_pScene->SetYUp( m_Options.YUp );
@@ -294,6 +306,7 @@ QVariantMap VSceneFramebufferObject::frameReport() const
                       { "bytes_uploaded", QVariant::fromValue( rFigures.BytesUploaded ) },
                       { "gl", m_pSynced->Gl },
                       { "frames", QVariant::fromValue( rFigures.Frames ) },
+                      { "tiles", TilesReport() },
                       { "labels", Texts( m_PreselectionLabels ) },
                       { "picked_labels", Texts( m_PickedLabels ) },
                       { "notice", m_Notice } };

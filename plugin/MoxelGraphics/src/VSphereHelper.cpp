@@ -239,12 +239,14 @@ bool VSphereHelper::Feed( CoreGraphics::VRenderContext& io_rContext, VSphereBatc
 void VSphereHelper::PickInRect( const CoreGraphics::VRenderContext& i_rContext, const QRect& i_rRect,
                                 std::vector< std::uint32_t >& io_rIds ) const
 {
-  const float Width = static_cast< float >( i_rContext.FrameSize().width() );
-  const float Height = static_cast< float >( i_rContext.FrameSize().height() );
-  const float Left = 2.0f * static_cast< float >( i_rRect.left() ) / Width - 1.0f;
-  const float Right = 2.0f * static_cast< float >( i_rRect.left() + i_rRect.width() ) / Width - 1.0f;
-  const float Bottom = 2.0f * static_cast< float >( i_rRect.top() ) / Height - 1.0f;
-  const float Top = 2.0f * static_cast< float >( i_rRect.top() + i_rRect.height() ) / Height - 1.0f;
+  const QRect& rViewport = i_rContext.Viewport();
+  const float Width = static_cast< float >( rViewport.width() );
+  const float Height = static_cast< float >( rViewport.height() );
+  const QRect Rect = i_rRect.translated( -rViewport.topLeft() );
+  const float Left = 2.0f * static_cast< float >( Rect.left() ) / Width - 1.0f;
+  const float Right = 2.0f * static_cast< float >( Rect.left() + Rect.width() ) / Width - 1.0f;
+  const float Bottom = 2.0f * static_cast< float >( Rect.top() ) / Height - 1.0f;
+  const float Top = 2.0f * static_cast< float >( Rect.top() + Rect.height() ) / Height - 1.0f;
   for ( const VDrawn& rDrawn : m_Drawn )
   {
     std::uint32_t Id = rDrawn.pBatch->FirstId();

@@ -28,6 +28,11 @@ struct VSceneFramebufferObject::VSynced
   bool bFitUnderWay = false; ///< a renderer was asked to frame the selection and may not have done so yet
   VOverlay Overlay;
   bool bOverlayPosted = false;
+  static constexpr std::uint64_t NoGeneration = ~std::uint64_t( 0 );
+  std::uint64_t CameraGeneration = NoGeneration; ///< of the definitions that the grid was given
+  VCameraTilesRef Tiles;                         ///< of the last frame, and what it was drawn with
+  int FrameHeight = 0;
+  double PixelRatio = 1.0;
   std::vector< ZEK::VSelectionItem > SubjectKeys; ///< of the subject objects; GUI side
 };
 

@@ -193,8 +193,8 @@ TEST_F( VItemHooks, CamerasAndNamesStandWhereTheFrameShowsThem )
   Frames( 3 );
   ASSERT_EQ( pItem->CameraObjects().size(), 2 );
   EXPECT_EQ( *pMemberships, 1 );
-  auto* const pFirst = qobject_cast< VCameraObject* >( pItem->CameraObjects()[0] );
-  auto* const pSecond = qobject_cast< VCameraObject* >( pItem->CameraObjects()[1] );
+  auto* const pFirst = qobject_cast< VCameraObject* >( pItem->CameraObjects()[1] );
+  auto* const pSecond = qobject_cast< VCameraObject* >( pItem->CameraObjects()[0] );
   EXPECT_EQ( pFirst->DeviceURN(), "vi:1" );
   EXPECT_EQ( pFirst->property( "userId" ).toUInt(), 4294967295u );
   const QPointF There = ScreenPoint( { 1500, 300, 900, 0 } );
@@ -212,7 +212,7 @@ TEST_F( VItemHooks, CamerasAndNamesStandWhereTheFrameShowsThem )
   pWidget->Wheel( 120 );
   pWidget->Wheel( 120 );
   Frames( 3 );
-  EXPECT_EQ( pItem->CameraObjects()[1], pSecond ) << "objects stay for as long as what they stand for";
+  EXPECT_EQ( pItem->CameraObjects()[0], pSecond ) << "objects stay for as long as what they stand for";
   EXPECT_GT( std::abs( pSecond->m_Position.x() - There.x() ), 5.0 );
   EXPECT_TRUE( pSecond->m_bSelected );
   EXPECT_FALSE( pFirst->m_bSelected );

@@ -7,7 +7,7 @@
 namespace MoxelGraphics
 {
 
-/// What views need to know of a camera to lay it out, name it and sort it. Sorted by URN.
+/// What views need to know of a camera to lay it out, name it and sort it. `StandsBefore` is their order.
 struct VCameraDefinition
 {
   std::string DeviceURN;
@@ -25,5 +25,17 @@ struct VCameraDefinition
 
   friend bool operator==( const VCameraDefinition&, const VCameraDefinition& ) = default;
 };
+
+/// Optical cameras before video, then by number, those without one last, then by the bytes of the URN.
+inline bool StandsBefore( const VCameraDefinition& i_rA, const VCameraDefinition& i_rB )
+{
+  const auto Number = []( const VCameraDefinition& i_rCamera )
+  {
+    return static_cast< std::uint32_t >( i_rCamera.UserId );
+  };
+  return i_rA.bVideo != i_rB.bVideo         ? i_rB.bVideo
+         : Number( i_rA ) != Number( i_rB ) ? Number( i_rA ) < Number( i_rB )
+                                            : i_rA.DeviceURN < i_rB.DeviceURN;
+}
 
 } // namespace MoxelGraphics

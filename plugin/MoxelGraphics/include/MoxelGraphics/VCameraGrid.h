@@ -15,7 +15,6 @@
 #include <QtCore/QStringList>
 
 #include <memory>
-#include <optional>
 #include <vector>
 
 class QKeyEvent;
@@ -31,7 +30,7 @@ bool IsSameDevice( QStringView i_A, QStringView i_B );
 /// Lays the cameras of a 2D view out as tiles of one frame, and remembers the zoom and pan of each. A list model with a
 /// row a tile for documents; views draw from `Snapshot`.
 ///
-/// Thread: GUI. A renderer may call `Snapshot` while the GUI thread is held.
+/// Thread: GUI. What `Snapshot` gives may be read anywhere.
 class VCameraGrid : public QAbstractListModel, public ZEK::VShared
 {
   Q_OBJECT
@@ -173,8 +172,8 @@ private:
   VView m_PressedView{};
   bool m_bZooming = false;
   bool m_bPanning = false;
-  bool m_bRotated = true;
-  bool m_bSnapped = true;
+  bool m_bRotated = false;
+  bool m_bSnapped = false;
   ZEK::VMultiCallback< void( QStringList ) > m_TileRequested;
   mutable VCameraTilesRef m_pSnapshot; ///< null when out of date
 };

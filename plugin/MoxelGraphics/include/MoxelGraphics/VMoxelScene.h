@@ -135,7 +135,8 @@ public:
   void SetYUp( bool i_bYUp ) { m_bYUp.store( i_bYUp, std::memory_order_relaxed ); }
   bool YUp() const { return m_bYUp.load( std::memory_order_relaxed ); }
 
-  /// Sorts by URN and, when the list then differs from the one at hand, takes it and raises the generation.
+  /// Sorts and, when the list then differs from the one at hand, takes it and raises the generation. The second of one
+  /// URN is left out.
   void SetCameraDefinitions( std::vector< VCameraDefinition > i_Definitions );
   const std::vector< VCameraDefinition >& CameraDefinitions() const { return m_CameraDefinitions; }
   std::uint64_t CameraGeneration() const { return m_CameraGeneration; }

@@ -21,6 +21,7 @@
 #include <vector>
 
 class QOpenGLFramebufferObject;
+class QPainter;
 
 namespace CoreGraphics
 {
@@ -89,6 +90,7 @@ public:
 
   /// Makes the off-screen targets for a frame of that size in device pixels. `Input` is read.
   void Resize( QSize i_Size );
+  QSize Size() const { return m_Size; }
   VFrameInput& Input() { return m_Input; }
   const VFrameInput& Input() const { return m_Input; }
 
@@ -119,12 +121,18 @@ private:
   bool IsBand() const;
   void PickPoint();
   int PickBand();
-  int PickLayers( const QRect& i_rBand );
+  int PickLayers( const QRect& i_rBand, const VCameraTile* i_pTile );
+  void PickAnalytically( const QRect& i_rBand, const VCameraTile* i_pTile );
   bool Take( std::uint32_t i_Id );
-  void Draw( const QRect& i_rScissor );
+  /// Of a camera view, one tile or nothing.
+  void Draw( const QRect& i_rScissor, const VCameraTile* i_pTile );
   void Highlight();
   void DrawView();
   void DrawAllTiles();
+  /// Where a pick looks: the tile under a point, pixels from the top left; null when there is none.
+  const VCameraTile* TileUnder( QPoint i_Point ) const;
+  void DrawTile( const VCameraTile& i_rTile, const QRect& i_rViewport, const QRect& i_rScissor );
+  void PaintTiles( QPainter& io_rPainter );
   void PaintOverlay( const QOpenGLFramebufferObject& i_rTarget );
 
   std::shared_ptr< VMoxelScene > m_pScene;

@@ -2,6 +2,7 @@
 
 #include <MoxelGraphics/ETracking.h>
 #include <MoxelGraphics/IManipulator.h>
+#include <MoxelGraphics/VCameraTile.h>
 #include <MoxelGraphics/VSceneOptions.h>
 
 #include <ZEK/Selection.h>
@@ -25,6 +26,7 @@ class VCameraController;
 
 namespace MoxelGraphics
 {
+class VCameraGrid;
 class VMoxelScene;
 class VSceneFrame;
 struct VGesture;
@@ -61,8 +63,11 @@ public:
   QObject* Scene() const;
   /// A `VMoxelScene` held by shared pointer, or null. Anything else is refused.
   void SetScene( QObject* i_pScene );
-  QObject* CameraGrid() const { return m_pCameraGrid; }
-  void SetCameraGrid( QObject* i_pGrid ) { m_pCameraGrid = i_pGrid; }
+  QObject* CameraGrid() const;
+  /// A `VCameraGrid`, or null in a free view; anything else is refused. The item gives it the scene's cameras, its own
+  /// size and the settings that concern it; with the option `CameraView` on it draws the grid's tiles, and the mouse
+  /// and the keys are the grid's.
+  void SetCameraGrid( QObject* i_pGrid );
   QObject* SceneOptionsObject() const { return m_pOptionsMap; }
   QQmlPropertyMap& OptionsMap() const { return *m_pOptionsMap; }
   const VSceneOptions& Options() const { return m_Options; }
@@ -107,7 +112,9 @@ public:
   /// Every frame asks for the next. For the next renderer that is made.
   void SetContinuousUpdate( bool i_bOn ) { m_bContinuous = i_bOn; }
   /// "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames" of the frame that was drawn before the last
-  /// one; "labels" of the preselection, "picked_labels" of the last commit, "notice".
+  /// one; "tiles" of a camera view: each with "urn", "rect" (x, y, width, height; item pixels, y down), "viewport" (the
+  /// same; device pixels, y up), "view2d", "zoom" and "pan"; "labels" of the preselection, "picked_labels" of the last
+  /// commit, "notice".
   Q_INVOKABLE QVariantMap frameReport() const;
 
 public slots:
@@ -142,6 +149,7 @@ protected:
 
   bool event( QEvent* i_pEvent ) override;
   void itemChange( ItemChange i_Change, const ItemChangeData& i_rData ) override;
+  void geometryChange( const QRectF& i_rNew, const QRectF& i_rOld ) override;
   QSGNode* updatePaintNode( QSGNode* i_pNode, UpdatePaintNodeData* i_pData ) override;
 
 private:
@@ -154,6 +162,13 @@ private:
   /// Does it to the camera that the hand sees, and keeps it for the one that draws. True when it meant something.
   bool Gesture( VGesture i_Gesture );
   void MouseGesture( int i_Kind, const QMouseEvent& i_rEvent );
+  /// The grid that the mouse works on; null in a free view.
+  VCameraGrid* Grid() const;
+  void ResizeGrid();
+  void PassGridOptions();
+  /// The last thing before the renderer is met.
+  void PrepareMeeting();
+  QVariantList TilesReport() const;
   /// Each manipulator that is shown, in the order of asking, with its selection kind, until `i_Ask` says true.
   bool AskManipulators( const std::function< bool( IManipulator&, std::uint32_t ) >& i_Ask ) const;
   bool OfferPress( const QMouseEvent& i_rEvent );
@@ -168,6 +183,7 @@ private:
   void BeginFrames();
   void PassGestures();
   void CollectOverlay( const VSceneFrame& i_rFrame );
+  void ExchangeTiles( VSceneFrame& io_rFrame );
   void TakeResult( const VSceneFrame& i_rFrame );
   void GiveOrders( VSceneFrame& io_rFrame );
   void FollowTracking();
@@ -179,7 +195,10 @@ private:
   void Preselect( const ZEK::VSelection& i_rSelection, const std::vector< std::string >& i_rLabels );
 
   std::shared_ptr< VMoxelScene > m_pScene;
-  QPointer< QObject > m_pCameraGrid;
+  QPointer< VCameraGrid > m_pCameraGrid;
+  QMetaObject::Connection m_GridViews;
+  double m_GridRatio = 0.0; ///< with which the grid was last sized
+  VCameraTilesRef m_Tiles;  ///< of the grid, as the next frame draws them
   QMetaObject::Connection m_BeforeMeeting;
   IManipulatorSource* m_pManipulatorSource = nullptr; ///< the scene, when it is one
   VManipulators m_Manipulators;

@@ -136,7 +136,7 @@ public:
   void Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i_rScene, VSphereBatch& io_rBatch,
              const VSphereSizing& i_rSizing );
   /// Appends the id of every remembered sphere whose centre lies in the rectangle, bounds included, unless it lies
-  /// behind the eye. The rectangle is in pixels of the context's frame, y up.
+  /// behind the eye. The rectangle is in pixels of the context's frame, y up, and the spheres stand in its viewport.
   void PickInRect( const CoreGraphics::VRenderContext& i_rContext, const QRect& i_rRect,
                    std::vector< std::uint32_t >& io_rIds ) const;
 
