@@ -4,8 +4,8 @@
 
 #include <ZEK/DebugServices.h>
 
-#include <functional>
 #include <random>
+#include <utility>
 
 namespace HostFlow
 {
@@ -25,24 +25,18 @@ std::size_t TableSlot( std::uint32_t i_Tag )
 
 } // namespace
 
-std::uint64_t NameHashPart( std::uint32_t i_Selector, std::string_view i_Name )
-{
-  return i_Name.empty() ? 0 : i_Selector * 0x9e3779b97f4a7c15u * ( std::hash< std::string_view >()( i_Name ) | 1u );
-}
-
 VPooledItem::VPooledItem( VItemPool& i_rPool )
   : m_rPool( i_rPool )
 {
-  m_pValue = this;
 }
 
 bool VPooledItem::GetName( std::uint32_t i_Selector, std::string_view& o_rName ) const
 {
-  if ( i_Selector == 0 || i_Selector >= ZEK::EFlowNameCount || m_Names[i_Selector - 1].empty() )
+  if ( i_Selector == 0 || i_Selector >= ZEK::EFlowNameCount || !m_Names[i_Selector - 1] )
   {
     return false;
   }
-  o_rName = m_Names[i_Selector - 1];
+  o_rName = m_Names[i_Selector - 1]->Text;
   return true;
 }
 
@@ -53,12 +47,24 @@ void VPooledItem::SetName( std::uint32_t i_Selector, std::string_view i_Name )
   {
     return;
   }
-  m_Names[i_Selector - 1].assign( i_Name );
-  m_NameHash = 0;
-  for ( std::size_t Name = 0; Name < m_Names.size(); ++Name )
+  VName* const pFormer = m_Names[i_Selector - 1];
+  VName* const pName = i_Name.empty() ? nullptr : &VNameBook::Instance().Take( i_Name );
+  m_Names[i_Selector - 1] = pName;
+  m_NameNumbers[i_Selector - 1] = pName ? pName->Number : 0;
+  if ( pFormer )
   {
-    m_NameHash += NameHashPart( static_cast< std::uint32_t >( Name + 1 ), m_Names[Name] );
+    VNameBook::GiveBack( *pFormer );
   }
+}
+
+std::uint64_t VPooledItem::NameHash() const
+{
+  std::uint64_t Hash = 0;
+  for ( std::uint32_t Name = 0; Name < m_Names.size(); ++Name )
+  {
+    Hash += m_Names[Name] ? NameHashPart( Name + 1, m_Names[Name]->Hash ) : 0;
+  }
+  return Hash;
 }
 
 void VPooledItem::Renew( std::uint32_t i_Salt, std::uint32_t i_Tag, std::int64_t i_Number )
@@ -69,13 +75,13 @@ void VPooledItem::Renew( std::uint32_t i_Salt, std::uint32_t i_Tag, std::int64_t
 void VPooledItem::Destroy()
 {
   ResetPayload();
-  if ( m_NameHash != 0 )
+  for ( std::size_t Name = 0; Name < m_Names.size(); ++Name )
   {
-    for ( std::string& rName : m_Names )
+    if ( VName* const pName = std::exchange( m_Names[Name], nullptr ) )
     {
-      rName.clear();
+      VNameBook::GiveBack( *pName );
+      m_NameNumbers[Name] = 0;
     }
-    m_NameHash = 0;
   }
   m_rPool.GiveBack( *this );
 }
@@ -154,6 +160,7 @@ void VItemPools::Trim()
   {
     rpPool->Trim();
   }
+  VNameBook::Instance().Trim();
 }
 
 } // namespace HostFlow

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "VFreeList.h"
+#include "VNameBook.h"
 
 #include <ZEK/FlowState.h>
 
@@ -8,7 +9,6 @@
 #include <cstdint>
 #include <memory>
 #include <mutex>
-#include <string>
 #include <typeinfo>
 #include <vector>
 
@@ -18,10 +18,14 @@ namespace HostFlow
 class VItemPool;
 
 /// What one name adds to the hash of a value's names; nothing for an empty one.
-std::uint64_t NameHashPart( std::uint32_t i_Selector, std::string_view i_Name );
+inline std::uint64_t NameHashPart( std::uint32_t i_Selector, std::uint64_t i_Hash )
+{
+  return i_Selector * 0x9e3779b97f4a7c15u * ( i_Hash | 1u );
+}
 
-/// An item and its value in one object; the payload is the derived class's.
-class VPooledItem : public ZEK::IFlowItem, public ZEK::IFlowValue
+/// An item and its value in one object; the payload is the derived class's. Its first line of the memory cache is the
+/// item's interface.
+class alignas( 64 ) VPooledItem : public ZEK::IFlowItem, public ZEK::IFlowValue
 {
 public:
   explicit VPooledItem( VItemPool& i_rPool );
@@ -31,14 +35,9 @@ public:
   void SetName( std::uint32_t i_Selector, std::string_view i_Name ) final;
 
   /// Equal for values of equal names.
-  std::uint64_t NameHash() const { return m_NameHash; }
+  std::uint64_t NameHash() const;
   void Renew( std::uint32_t i_Salt, std::uint32_t i_Tag, std::int64_t i_Number );
 
-private:
-  /// Empty: no such name. Before all else, so that they lie by the id: a join reads both.
-  std::array< std::string, ZEK::EFlowNameCount - 1 > m_Names;
-
-public:
   VPooledItem* pNextFree = nullptr;
 
 protected:
@@ -47,7 +46,7 @@ protected:
 
 private:
   VItemPool& m_rPool;
-  std::uint64_t m_NameHash = 0;
+  std::array< VName*, ZEK::EFlowNameCount - 1 > m_Names{}; ///< null: no such name
 };
 
 /// The items of one tag. Lives as long as the process, as an item may outlive every handle.

@@ -33,7 +33,7 @@ std::uint64_t NameHash( const VItemPool* i_pPool, const ZEK::IFlowItem& i_rItem 
   for ( std::uint32_t Selector = 1; Selector < ZEK::EFlowNameCount; ++Selector )
   {
     std::string_view Name;
-    Hash += i_rItem.Value().GetName( Selector, Name ) ? NameHashPart( Selector, Name ) : 0;
+    Hash += i_rItem.Value().GetName( Selector, Name ) ? NameHashPart( Selector, HashOfName( Name ) ) : 0;
   }
   return Hash;
 }
@@ -42,6 +42,11 @@ bool SameNames( const ZEK::IFlowItem& i_rA, const ZEK::IFlowItem& i_rB )
 {
   for ( std::uint32_t Selector = 1; Selector < ZEK::EFlowNameCount; ++Selector )
   {
+    const std::uint32_t Number = i_rA.NameNumber( Selector );
+    if ( Number != 0 && Number == i_rB.NameNumber( Selector ) )
+    {
+      continue;
+    }
     std::string_view NameA, NameB;
     const bool bA = i_rA.Value().GetName( Selector, NameA );
     const bool bB = i_rB.Value().GetName( Selector, NameB );

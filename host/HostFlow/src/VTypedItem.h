@@ -81,7 +81,11 @@ template < typename T >
 class VTypedItem final : public VPooledItem
 {
 public:
-  using VPooledItem::VPooledItem;
+  explicit VTypedItem( VItemPool& i_rPool )
+    : VPooledItem( i_rPool )
+  {
+    SetValue( *this );
+  }
 
   const void* Payload() const override { return &m_Payload; }
   void* MutablePayload() override { return &m_Payload; }

@@ -1,5 +1,7 @@
 #include "FlowTestItems.h"
 
+#include "../src/VNameBook.h"
+
 #include <TestSupport/LogGuard.h>
 
 #include <set>
@@ -80,6 +82,43 @@ TEST( ItemStore, NamesAnswerToTheirSelectorOnly )
   rValue.SetName( 4, "x" );
   EXPECT_EQ( Recorder.Expressions().size(), 2u );
   EXPECT_EQ( Names(), "(none)(none)urn:1(none)(none)" );
+}
+
+TEST( ItemStore, EqualNamesHaveOneNumberWhichNoOtherNameHasEvenLater )
+{
+  const auto Number = []( const VFlowItemRef& i_rItem )
+  {
+    return i_rItem->NameNumber( EFlowNameDevice );
+  };
+  std::set< std::uint32_t > Numbers;
+  {
+    const VFlowItemRef Kept = NewItem< FlowDevice >( EFlowNameDevice, "kept" );
+    const VFlowItemRef Gone = NewItem< FlowCentroidSet >( EFlowNameDevice, "gone" );
+    const VFlowItemRef Other = NewItem< FlowCentroidSet >( EFlowNameDevice, "gone" );
+    Numbers = { Number( Kept ),        Number( Gone ),       Number( Other ), Gone->NameNumber( EFlowNameObject ),
+                Gone->NameNumber( 0 ), Gone->NameNumber( 4 ) };
+    EXPECT_EQ( Numbers.size(), 3u );
+    EXPECT_TRUE( Numbers.contains( 0 ) );
+    EXPECT_EQ( Number( Gone ), Number( Other ) );
+    Other->MutableValue().SetName( EFlowNameObject, "kept" );
+    EXPECT_EQ( Other->NameNumber( EFlowNameObject ), Number( Kept ) ) << "whatever the selector";
+    Other->MutableValue().SetName( EFlowNameObject, "" );
+    EXPECT_EQ( Other->NameNumber( EFlowNameObject ), 0u );
+  }
+  const std::size_t Names = VNameBook::Instance().Count();
+  TrimPools();
+  EXPECT_LE( VNameBook::Instance().Count() + 2, Names );
+  const VFlowItemRef Again = NewItem< FlowDevice >( EFlowNameDevice, "gone" );
+  EXPECT_FALSE( Numbers.contains( Number( Again ) ) );
+  // Names that come and go for ever do not stay.
+  for ( int Round = 0; Round < 20'000; ++Round )
+  {
+    const std::string Name = std::to_string( Round );
+    const VFlowItemRef Item = NewItem< FlowDevice >( EFlowNameDevice, Name );
+    ASSERT_EQ( NameOf( *Item, EFlowNameDevice ), Name );
+    ASSERT_TRUE( Numbers.insert( Number( Item ) ).second );
+  }
+  EXPECT_LT( VNameBook::Instance().Count(), 5'000u );
 }
 
 TEST( ItemStore, AnItemOutlivesItsHandleAndItsState )

@@ -41,7 +41,9 @@ bool IsWhole( const IFlowState& i_rState )
   for ( const VFlowEntry& rEntry : Entries )
   {
     const auto* pSet = FlowPayload< VCentroidSet >( rEntry.pItem );
-    bWhole = bWhole && pSet && !pSet->Centroids.empty();
+    std::string_view Name;
+    bWhole = bWhole && pSet && !pSet->Centroids.empty() && rEntry.pItem->Value().GetName( 2, Name ) &&
+             Name.starts_with( "Camera " );
     for ( const VCentroid& rCentroid : pSet->Centroids )
     {
       bWhole = bWhole && rCentroid.x == static_cast< float >( i_rState.GetKey().Frame );

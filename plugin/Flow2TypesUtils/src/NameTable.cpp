@@ -37,7 +37,48 @@ void VNameTable::Clear()
 {
   m_Rows.clear();
   m_Hashes.clear();
+  m_Numbers.clear();
   std::fill( m_Buckets.begin(), m_Buckets.end(), 0 );
+  std::fill( m_Numbered.begin(), m_Numbered.end(), VNumbered() );
+}
+
+VNameTable::VNumbered& VNameTable::Numbered( std::uint32_t i_Number )
+{
+  // Numbers are given out one after another, so their low bits spread best.
+  return m_Numbered[i_Number & ( m_Numbered.size() - 1 )];
+}
+
+std::uint32_t VNameTable::RowOf( const ZEK::IFlowItem& i_rItem, std::uint32_t i_Selector )
+{
+  const std::uint32_t Number = i_rItem.NameNumber( i_Selector );
+  if ( Number != 0 && !m_Numbered.empty() && Numbered( Number ).Number == Number )
+  {
+    return Numbered( Number ).Row;
+  }
+  std::string_view Name;
+  if ( !i_rItem.Value().GetName( i_Selector, Name ) )
+  {
+    return None;
+  }
+  const std::uint32_t Row = RowOf( Name );
+  if ( Number != 0 )
+  {
+    Numbered( Number ) = { Number, Row };
+    m_Numbers[Row] = Number;
+  }
+  return Row;
+}
+
+bool VNameTable::IsRowOf( std::uint32_t i_Row, const ZEK::IFlowItem& i_rItem, std::uint32_t i_Selector )
+{
+  std::string_view Name;
+  const bool bName = i_rItem.Value().GetName( i_Selector, Name );
+  if ( !bName || i_Row == None || m_Rows[i_Row].Name != Name )
+  {
+    return !bName && i_Row == None;
+  }
+  m_Numbers[i_Row] = i_rItem.NameNumber( i_Selector );
+  return true;
 }
 
 std::uint32_t VNameTable::RowOf( std::string_view i_Name )
@@ -59,6 +100,7 @@ std::uint32_t VNameTable::RowOf( std::string_view i_Name )
   }
   m_Rows.push_back( { i_Name } );
   m_Hashes.push_back( Hash );
+  m_Numbers.push_back( 0 );
   m_Buckets[Bucket] = static_cast< std::uint32_t >( m_Rows.size() );
   return m_Buckets[Bucket] - 1;
 }
@@ -66,6 +108,7 @@ std::uint32_t VNameTable::RowOf( std::string_view i_Name )
 void VNameTable::Grow()
 {
   m_Buckets.assign( std::max< std::size_t >( 64, m_Buckets.size() * 2 ), 0 );
+  m_Numbered.assign( m_Buckets.size(), {} );
   const std::size_t Mask = m_Buckets.size() - 1;
   for ( std::size_t Row = 0; Row < m_Rows.size(); ++Row )
   {

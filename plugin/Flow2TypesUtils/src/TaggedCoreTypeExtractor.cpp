@@ -69,14 +69,10 @@ bool VTaggedCoreTypeExtractor::KeepJoin( const VJoinQuery& i_rQuery )
 {
   for ( auto& rEntry : m_ItemCacheMap )
   {
-    if ( !rEntry.second->Keep( i_rQuery, *m_pTable ) )
+    if ( !rEntry.second->Keep( i_rQuery, m_EndEntry, *m_pTable ) )
     {
       return false;
     }
-  }
-  for ( auto& rEntry : m_ItemCacheMap )
-  {
-    rEntry.second->Renew( m_EndEntry );
   }
   return true;
 }

@@ -9,42 +9,55 @@ namespace Flow2TypesUtils
 {
 namespace
 {
+using VEntries = std::span< const ZEK::VFlowEntry >;
+
 bool IdLess( const ZEK::VFlowValueId& i_rLeft, const ZEK::VFlowValueId& i_rRight )
 {
   return std::tie( i_rLeft.Salt, i_rLeft.Type, i_rLeft.Number ) <
          std::tie( i_rRight.Salt, i_rRight.Type, i_rRight.Number );
 }
 
-/// Asks for memory that is read a little later.
-void FetchAhead( const void* i_pMemory )
-{
-  __builtin_prefetch( i_pMemory );
-}
-
-/// The time test of one query. Most entries of a tag share their key, so the last answer is kept.
-class VTimeTest
+/// Walks the entries of a tag that pass the time test.
+class VWalk
 {
 public:
-  explicit VTimeTest( const VJoinQuery& i_rQuery )
-    : m_rQuery( i_rQuery )
+  VWalk( VEntries i_Entries, ZEK::EFlowTimeMatch i_Match, const ZEK::VFlowTimeKey& i_rKey )
+    : m_pEntry( i_Entries.data() )
+    , m_pEnd( m_pEntry + i_Entries.size() )
+    , m_pAheadEnd( m_pEnd - std::min( i_Entries.size(), Ahead ) )
+    , m_Match( i_Match )
+    , m_Key( i_rKey )
   {
+    // Entries lie in the order of their keys, and a key passes against itself.
+    m_bAllPass = !i_Entries.empty() && i_Entries.front().Key == i_rKey && i_Entries.back().Key == i_rKey &&
+                 ZEK::FlowTimeMatches( i_Match, i_rKey, i_rKey );
   }
-  bool Passes( const ZEK::VFlowTimeKey& i_rKey )
+  /// The next one, or null.
+  const ZEK::VFlowEntry* Next()
   {
-    if ( !( i_rKey == m_Last && i_rKey.Span == m_Last.Span && m_bKnown ) )
+    while ( m_pEntry != m_pEnd )
     {
-      m_Last = i_rKey;
-      m_bKnown = true;
-      m_bPasses = ZEK::FlowTimeMatches( m_rQuery.Match, i_rKey, m_rQuery.Key );
+      if ( m_pEntry < m_pAheadEnd )
+      {
+        __builtin_prefetch( m_pEntry[Ahead].pItem ); // items lie all over the memory
+      }
+      const ZEK::VFlowEntry* pEntry = m_pEntry++;
+      if ( m_bAllPass || ZEK::FlowTimeMatches( m_Match, pEntry->Key, m_Key ) )
+      {
+        return pEntry;
+      }
     }
-    return m_bPasses;
+    return nullptr;
   }
 
 private:
-  const VJoinQuery& m_rQuery;
-  ZEK::VFlowTimeKey m_Last;
-  bool m_bKnown = false;
-  bool m_bPasses = false;
+  static constexpr std::size_t Ahead = 8;
+  const ZEK::VFlowEntry* m_pEntry;
+  const ZEK::VFlowEntry* m_pEnd;
+  const ZEK::VFlowEntry* m_pAheadEnd;
+  ZEK::EFlowTimeMatch m_Match;
+  ZEK::VFlowTimeKey m_Key;
+  bool m_bAllPass;
 };
 } // namespace
 
@@ -56,25 +69,26 @@ VItemCache::VItemCache( std::uint32_t i_Tag, ETagRequirement i_Requirement )
 
 VItemCache::~VItemCache() = default;
 
+VItemCache::VRange VItemCache::RangeOf( const VJoinQuery& i_rQuery ) const
+{
+  ZEK::VFlowCursor Begin, End;
+  i_rQuery.rState.ItemsBegin( Begin, m_Tag, i_rQuery.Match, i_rQuery.Key );
+  i_rQuery.rState.ItemsEnd( End, m_Tag, i_rQuery.Match, i_rQuery.Key );
+  return { { Begin.operator->(), End.operator->() }, i_rQuery.Match, i_rQuery.Key, {} };
+}
+
 bool VItemCache::Collect( const VJoinQuery& i_rQuery, std::uint32_t i_CacheNumber, VNameTable& io_rTable,
                           bool& o_rbRequired )
 {
   bool bAnyHit = false;
-  VTimeTest Time( i_rQuery );
-  ZEK::VFlowCursor It, End;
-  i_rQuery.rState.ItemsBegin( It, m_Tag, i_rQuery.Match, i_rQuery.Key );
-  i_rQuery.rState.ItemsEnd( End, m_Tag, i_rQuery.Match, i_rQuery.Key );
-  for ( ; It != End; ++It )
+  m_Range = RangeOf( i_rQuery );
+  VWalk Walk( m_Range.Entries, i_rQuery.Match, i_rQuery.Key );
+  while ( const ZEK::VFlowEntry* pEntry = Walk.Next() )
   {
-    if ( !Time.Passes( It->Key ) )
+    const ZEK::IFlowItem& rItem = *pEntry->pItem;
+    VSeen Seen{ rItem.Id(), &rItem, io_rTable.RowOf( rItem, i_rQuery.NameSelector ), None };
+    if ( Seen.Row != None )
     {
-      continue;
-    }
-    VSeen Seen{ It->pItem->Id(), It->pItem, None, None };
-    std::string_view Name;
-    if ( It->pItem->Value().GetName( i_rQuery.NameSelector, Name ) )
-    {
-      Seen.Row = io_rTable.RowOf( Name );
       VJoinRow& rRow = io_rTable.Row( Seen.Row );
       if ( rRow.LastCache != i_CacheNumber )
       {
@@ -85,7 +99,6 @@ bool VItemCache::Collect( const VJoinQuery& i_rQuery, std::uint32_t i_CacheNumbe
       }
     }
     m_Seen.push_back( Seen );
-    m_SeenEntries.push_back( It );
   }
   o_rbRequired =
       m_Requirement == ETagRequirement::Required || ( m_Requirement != ETagRequirement::Optional && bAnyHit );
@@ -100,28 +113,14 @@ void VItemCache::Resize( std::size_t i_Count, ZEK::VFlowCursor i_EndEntry, VName
                                       return i_rSeen.Slot != None;
                                     } );
   const std::size_t Count = m_Requirement == ETagRequirement::RequiredIfAny && !bAnyHit ? 0 : i_Count;
-  m_bValuesTaken = false;
-  m_EndEntry = i_EndEntry;
-  m_Entries.assign( Count, i_EndEntry );
+  m_Range.EndEntry = i_EndEntry;
   m_Ids.assign( Count, {} );
-  m_Holes.clear();
-  std::size_t Filled = 0;
-  for ( std::size_t Index = 0; Index < m_Seen.size(); ++Index )
+  for ( VSeen& rSeen : m_Seen )
   {
-    VSeen& rSeen = m_Seen[Index];
     rSeen.Slot = rSeen.Slot == None ? None : io_rTable.Row( rSeen.Slot ).Index;
     if ( rSeen.Slot != None )
     {
-      ++Filled;
-      m_Entries[rSeen.Slot] = m_SeenEntries[Index];
       m_Ids[rSeen.Slot] = rSeen.Id;
-    }
-  }
-  for ( std::uint32_t Slot = 0; Filled != Count && Slot < Count; ++Slot )
-  {
-    if ( m_Entries[Slot] == i_EndEntry )
-    {
-      m_Holes.push_back( Slot );
     }
   }
 }
@@ -134,93 +133,91 @@ void VItemCache::Clear( bool i_bKeepAsPrevious )
   }
   m_bSameIds = false;
   m_Ids.clear();
-  m_Entries.clear();
   m_bValuesTaken = false;
+  m_bEntriesTaken = false;
+  m_Range = {};
   m_Seen.clear();
-  m_SeenEntries.clear();
-  m_Holes.clear();
 }
 
-bool VItemCache::Keep( const VJoinQuery& i_rQuery, VNameTable& io_rTable )
+bool VItemCache::Keep( const VJoinQuery& i_rQuery, ZEK::VFlowCursor i_EndEntry, VNameTable& io_rTable )
 {
+  m_Range = RangeOf( i_rQuery );
+  m_Range.EndEntry = i_EndEntry;
+  m_bEntriesTaken = false;
+  VWalk Walk( m_Range.Entries, i_rQuery.Match, i_rQuery.Key );
   VSeen* pSeen = m_Seen.data();
   VSeen* const pEnd = pSeen + m_Seen.size();
-  ZEK::VFlowCursor* const pEntries = m_Entries.data();
-  VTimeTest Time( i_rQuery );
-  ZEK::VFlowCursor It, End;
-  i_rQuery.rState.ItemsBegin( It, m_Tag, i_rQuery.Match, i_rQuery.Key );
-  i_rQuery.rState.ItemsEnd( End, m_Tag, i_rQuery.Match, i_rQuery.Key );
-  m_Others.clear();
-  for ( ; It != End; ++It )
+  while ( const ZEK::VFlowEntry* pEntry = Walk.Next() )
   {
-    if ( !Time.Passes( It->Key ) )
-    {
-      continue;
-    }
     if ( pSeen == pEnd )
     {
       return false;
     }
     // An item at the same place in memory with the same id is the same item.
-    const ZEK::IFlowItem* pItem = It->pItem;
+    const ZEK::IFlowItem* pItem = pEntry->pItem;
     if ( pItem != pSeen->pItem || !( pItem->Id() == pSeen->Id ) )
     {
-      FetchAhead( pItem );
-      FetchAhead( reinterpret_cast< const char* >( pItem ) + 64 ); // where a name may begin
-      m_Others.push_back( { pSeen, pItem, {}, false } );
-    }
-    if ( pSeen->Slot != None )
-    {
-      pEntries[pSeen->Slot] = It;
+      return KeepOthers( pSeen, pEntry, Walk, i_rQuery.NameSelector, io_rTable );
     }
     ++pSeen;
   }
-  return pSeen == pEnd && ( m_Others.empty() || TakeOthers( i_rQuery.NameSelector, io_rTable ) );
+  return pSeen == pEnd;
 }
 
-bool VItemCache::TakeOthers( std::uint32_t i_NameSelector, VNameTable& io_rTable )
+template < typename TWalk >
+bool VItemCache::KeepOthers( VSeen* i_pSeen, const ZEK::VFlowEntry* i_pEntry, TWalk i_Walk,
+                             std::uint32_t i_NameSelector, VNameTable& io_rTable )
 {
-  // Items and names lie all over the memory: what a round needs is on its way while the one before goes through all.
-  for ( VOther& rOther : m_Others )
+  m_PreviousIds.assign( m_Ids.begin(), m_Ids.end() );
+  m_bSameIds = false;
+  m_bValuesTaken = false;
+  bool bSameIds = true;
+  VSeen* const pEnd = m_Seen.data() + m_Seen.size();
+  ZEK::VFlowValueId* const pIds = m_Ids.data();
+  const std::uint32_t* const pNumbers = io_rTable.Numbers();
+  for ( ; i_pEntry; i_pEntry = i_Walk.Next() )
   {
-    rOther.bName = rOther.pItem->Value().GetName( i_NameSelector, rOther.Name );
-    FetchAhead( rOther.Name.data() );
-  }
-  for ( const VOther& rOther : m_Others )
-  {
-    VSeen& rSeen = *rOther.pSeen;
-    rSeen.pItem = rOther.pItem;
-    m_bValuesTaken = m_bValuesTaken && rSeen.Slot == None;
-    const ZEK::VFlowValueId& rId = rOther.pItem->Id();
-    if ( rId == rSeen.Id )
-    {
-      continue;
-    }
-    if ( rOther.bName != ( rSeen.Row != None ) || ( rOther.bName && io_rTable.Row( rSeen.Row ).Name != rOther.Name ) )
+    if ( i_pSeen == pEnd )
     {
       return false;
     }
-    rSeen.Id = rId;
-    if ( rSeen.Slot != None )
+    const ZEK::IFlowItem& rItem = *i_pEntry->pItem;
+    const std::uint32_t Number = rItem.NameNumber( i_NameSelector );
+    const bool bSameNumber = Number != 0 && i_pSeen->Row != None && pNumbers[i_pSeen->Row] == Number;
+    if ( !bSameNumber && !( rItem.Id() == i_pSeen->Id ) && !io_rTable.IsRowOf( i_pSeen->Row, rItem, i_NameSelector ) )
     {
-      if ( m_bSameIds )
-      {
-        m_PreviousIds.assign( m_Ids.begin(), m_Ids.end() );
-        m_bSameIds = false;
-      }
-      m_Ids[rSeen.Slot] = rId;
+      return false;
     }
+    i_pSeen->pItem = &rItem;
+    i_pSeen->Id = rItem.Id();
+    if ( i_pSeen->Slot != None )
+    {
+      ZEK::VFlowValueId& rId = pIds[i_pSeen->Slot];
+      bSameIds = bSameIds && rId == i_pSeen->Id;
+      rId = i_pSeen->Id;
+    }
+    ++i_pSeen;
   }
-  return true;
+  m_bSameIds = bSameIds;
+  return i_pSeen == pEnd;
 }
 
-void VItemCache::Renew( ZEK::VFlowCursor i_EndEntry )
+const std::vector< ZEK::VFlowCursor >& VItemCache::Entries() const
 {
-  for ( const std::uint32_t Slot : m_Holes )
+  if ( !std::exchange( m_bEntriesTaken, true ) )
   {
-    m_Entries[Slot] = i_EndEntry;
+    m_Entries.assign( m_Ids.size(), m_Range.EndEntry );
+    VWalk Walk( m_Range.Entries, m_Range.Match, m_Range.Key );
+    for ( const VSeen& rSeen : m_Seen )
+    {
+      const ZEK::VFlowCursor Entry( Walk.Next() );
+      if ( rSeen.Slot != None )
+      {
+        m_Entries[rSeen.Slot] = Entry;
+      }
+    }
   }
-  m_EndEntry = i_EndEntry;
+  return m_Entries;
 }
 
 bool VItemCache::Changed() const

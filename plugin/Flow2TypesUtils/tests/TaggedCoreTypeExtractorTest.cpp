@@ -17,6 +17,34 @@ namespace
 {
 constexpr std::uint32_t Tags[] = { 0x1000, 0x1001, 0x1023, 0x1025 };
 
+/// An item of another make, which numbers no name.
+class VOtherItem final : public ZEK::IFlowItem, public ZEK::IFlowValue
+{
+public:
+  VOtherItem( std::uint32_t i_Tag, const std::string& i_rName )
+    : m_Name( i_rName )
+  {
+    static std::int64_t Number = 0;
+    m_Id = { 0, i_Tag, ++Number };
+    SetValue( *this );
+  }
+  bool GetName( std::uint32_t i_Selector, std::string_view& o_rName ) const override
+  {
+    o_rName = m_Name;
+    return i_Selector == ZEK::EFlowNameDevice && !m_Name.empty();
+  }
+  void SetName( std::uint32_t, std::string_view i_Name ) override { m_Name = i_Name; }
+  const void* Payload() const override { return &m_Payload; }
+  void* MutablePayload() override { return &m_Payload; }
+  const std::type_info& PayloadType() const override { return typeid( VDevice ); }
+
+private:
+  void Destroy() override { delete this; }
+
+  std::string m_Name;
+  VDevice m_Payload;
+};
+
 class VMaker
 {
 public:
@@ -26,8 +54,12 @@ public:
     EXPECT_TRUE( m_Factory->CreateState( Made, i_rKey, {}, {} ).IsOk() );
     return Made;
   }
-  ZEK::VFlowItemRef Item( std::uint32_t i_Tag, const std::string& i_rName )
+  ZEK::VFlowItemRef Item( std::uint32_t i_Tag, const std::string& i_rName, bool i_bOther = false )
   {
+    if ( i_bOther )
+    {
+      return ZEK::VFlowItemRef( new VOtherItem( i_Tag, i_rName ) );
+    }
     const ZEK::VFlowItemType& rType = i_Tag == Tags[0]   ? ZEK::FlowValueType< FlowCameraHardware >::Descriptor
                                       : i_Tag == Tags[1] ? ZEK::FlowValueType< FlowCameraSettings >::Descriptor
                                       : i_Tag == Tags[2] ? ZEK::FlowValueType< FlowDevice >::Descriptor
@@ -207,7 +239,7 @@ TEST( TaggedCoreTypeExtractor, JoinsAsAnOrderedMapWouldWhateverWasBefore )
           i_Name == 7 ? std::string() : std::string( "a device with a long name " ).append( std::to_string( i_Name ) );
       // A key of its own keeps an item beside one of its name; some lie in the past, some hold long.
       const ZEK::VFlowTimeKey Keys[] = { { 0, 1000, 1 }, { 100, 10, 1 }, { 101, 0, 1 }, { 7, 5, 1 }, { 100, 1, 9 } };
-      return VEntry{ i_Tag, Maker.Item( i_Tag, Name ), Keys[Below( 8 ) % 5] };
+      return VEntry{ i_Tag, Maker.Item( i_Tag, Name, i_Tag == Tags[2] && Below( 3 ) == 0 ), Keys[Below( 8 ) % 5] };
     };
     for ( std::uint32_t Tag : Tags )
     {
@@ -238,7 +270,11 @@ TEST( TaggedCoreTypeExtractor, JoinsAsAnOrderedMapWouldWhateverWasBefore )
       {
         std::string_view Name;
         Entries[Which].Item->Value().GetName( ZEK::EFlowNameDevice, Name );
-        Entries[Which].Item = Maker.Item( Entries[Which].Tag, std::string( Name ) );
+        const std::string Kept( Name );
+        // When nobody else has the name and it is forgotten, it comes back under another number.
+        Entries[Which].Item = nullptr;
+        HostFlow::TrimPools();
+        Entries[Which].Item = Maker.Item( Entries[Which].Tag, Kept, Entries[Which].Tag == Tags[2] && Below( 2 ) == 0 );
         break;
       }
       default:
@@ -321,6 +357,12 @@ TEST( TaggedCoreTypeExtractor, EachStateIsToldFromTheOneBefore )
   const ZEK::VFlowItemRef NewB = Maker.Item( Tags[0], "b" );
   Show( { A, NewB, C } );
   EXPECT_EQ( Told(), "changed a b* c " );
+  Show( { A, NewB, Maker.Item( Tags[0], "d" ) } );
+  State = nullptr;
+  HostFlow::TrimPools();
+  Show( { A, NewB, Maker.Item( Tags[0], "d" ) } );
+  EXPECT_EQ( Told(), "changed a b d* " ) << "a name that was forgotten in between";
+  Show( { A, NewB, C } );
   Show( { NewB, C } );
   EXPECT_EQ( Told(), "names changed b c " ) << "moved to other slots";
   Show( { NewB, C, Maker.Item( Tags[1], "c" ) } );

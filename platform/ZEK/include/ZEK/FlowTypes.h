@@ -2,6 +2,7 @@
 
 // The vocabulary of a frame of state: keys, values, items, states. The host implements it; the plug-in only calls.
 
+#include <array>
 #include <atomic>
 #include <compare>
 #include <cstddef>
@@ -126,12 +127,23 @@ public:
 };
 
 /// A reference-counted entry of a state. Thread: the count is atomic; the rest does not change once shared.
+///
+/// What a walk over thousands of items reads lies here, in one line of the memory cache, and is read without a call.
 class IFlowItem
 {
 public:
   const VFlowValueId& Id() const { return m_Id; }
   const IFlowValue& Value() const { return *m_pValue; }
   IFlowValue& MutableValue() { return *m_pValue; }
+  /// Items of equal numbers have equal names under that selector, whenever they live: no other name has had the
+  /// number in this process. Unequal numbers say nothing, and 0 is no number: the value has no name there, or its
+  /// maker does not number.
+  std::uint32_t NameNumber( std::uint32_t i_Selector ) const
+  {
+    return i_Selector - 1 < m_NameNumbers.size() ? m_NameNumbers[i_Selector - 1] : 0;
+  }
+  const void* Payload() const { return m_pPayload; }
+  const std::type_info& PayloadType() const { return *m_pPayloadType; }
 
   void AddRef() const { m_Count.fetch_add( 1, std::memory_order_relaxed ); }
   void Release() const
@@ -152,10 +164,22 @@ protected:
 
   /// Called when the last reference went: deletes the item or gives it back to its pool.
   virtual void Destroy() = 0;
+  /// For the maker, once the value stands.
+  void SetValue( IFlowValue& i_rValue )
+  {
+    m_pValue = &i_rValue;
+    m_pPayload = i_rValue.Payload();
+    m_pPayloadType = &i_rValue.PayloadType();
+  }
 
   VFlowValueId m_Id;
-  IFlowValue* m_pValue = nullptr;
+  std::array< std::uint32_t, EFlowNameCount - 1 > m_NameNumbers{};
   mutable std::atomic< std::int32_t > m_Count{ 0 };
+
+private:
+  IFlowValue* m_pValue = nullptr;
+  const void* m_pPayload = nullptr;
+  const std::type_info* m_pPayloadType = nullptr;
 };
 
 /// Holds one reference on an intrusively counted object.
@@ -211,16 +235,14 @@ using VFlowItemRef = VFlowRef< IFlowItem >;
 template < typename T >
 const T* FlowPayload( const IFlowItem* i_pItem )
 {
-  return i_pItem && i_pItem->Value().PayloadType() == typeid( T )
-             ? static_cast< const T* >( i_pItem->Value().Payload() )
-             : nullptr;
+  return i_pItem && i_pItem->PayloadType() == typeid( T ) ? static_cast< const T* >( i_pItem->Payload() ) : nullptr;
 }
 
 /// The payload for its maker to fill, before the item is shared.
 template < typename T >
 T* FlowMutablePayload( IFlowItem* i_pItem )
 {
-  return i_pItem && i_pItem->Value().PayloadType() == typeid( T )
+  return i_pItem && i_pItem->PayloadType() == typeid( T )
              ? static_cast< T* >( i_pItem->MutableValue().MutablePayload() )
              : nullptr;
 }

@@ -50,16 +50,15 @@ public:
 
   /// Takes the entries of a new state for those that were joined, as long as they are the same objects in the same
   /// places. False, with the join no longer good, when they are not.
-  bool Keep( const VJoinQuery& i_rQuery, VNameTable& io_rTable );
-  /// The end of a join that was kept: slots without an entry hold the new state's end cursor.
-  void Renew( ZEK::VFlowCursor i_EndEntry );
+  bool Keep( const VJoinQuery& i_rQuery, ZEK::VFlowCursor i_EndEntry, VNameTable& io_rTable );
 
   /// Whether the ids differ from those of the update before, in number or in any.
   bool Changed() const;
   /// One bit a slot, clear where the id occurs anywhere among those of the update before: a value that moved to
   /// another slot did not change.
   void ChangedBits( std::vector< bool >& o_rBits ) const;
-  const std::vector< ZEK::VFlowCursor >& Entries() const { return m_Entries; }
+  /// By slot, the end cursor where an object has none.
+  const std::vector< ZEK::VFlowCursor >& Entries() const;
   ETagRequirement Requirement() const { return m_Requirement; }
   std::uint32_t Tag() const { return m_Tag; }
   std::span< const ZEK::VFlowValueId > Ids() const { return m_Ids; }
@@ -68,11 +67,6 @@ public:
   virtual const std::type_info& ValueType() const = 0;
 
 protected:
-  /// Whether the payloads are still to be looked up for the entries at hand; they are then taken to be.
-  bool TakeValues() const { return !std::exchange( m_bValuesTaken, true ); }
-  bool IsHole( const ZEK::VFlowCursor& i_rEntry ) const { return i_rEntry == m_EndEntry; }
-
-private:
   static constexpr std::uint32_t None = ~std::uint32_t{ 0 };
   /// An item of the last update in the order of the state, as far as it passed the time test.
   struct VSeen
@@ -82,28 +76,36 @@ private:
     std::uint32_t Row = None;  ///< none: the item has no name
     std::uint32_t Slot = None; ///< none: another item of the name came first, or the object lacks something
   };
-  /// An item in the place of another.
-  struct VOther
+
+  /// Whether the payloads are still to be looked up for the items at hand; they are then taken to be.
+  bool TakeValues() const { return !std::exchange( m_bValuesTaken, true ); }
+  std::span< const VSeen > Seen() const { return m_Seen; }
+
+private:
+  /// Where the tag's entries lie in the state of the last update, and which of them count.
+  struct VRange
   {
-    VSeen* pSeen = nullptr;
-    const ZEK::IFlowItem* pItem = nullptr;
-    std::string_view Name;
-    bool bName = false;
+    std::span< const ZEK::VFlowEntry > Entries;
+    ZEK::EFlowTimeMatch Match = ZEK::EFlowTimeMatch::Overlap;
+    ZEK::VFlowTimeKey Key;
+    ZEK::VFlowCursor EndEntry;
   };
-  bool TakeOthers( std::uint32_t i_NameSelector, VNameTable& io_rTable );
+  VRange RangeOf( const VJoinQuery& i_rQuery ) const;
+  /// The rest of `Keep`, from the first entry that holds another item than before.
+  template < typename TWalk >
+  bool KeepOthers( VSeen* i_pSeen, const ZEK::VFlowEntry* i_pEntry, TWalk i_Walk, std::uint32_t i_NameSelector,
+                   VNameTable& io_rTable );
 
   std::uint32_t m_Tag;
   ETagRequirement m_Requirement;
   std::vector< VSeen > m_Seen;
-  std::vector< VOther > m_Others;                ///< while a join is kept
-  std::vector< ZEK::VFlowCursor > m_SeenEntries; ///< while a join is made anew, one an item seen
-  std::vector< ZEK::VFlowCursor > m_Entries;
+  VRange m_Range;
+  mutable std::vector< ZEK::VFlowCursor > m_Entries;
   std::vector< ZEK::VFlowValueId > m_Ids;
   std::vector< ZEK::VFlowValueId > m_PreviousIds; ///< not kept up while `m_bSameIds`
   mutable std::vector< ZEK::VFlowValueId > m_Sorted;
-  std::vector< std::uint32_t > m_Holes; ///< slots without an entry
-  ZEK::VFlowCursor m_EndEntry;
   mutable bool m_bValuesTaken = false;
+  mutable bool m_bEntriesTaken = false;
   bool m_bSameIds = false; ///< the ids of the update before are those at hand
 };
 
@@ -118,11 +120,13 @@ public:
   {
     if ( TakeValues() )
     {
-      const std::vector< ZEK::VFlowCursor >& rEntries = Entries();
-      m_Values.resize( rEntries.size() );
-      for ( std::size_t Slot = 0; Slot < rEntries.size(); ++Slot )
+      m_Values.assign( Ids().size(), nullptr );
+      for ( const VSeen& rSeen : Seen() )
       {
-        m_Values[Slot] = IsHole( rEntries[Slot] ) ? nullptr : ZEK::FlowPayload< TCoreType >( rEntries[Slot]->pItem );
+        if ( rSeen.Slot != None )
+        {
+          m_Values[rSeen.Slot] = ZEK::FlowPayload< TCoreType >( rSeen.pItem );
+        }
       }
     }
     return m_Values;
