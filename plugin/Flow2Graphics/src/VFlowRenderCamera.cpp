@@ -80,6 +80,13 @@ const VVideoFrame* VFlowRenderCamera::GetVideoFrame() const
   return Value< VVideoFrame >( ECameraVideoFrame );
 }
 
+const VImageSet* VFlowRenderCamera::GetImageSet( std::uint64_t& o_rId ) const
+{
+  const ZEK::IFlowItem* const pItem = GetItem( ECameraImageSet );
+  o_rId = pItem ? static_cast< std::uint64_t >( pItem->Id().Number ) ^ std::uint64_t{ pItem->Id().Salt } << 32 : 0;
+  return Value< VImageSet >( ECameraImageSet );
+}
+
 std::size_t VFlowRenderCamera::CentroidCount() const
 {
   const auto* const pSet = Value< VCentroidSet >( ECameraCentroids );

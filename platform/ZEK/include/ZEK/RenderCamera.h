@@ -9,8 +9,9 @@
 
 namespace CoreMoxelTypes
 {
+struct VImageSet;
 struct VVideoFrame;
-}
+} // namespace CoreMoxelTypes
 namespace ComputeCameraModel
 {
 struct VCameraModel;
@@ -125,6 +126,8 @@ public:
   virtual bool GetVideoFlag() const = 0;
   /// Null when there is none; good until the provider's next update.
   virtual const CoreMoxelTypes::VVideoFrame* GetVideoFrame() const = 0;
+  /// Null when there is none; good until the provider's next update. Another `o_rId`: another content.
+  virtual const CoreMoxelTypes::VImageSet* GetImageSet( std::uint64_t& /*o_rId*/ ) const { return nullptr; }
   /// `i_Id` is the first selection id of the camera's centroids; 0: none can be picked. `o_rColours` has one colour a
   /// centroid after the scheme `i_Mode`. Grey blobs are listed with `i_bWide` only.
   virtual void GetDrawData2D( std::uint32_t i_Id, ECentroidColourScheme i_Mode, bool i_bWide, VCameraLists2D& o_rLists,
@@ -145,6 +148,8 @@ public:
   virtual VRenderCameraRef GetCamera( const std::string& i_rName ) const = 0;
   /// In the order of the names' bytes; good until the next update.
   virtual const std::vector< VRenderCameraRef >& GetCameras() const = 0;
+  /// As long as this is the same number, so is everything that the cameras give. 0: it has to be looked at each time.
+  virtual std::uint64_t GetGeneration() const { return 0; }
 };
 
 } // namespace ZEK

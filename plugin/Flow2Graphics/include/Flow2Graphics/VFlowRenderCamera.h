@@ -68,6 +68,7 @@ public:
   bool GetGreyscaleFlag() const override;
   bool GetVideoFlag() const override;
   const CoreMoxelTypes::VVideoFrame* GetVideoFrame() const override;
+  const CoreMoxelTypes::VImageSet* GetImageSet( std::uint64_t& o_rId ) const override;
   void GetDrawData2D( std::uint32_t i_Id, ZEK::ECentroidColourScheme i_Mode, bool i_bWide,
                       ZEK::VCameraLists2D& o_rLists, ZEK::VDrawWords& o_rColours ) const override;
   void GetDrawData3D( ZEK::VDrawWords& o_rIds, ZEK::VCameraLists3D& o_rLists,
