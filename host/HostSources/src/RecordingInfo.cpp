@@ -162,6 +162,11 @@ VRecordingInfo::VCamera DescribeCamera( const VRecordingCamera& i_rCamera, std::
   Camera.MeasuredCount = i_rCamera.MeasuredCount;
   Camera.MeanDistance = i_rCamera.MeanDistance;
   Camera.WorstDistance = i_rCamera.WorstDistance;
+  if ( const auto& rpClip = i_rCamera.Video.pClip )
+  {
+    Camera.Video = { rpClip->Name,   rpClip->Codec,        rpClip->PixelFormat, rpClip->Width,
+                     rpClip->Height, rpClip->FrameCount(), rpClip->RateHz,      i_rCamera.Video.bByNumber };
+  }
   return Camera;
 }
 
@@ -178,7 +183,37 @@ std::string CameraText( const VRecordingInfo::VCamera& i_rCamera )
     Line += Format( ", %.3f px from the projected points (worst %.1f px)", i_rCamera.MeanDistance,
                     i_rCamera.WorstDistance );
   }
-  return Line + "\n";
+  Line += "\n";
+  if ( i_rCamera.Video )
+  {
+    const VRecordingInfo::VVideo& rVideo = *i_rCamera.Video;
+    Line += "    video " + rVideo.File +
+            Format( ": %s, %u x %u, %s, %lld frames at %g Hz, %s\n", rVideo.Codec.c_str(), rVideo.Width, rVideo.Height,
+                    rVideo.PixelFormat.c_str(), static_cast< long long >( rVideo.FrameCount ), rVideo.RateHz,
+                    rVideo.bByNumber ? "frame by frame" : "the nearest in time" );
+  }
+  return Line;
+}
+
+void WriteVideo( VWriter& io_rWriter, const std::optional< VRecordingInfo::VVideo >& i_rVideo )
+{
+  io_rWriter.Key( "video" );
+  if ( !i_rVideo )
+  {
+    io_rWriter.Null();
+    return;
+  }
+  io_rWriter.StartObject();
+  Text( io_rWriter, "file", i_rVideo->File );
+  Text( io_rWriter, "codec", i_rVideo->Codec );
+  Text( io_rWriter, "pixelFormat", i_rVideo->PixelFormat );
+  Integer( io_rWriter, "width", i_rVideo->Width );
+  Integer( io_rWriter, "height", i_rVideo->Height );
+  Integer( io_rWriter, "frames", i_rVideo->FrameCount );
+  Number( io_rWriter, "rateHz", i_rVideo->RateHz );
+  io_rWriter.Key( "byNumber" );
+  io_rWriter.Bool( i_rVideo->bByNumber );
+  io_rWriter.EndObject();
 }
 
 void WriteCameras( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
@@ -199,6 +234,7 @@ void WriteCameras( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
     Integer( io_rWriter, "measured", static_cast< std::int64_t >( rCamera.MeasuredCount ) );
     Number( io_rWriter, "meanDistance", rCamera.MeanDistance );
     Number( io_rWriter, "worstDistance", rCamera.WorstDistance );
+    WriteVideo( io_rWriter, rCamera.Video );
     io_rWriter.EndObject();
   }
   io_rWriter.EndArray();

@@ -4,31 +4,17 @@
 
 #include "CameraWorld.h"
 #include "Detections.h"
+#include "FolderVideos.h"
 #include "ReaderSupport.h"
 #include "UpAxis.h"
 
 #include <algorithm>
-#include <cctype>
 #include <cmath>
 
 namespace HostSources
 {
 namespace
 {
-/// Letters and digits alone, in lower case: "cam_01" and "Cam01" are one camera.
-std::string Plain( const std::string& i_rName )
-{
-  std::string Text;
-  for ( const char Character : i_rName )
-  {
-    if ( std::isalnum( static_cast< unsigned char >( Character ) ) )
-    {
-      Text += static_cast< char >( std::tolower( static_cast< unsigned char >( Character ) ) );
-    }
-  }
-  return Text;
-}
-
 std::string Rounded( double i_Pixels )
 {
   const std::string Text = std::to_string( i_Pixels );
@@ -59,6 +45,7 @@ private:
   void NameCameras();
   void AddOtherCameras();
   void GuessSensor( VRecordingCamera& io_rCamera );
+  bool FindVideos();
   void TurnToWorld( const VAxisTurn* i_pWanted );
   ZEK::IResult Finish();
   void Note( std::string i_Text ) { m_rRecording.Notes.push_back( std::move( i_Text ) ); }
@@ -237,8 +224,9 @@ void VJoin::NameCameras()
     const auto It = std::find_if( rKnown.begin(), rKnown.end(),
                                   [&]( const VCalibratedCamera& i_rKnown )
                                   {
-                                    return rCamera.Name.empty() ? rCamera.Id >= 0 && i_rKnown.UserId == rCamera.Id
-                                                                : Plain( i_rKnown.Name ) == Plain( rCamera.Name );
+                                    return rCamera.Name.empty()
+                                               ? rCamera.Id >= 0 && i_rKnown.UserId == rCamera.Id
+                                               : PlainName( i_rKnown.Name ) == PlainName( rCamera.Name );
                                   } );
     const auto Index = static_cast< std::size_t >( It - rKnown.begin() );
     VRecordingCamera& rSeen = m_rRecording.Cameras.emplace_back( std::move( rCamera.Seen ) );
@@ -279,6 +267,31 @@ void VJoin::AddOtherCameras()
       Note( "The camera \"" + m_Calibrations.Cameras[Index].Name + "\" saw nothing." );
     }
   }
+}
+
+/// Once the frames are known: the rate is the videos' where nothing else tells of it.
+bool VJoin::FindVideos()
+{
+  const auto Last = [&]( double i_Fraction )
+  {
+    return !m_rProgress || m_rProgress( std::min( i_Fraction, 1.0 ) );
+  };
+  if ( !VFolderVideos().Find( m_Files, m_rRecording, Last ) )
+  {
+    m_rMessage = "the reading was stopped";
+    return false;
+  }
+  if ( !m_bPointFile )
+  {
+    const double FromVideo = m_Detections.bPersons ? VFolderVideos::RateHz( m_rRecording ) : 0;
+    TakeRate( m_Detections.bPersons ? FromVideo : m_rRecording.RateHz, m_rRecording );
+    if ( FromVideo > 0 && m_rRecording.RateHz == FromVideo )
+    {
+      Note( "The frame rate is that of the videos." );
+    }
+  }
+  VFolderVideos::Match( m_Detections.First, m_Detections.Count, m_rRecording );
+  return true;
 }
 
 void VJoin::TurnToWorld( const VAxisTurn* i_pWanted )
@@ -368,7 +381,10 @@ ZEK::IResult VJoin::Run()
   if ( !m_bPointFile )
   {
     ChooseUpAxisByData( m_rRecording, "the tables do not tell" );
-    TakeRate( m_Detections.bPersons ? 0 : m_rRecording.RateHz, m_rRecording );
+  }
+  if ( !FindVideos() )
+  {
+    return ZEK::IResult::Canceled;
   }
   TurnToWorld( m_rOptions.WorldAxes.empty() ? nullptr : &Wanted );
   if ( m_Detections.bPersons )

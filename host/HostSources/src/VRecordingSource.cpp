@@ -3,6 +3,7 @@
 #include "RecordingCameras.h"
 #include "RecordingItems.h"
 #include "RecordingSubjects.h"
+#include "RecordingVideos.h"
 
 #include <CoreMoxelTypes/Device.h>
 #include <CoreMoxelTypes/FlowTypes.h>
@@ -60,6 +61,7 @@ public:
     : m_rRecording( i_rRecording )
     , m_Subjects( SubjectsOf( i_rRecording ) )
     , m_Cameras( i_rRecording, m_Subjects )
+    , m_Videos( i_rRecording )
   {
   }
 
@@ -67,6 +69,7 @@ public:
   ZEK::IResult MakeFastItems( const VStateMaker& i_rMaker, std::int64_t i_Index );
   ZEK::IResult AddSamples( const VStateMaker& i_rMaker, std::int64_t i_Index, ZEK::IFlowState& io_rState );
   void AddItems( const ZEK::VFlowTimeKey& i_rSlowKey, ZEK::IFlowState& io_rState ) const;
+  VRecordingVideos& Videos() { return m_Videos; }
 
 private:
   ZEK::IResult MakeAxisItems( const VStateMaker& i_rMaker, EUpAxis i_Up );
@@ -79,6 +82,7 @@ private:
   const VRecording& m_rRecording;
   const VRecordingSubjects m_Subjects;
   VRecordingCameras m_Cameras;
+  VRecordingVideos m_Videos;
   ZEK::VFlowStoreRef m_Store; ///< that made the items
   EUpAxis m_Up = EUpAxis::Z;
   std::vector< ZEK::VFlowItemRef > m_Slow;
@@ -165,6 +169,7 @@ ZEK::IResult VRecordingSource::VState::MakeSlowItems( const VStateMaker& i_rMake
   m_Points = {};
   m_Labels = {};
   m_PointsOf = m_LabelsOf = -1;
+  m_Videos.Forget();
   ZEK::IResult Result = MakeAxisItems( i_rMaker, i_Up );
   Result = Result.IsOk() ? MakeSubjectItems( i_rMaker ) : Result;
   Result = Result.IsOk() ? m_Cameras.MakeSlowItems( i_rMaker, m_Slow ) : Result;
@@ -267,6 +272,7 @@ ZEK::IResult VRecordingSource::VState::MakeLabels( const VStateMaker& i_rMaker, 
 ZEK::IResult VRecordingSource::VState::MakeFastItems( const VStateMaker& i_rMaker, std::int64_t i_Index )
 {
   ZEK::IResult Result;
+  m_Videos.Want( i_Index ); // decoders work while the rest is made
   if ( m_PointsOf < 0 || !SamePoints( m_PointsOf, i_Index ) )
   {
     Result = MakePoints( i_rMaker, i_Index );
@@ -275,7 +281,8 @@ ZEK::IResult VRecordingSource::VState::MakeFastItems( const VStateMaker& i_rMake
   {
     Result = MakeLabels( i_rMaker, i_Index );
   }
-  return Result.IsOk() ? m_Cameras.MakeFastItems( i_rMaker, i_Index ) : Result;
+  Result = Result.IsOk() ? m_Cameras.MakeFastItems( i_rMaker, i_Index ) : Result;
+  return Result.IsOk() ? m_Videos.MakeItems( i_rMaker, i_Index ) : Result;
 }
 
 ZEK::IResult VRecordingSource::VState::AddSamples( const VStateMaker& i_rMaker, std::int64_t i_Index,
@@ -314,6 +321,7 @@ void VRecordingSource::VState::AddItems( const ZEK::VFlowTimeKey& i_rSlowKey, ZE
     io_rState.AddItem( m_Labels );
   }
   m_Cameras.AddItems( io_rState );
+  m_Videos.AddItems( io_rState );
   for ( const ZEK::VFlowItemRef& rItem : m_Slow )
   {
     io_rState.AddItemAt( rItem, i_rSlowKey );
@@ -370,6 +378,11 @@ void VRecordingSource::SetUpAxis( EUpAxis i_Axis )
 {
   m_UpAxis = i_Axis;
   m_bOverruled = true;
+}
+
+void VRecordingSource::SetOnReady( std::function< void() > i_OnReady )
+{
+  m_pState->Videos().SetOnReady( i_OnReady );
 }
 
 std::int64_t VRecordingSource::NearestFrame( double i_Seconds ) const

@@ -8,6 +8,7 @@
 #include <mutex>
 #include <new>
 #include <thread>
+#include <utility>
 
 using namespace ZEK;
 
@@ -32,6 +33,7 @@ struct VSourcePump::VImpl
 {
   void Start( bool i_bLive, std::int64_t i_First );
   void Stop();
+  void Follow( bool i_bOn );
   void RunLive();
   void RunFollow();
   IResult TryMakeAndAdd( std::int64_t i_Index, bool i_bClear );
@@ -53,6 +55,7 @@ struct VSourcePump::VImpl
   bool bFailing = false;
   std::int64_t First = 0;
   bool bAsked = false;
+  bool bAgain = false; // what the frame that is shown lacked has come
   bool bBusy = false;
   bool bSeek = false;
   std::int64_t Asked = 0;
@@ -158,11 +161,21 @@ void VSourcePump::VImpl::RunLive()
     Next = Index + 1;
   }
   // A source that ended keeps its last frame until it is stopped.
-  Wake.wait( Lock,
-             [this]
-             {
-               return bStop;
-             } );
+  while ( !bStop )
+  {
+    Wake.wait( Lock,
+               [this]
+               {
+                 return bStop || bAgain;
+               } );
+    if ( !bStop && std::exchange( bAgain, false ) && Shown >= 0 )
+    {
+      const std::int64_t Index = Shown;
+      Lock.unlock();
+      MakeAndAdd( Index, false );
+      Lock.lock();
+    }
+  }
 }
 
 void VSourcePump::VImpl::RunFollow()
@@ -173,16 +186,21 @@ void VSourcePump::VImpl::RunFollow()
     Wake.wait( Lock,
                [this]
                {
-                 return bStop || bAsked;
+                 return bStop || bAsked || bAgain;
                } );
     if ( bStop )
     {
       return;
     }
-    const std::int64_t Index = Asked;
-    const bool bClear = bSeek || Index < Shown;
+    bAgain = false;
+    if ( !bAsked && Shown < 0 )
+    {
+      continue;
+    }
+    const std::int64_t Index = bAsked ? Asked : Shown;
+    const bool bClear = bAsked && ( bSeek || Index < Shown );
+    bSeek = bSeek && !bAsked;
     bAsked = false;
-    bSeek = false;
     bBusy = true;
     Lock.unlock();
     const bool bAdded = MakeAndAdd( Index, bClear );
@@ -193,15 +211,32 @@ void VSourcePump::VImpl::RunFollow()
   }
 }
 
+/// While the pump runs, the source must not keep it waiting.
+void VSourcePump::VImpl::Follow( bool i_bOn )
+{
+  const auto Again = [this]
+  {
+    {
+      const std::lock_guard Lock( Guard );
+      bAgain = true;
+    }
+    Wake.notify_all();
+  };
+  const std::lock_guard Lock( SourceGuard );
+  pSource->SetOnReady( i_bOn ? std::function< void() >( Again ) : std::function< void() >() );
+}
+
 void VSourcePump::VImpl::Start( bool i_bLive, std::int64_t i_First )
 {
   const std::lock_guard Control( ControlGuard );
   Stop();
+  Follow( true );
   const std::lock_guard Lock( Guard );
   First = std::max< std::int64_t >( i_First, 0 );
   bStop = false;
   bLive = i_bLive;
   bFailing = false;
+  bAgain = false;
   Shown = -1;
   Thread = std::thread( i_bLive ? &VImpl::RunLive : &VImpl::RunFollow, this );
   bRunning = true; // only now: nobody may wait for a thread that could not be made
@@ -219,6 +254,7 @@ void VSourcePump::VImpl::Stop()
   }
   Wake.notify_all();
   Thread.join();
+  Follow( false );
   {
     const std::lock_guard Lock( Guard );
     bRunning = false;

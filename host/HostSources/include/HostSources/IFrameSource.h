@@ -4,6 +4,7 @@
 #include <ZEK/Result.h>
 
 #include <cstdint>
+#include <functional>
 #include <string>
 
 namespace HostSources
@@ -46,6 +47,10 @@ public:
   virtual void SetUpAxis( EUpAxis i_Axis ) = 0;
   /// `InvalidIndex` off the recording.
   virtual ZEK::IResult MakeState( std::int64_t i_Index, const VStateMaker& i_rMaker, ZEK::VFlowStateRef& o_rState ) = 0;
+  /// With a function, `MakeState` does not wait for what takes long, the frames of video: the state has the nearest
+  /// that are there, and the function is called when those that it lacked have come, so that the same frame may be made
+  /// again. It is called on any thread and must not call the source. Without one, as at first, `MakeState` waits.
+  virtual void SetOnReady( std::function< void() > ) {}
 
   std::int64_t TicksPerFrame() const
   {

@@ -3,6 +3,7 @@
 #include <HostSources/VRecording.h>
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -30,6 +31,14 @@ struct VRecordingInfo
     CoreMoxelTypes::D3 PeakCentre; ///< mm, world; NaN where there is none
   };
 
+  struct VVideo
+  {
+    std::string File, Codec, PixelFormat;
+    std::uint32_t Width = 0, Height = 0; ///< px
+    std::int64_t FrameCount = 0;
+    double RateHz = 0;
+    bool bByNumber = true; ///< shown frame by frame, otherwise the nearest in time
+  };
   struct VCamera
   {
     std::string Name;
@@ -39,6 +48,7 @@ struct VRecordingInfo
     std::uint64_t FramesSeen = 0;                     ///< frames with a detection
     std::uint64_t MeasuredCount = 0;
     double MeanDistance = 0, WorstDistance = 0; ///< of detections from projected points, px
+    std::optional< VVideo > Video;
   };
 
   std::string Name, Format, Form, Unit;

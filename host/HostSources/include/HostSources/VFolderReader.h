@@ -26,6 +26,9 @@ struct VFolderOptions
 /// metres) or the first TRC or C3D file by name. The calibration is sought in the folder, then in its parent; a camera
 /// without one is there uncalibrated. Notes say what was taken.
 ///
+/// Video files that lie in the folder, or in folders within it, go to the camera of their name, frame by frame where
+/// there are as many frames as detections, otherwise by time.
+///
 /// Of several persons in the image, the one nearest to the projected points is taken for the subject.
 /// Failures are those of `ReadRecording`; a folder without anything to read is `FileIOFailure`.
 ZEK::IResult ReadFolder( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,

@@ -18,7 +18,8 @@ namespace HostSources
 /// prefix "Subject:" (the file's stem where there is none); `SubjectId` is the subject's `Id`, from 1, and `MarkerId`
 /// the index into its `Markers`. Beside them stand the up axis, the volume's floor, each force plate with the samples
 /// of the frame, and each camera with its hardware, calibration, centroids, their labels and their assignments (index
-/// into the frame's reconstructions). Coordinates stay as they are when y is up: the view is told by the up axis.
+/// into the frame's reconstructions), and the frame of its video where it has one. Coordinates stay as they are when y
+/// is up: the view is told by the up axis.
 class VRecordingSource final : public IFrameSource
 {
 public:
@@ -33,6 +34,7 @@ public:
   std::string UpAxisReason() const override;
   void SetUpAxis( EUpAxis i_Axis ) override;
   ZEK::IResult MakeState( std::int64_t i_Index, const VStateMaker& i_rMaker, ZEK::VFlowStateRef& o_rState ) override;
+  void SetOnReady( std::function< void() > i_OnReady ) override;
 
   const VRecording& Recording() const { return *m_pRecording; }
   /// The frame nearest to a time, within the recording.

@@ -11,6 +11,7 @@ namespace HostSources
 
 /// Carries the frames of a source into a cache on a thread of its own, live or as a playback clock asks.
 ///
+/// A frame whose slow parts come late is shown again with them.
 /// A frame that cannot be made is logged once a run of failures, its result kept, and the pump goes on.
 /// Thread: all operations from any thread, but `Stop` and the destructor not from the cache's notifiers.
 class VSourcePump
