@@ -10,11 +10,21 @@ namespace CoreGraphics
 
 const char* AttributeName( EVertexAttribute i_Attribute )
 {
-  static constexpr std::array< const char*, EAttributeCount > Names = {
-      "a_position",         "a_normal",       "a_colour",         "a_uv",
-      "a_BoneIndices",      "a_BoneWeights",  "u_ModelTransform", "u_ReconPosAndSize",
-      "u_TargetPosAndSize", "u_ModelColour",  "u_StickColourA",   "u_StickColourB",
-      "u_SegmentColour",    "a_InstanceFlags" };
+  static constexpr std::array< const char*, EAttributeCount > Names = { "a_position",
+                                                                        "a_normal",
+                                                                        "a_colour",
+                                                                        "a_uv",
+                                                                        "a_BoneIndices",
+                                                                        "a_BoneWeights",
+                                                                        "u_ModelTransform",
+                                                                        "u_ReconPosAndSize",
+                                                                        "u_TargetPosAndSize",
+                                                                        "u_ModelColour",
+                                                                        "u_StickColourA",
+                                                                        "u_StickColourB",
+                                                                        "u_SegmentColour",
+                                                                        "a_InstanceFlags",
+                                                                        "a_Tile" };
   return Names[i_Attribute];
 }
 

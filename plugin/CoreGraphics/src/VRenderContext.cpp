@@ -27,6 +27,7 @@ constexpr GLenum PointSizeRange = 0x0B12;
 constexpr GLenum DebugOutput = 0x92E0;
 constexpr GLenum FramebufferSRGB = 0x8DB9;
 constexpr GLenum MaximumTextureAnisotropy = 0x84FF;
+constexpr GLenum MaximumTextureBufferSize = 0x8C2B;
 constexpr float WantedAnisotropy = 16.0f;
 constexpr int FixedArrays = 8;
 
@@ -76,6 +77,18 @@ VRenderContext::VRenderContext()
 
 VRenderContext::~VRenderContext() = default;
 
+std::shared_ptr< void >& VRenderContext::Belonging( const void* i_pOwner )
+{
+  for ( auto& [pOwner, rpHeld] : m_Belongings )
+  {
+    if ( pOwner == i_pOwner )
+    {
+      return rpHeld;
+    }
+  }
+  return m_Belongings.emplace_back( i_pOwner, nullptr ).second;
+}
+
 QOpenGLContext* VRenderContext::Context() const
 {
   return m_pContext;
@@ -115,6 +128,11 @@ void VRenderContext::ReadLimits()
   std::array< GLfloat, 2 > PointSizes{ 1.0f, 1.0f };
   m_pFunctions->glGetFloatv( m_bES ? GL_ALIASED_POINT_SIZE_RANGE : PointSizeRange, PointSizes.data() );
   m_MaximumPointSize = PointSizes[1];
+  m_MaximumBufferTexels = 0;
+  if ( !m_bES && Format.version() >= std::pair( 3, 3 ) )
+  {
+    m_pFunctions->glGetIntegerv( MaximumTextureBufferSize, &m_MaximumBufferTexels );
+  }
   m_Anisotropy = 1.0f;
   if ( m_bSoftware )
   {

@@ -206,6 +206,13 @@ void VRenderContext::BindTexture( int i_Unit, GLuint i_Texture )
   m_pFunctions->glBindTexture( GL_TEXTURE_2D, i_Texture );
 }
 
+void VRenderContext::BindBufferTexture( int i_Unit, GLuint i_Texture )
+{
+  constexpr GLenum TextureBuffer = 0x8C2A; // a name that the headers of OpenGL ES lack
+  ActiveUnit( i_Unit );
+  m_pFunctions->glBindTexture( TextureBuffer, i_Texture );
+}
+
 void VRenderContext::BindFramebufferTexture( int i_Unit, const QOpenGLFramebufferObject* i_pFramebuffer )
 {
   BindTexture( i_Unit, i_pFramebuffer ? i_pFramebuffer->texture() : 0 );

@@ -164,9 +164,10 @@ std::shared_ptr< VShaderProgram > VResources::GetProgram( const std::string& i_r
   if ( !rpProgram )
   {
     const bool bSelection = i_Form == EFormInstancedSelection || i_Form == EFormPointsSelection;
+    const EShaderForm Single = i_Form == EFormTextureBuffers ? EFormTextureBuffers : EFormSingle;
     rpProgram = std::make_shared< VShaderProgram >(
         FindShader( EVertexShader, i_rVertexName, i_Form ),
-        FindShader( EFragmentShader, i_rFragmentName, bSelection ? EFormInstancedSelection : EFormSingle ) );
+        FindShader( EFragmentShader, i_rFragmentName, bSelection ? EFormInstancedSelection : Single ) );
   }
   return rpProgram;
 }

@@ -21,6 +21,10 @@ QByteArray FormLines( EShaderType i_Type, EShaderForm i_Form )
   {
     return {};
   }
+  if ( i_Form == EFormTextureBuffers )
+  {
+    return "#define TEXTURE_BUFFERS\n";
+  }
   if ( i_Type == EFragmentShader )
   {
     return "#define PER_OBJECT flat in\n";
@@ -81,7 +85,9 @@ QByteArray VShader::Prefix( EShaderType i_Type, EShaderDialect i_Dialect )
 QByteArray VShader::Compose( const QByteArray& i_rSource, EShaderType i_Type, EShaderForm i_Form,
                              EShaderDialect i_Dialect )
 {
-  QByteArray Text = Prefix( i_Type, i_Dialect ) + FormLines( i_Type, i_Form ) + "#line 1\n" + i_rSource;
+  // The language of OpenGL ES 3 has no texture buffers.
+  const EShaderDialect Dialect = i_Form == EFormTextureBuffers ? EDialectDesktop330 : i_Dialect;
+  QByteArray Text = Prefix( i_Type, Dialect ) + FormLines( i_Type, i_Form ) + "#line 1\n" + i_rSource;
   if ( i_Type == EVertexShader && IsSelection( i_Form ) )
   {
     Text += SelectionLines( i_Form );

@@ -30,9 +30,14 @@ std::uint64_t VVertexBuffer::TotalBytesUploaded()
   return s_Uploaded.load( std::memory_order_relaxed );
 }
 
-void VVertexBuffer::CountUpload( std::size_t i_Bytes )
+void VVertexBuffer::CountBytes( std::size_t i_Bytes )
 {
   s_Uploaded.fetch_add( i_Bytes, std::memory_order_relaxed );
+}
+
+void VVertexBuffer::CountUpload( std::size_t i_Bytes )
+{
+  CountBytes( i_Bytes );
   m_Serial = s_Serial.fetch_add( 1, std::memory_order_relaxed ) + 1;
 }
 

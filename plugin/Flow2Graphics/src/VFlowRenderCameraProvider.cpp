@@ -174,6 +174,7 @@ ZEK::VRenderCameraRef VFlowRenderCameraProvider::GetCamera( const std::string& i
 
 void VFlowRenderCameraProvider::Update( const ZEK::IFlowState& i_rState )
 {
+  ++m_Generation;
   TakeSubjects( i_rState );
   CameraExtractor.Update( i_rState, ZEK::EFlowNameDevice, EFlowTimeMatch::Overlap, i_rState.GetKey() );
   const bool bNames = CameraExtractor.NamesChanged();

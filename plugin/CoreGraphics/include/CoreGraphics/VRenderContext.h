@@ -16,6 +16,8 @@
 #include <cstdint>
 #include <memory>
 #include <span>
+#include <utility>
+#include <vector>
 
 class QOpenGLDebugLogger;
 class QOpenGLFramebufferObject;
@@ -75,6 +77,8 @@ public:
 
   /// Binds a 2D texture; 0 unbinds. The unit stays the active one.
   void BindTexture( int i_Unit, GLuint i_Texture );
+  /// The same for a texture that reads a buffer.
+  void BindBufferTexture( int i_Unit, GLuint i_Texture );
   /// Binds the colour texture; filtered nearest in the modes 1 and 2, linear in mode 0. Null unbinds.
   void BindFramebufferTexture( int i_Unit, const QOpenGLFramebufferObject* i_pFramebuffer );
   /// Acts on the texture of the active unit.
@@ -137,11 +141,17 @@ public:
   /// The level to give to textures seen at an angle: 16 or the device's maximum; 1 on a software rasteriser.
   float Anisotropy() const { return m_Anisotropy; }
   bool IsSoftwareRasteriser() const { return m_bSoftware; }
+  /// The texels that a texture buffer may have; 0 where the context has none.
+  int MaximumBufferTexels() const { return m_MaximumBufferTexels; }
 
   /// Draw calls since `ResetCounters`, and bytes written to buffers by this process since then.
   std::uint64_t DrawCalls() const { return m_DrawCalls; }
   std::uint64_t BytesUploaded() const { return VVertexBuffer::TotalBytesUploaded() - m_UploadedAtReset; }
   void ResetCounters();
+
+  /// What an owner keeps for this context alone, such as framebuffers, which contexts do not share; null at first. It
+  /// ends with the context, while that is current. The owner is told apart by its address.
+  std::shared_ptr< void >& Belonging( const void* i_pOwner );
 
 private:
   static constexpr int LocationCount = 16;
@@ -242,8 +252,10 @@ private:
   bool m_bReadErrors = false;
   float m_MaximumPointSize = 1.0f;
   float m_Anisotropy = 1.0f;
+  int m_MaximumBufferTexels = 0;
   std::uint64_t m_DrawCalls = 0;
   std::uint64_t m_UploadedAtReset = 0;
+  std::vector< std::pair< const void*, std::shared_ptr< void > > > m_Belongings;
 };
 
 } // namespace CoreGraphics

@@ -21,7 +21,8 @@ enum EShaderForm
   EFormSingle,             ///< as uniforms: a draw an object
   EFormInstanced,          ///< as attributes: a draw for all objects
   EFormInstancedSelection, ///< as attributes, and the selection colour from `u_FirstId`, instance and flag byte
-  EFormPointsSelection     ///< the same for objects that are one vertex each
+  EFormPointsSelection,    ///< the same for objects that are one vertex each
+  EFormTextureBuffers      ///< as EFormSingle, with TEXTURE_BUFFERS defined; for contexts that have them
 };
 
 /// The version lines that a context can compile.

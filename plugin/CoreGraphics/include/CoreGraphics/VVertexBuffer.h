@@ -28,8 +28,13 @@ public:
   /// Changes with the contents; no two buffers of the process ever have the same.
   std::uint64_t Serial() const { return m_Serial; }
 
+  /// The buffer object; 0 when there is none.
+  GLuint Id() const { return m_Buffer.bufferId(); }
+
   /// Bytes written to buffers by this process so far.
   static std::uint64_t TotalBytesUploaded();
+  /// Counts what was written past this class.
+  static void CountBytes( std::size_t i_Bytes );
 
 protected:
   explicit VVertexBuffer( QOpenGLBuffer::Type i_Type )

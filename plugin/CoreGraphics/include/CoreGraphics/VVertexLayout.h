@@ -30,6 +30,7 @@ enum EVertexAttribute : std::uint8_t
   EAttributeStickColourB,     ///< vec4
   EAttributeSegmentColour,    ///< vec4
   EAttributeInstanceFlags,    ///< EInstanceFlag bits, not normalised; from bit 8 on, ids left out so far, below 0x4000
+  EAttributeTile,             ///< float: the row of a table that the object is placed by
   EAttributeCount
 };
 

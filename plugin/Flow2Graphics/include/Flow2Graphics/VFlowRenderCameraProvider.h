@@ -66,6 +66,7 @@ public:
 
   ZEK::VRenderCameraRef GetCamera( const std::string& i_rName ) const override;
   const std::vector< ZEK::VRenderCameraRef >& GetCameras() const override { return m_List; }
+  std::uint64_t GetGeneration() const override { return m_Generation; }
 
   /// The same as what they are.
   const std::vector< std::shared_ptr< VFlowRenderCamera > >& FlowCameras() const { return m_Slots; }
@@ -107,6 +108,7 @@ private:
   bool m_bOtherLabels = false;         ///< than in the update before
   std::vector< VCameraMarks > m_Marks; ///< by slot, while marks are given
   std::uint64_t m_MarksGeneration = 0;
+  std::uint64_t m_Generation = 0; ///< grows with each update
   VCameraMembers m_Centroids, m_Blobs;
   std::uint32_t m_FirstCentroid = 0, m_FirstBlob = 0;
 };
