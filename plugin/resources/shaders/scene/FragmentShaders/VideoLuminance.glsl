@@ -1,4 +1,5 @@
 uniform sampler2D t_Texture;
+uniform bool u_Wide; // two bytes a pixel in r and g, the lesser one first
 uniform float u_GammaCorrection;
 uniform float u_VideoSaturation;
 
@@ -21,5 +22,7 @@ void main()
   {
     discard;
   }
-  gl_FragColor = vec4( Adjusted( texture2D( t_Texture, v_uv ).rrr ), 1.0 );
+  vec2 bytes = texture2D( t_Texture, v_uv ).rg;
+  float grey = u_Wide ? dot( bytes, vec2( 1.0, 256.0 ) ) / 257.0 : bytes.r;
+  gl_FragColor = vec4( Adjusted( vec3( grey ) ), 1.0 );
 }

@@ -1,6 +1,8 @@
 uniform sampler2D t_TextureY;
 uniform sampler2D t_TextureU;
 uniform sampler2D t_TextureV;
+uniform bool u_Paired;     // both chroma channels are in t_TextureU
+uniform vec2 u_ChromaTrim; // the part of the chroma that lies beyond a picture of odd size
 uniform float u_GammaCorrection;
 uniform float u_VideoSaturation;
 
@@ -32,6 +34,9 @@ void main()
   {
     discard;
   }
-  vec3 yuv = vec3( texture2D( t_TextureY, v_uv ).r, texture2D( t_TextureU, v_uv ).r, texture2D( t_TextureV, v_uv ).r );
+  vec2 uv = v_uv * ( 1.0 - u_ChromaTrim );
+  vec2 chroma = texture2D( t_TextureU, uv ).rg;
+  chroma.g = u_Paired ? chroma.g : texture2D( t_TextureV, uv ).r;
+  vec3 yuv = vec3( texture2D( t_TextureY, v_uv ).r, chroma );
   gl_FragColor = vec4( Adjusted( FromYUV( yuv, textureSize( t_TextureY, 0 ).y ) ), 1.0 );
 }
