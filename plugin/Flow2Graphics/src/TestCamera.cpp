@@ -1,5 +1,7 @@
 #include "TestCamera.h"
 
+#include <CoreVideoUtils/VideoTestPattern.h>
+
 #include <algorithm>
 #include <cmath>
 #include <utility>
@@ -91,33 +93,9 @@ void Fill( VCameraMaskGrid& o_rMask )
   }
 }
 
-/// Eight bars from white to black, the lower quarter a ramp of greys.
-VImageSet::I ColourBars()
-{
-  VImageSet::I Image;
-  Image.Tag = "Test image";
-  Image.Width = 160;
-  Image.Height = 90;
-  Image.Components = 3;
-  Image.Data.reserve( std::size_t{ Image.Width } * Image.Height * Image.Components );
-  for ( u32 y = 0; y < Image.Height; ++y )
-  {
-    for ( u32 x = 0; x < Image.Width; ++x )
-    {
-      const u32 Bar = 7 - x * 8 / Image.Width;
-      const auto Grey = static_cast< u8 >( x * 255 / ( Image.Width - 1 ) );
-      for ( const u32 Bit : { 2u, 4u, 1u } ) // yellow follows white, blue comes before black
-      {
-        Image.Data.push_back( y * 4 >= Image.Height * 3 ? Grey : ( Bar & Bit ) != 0 ? 0xff : 0 );
-      }
-    }
-  }
-  return Image;
-}
-
 void Fill( VImageSet& o_rSet )
 {
-  static const VImageSet::I Image = ColourBars(); // the same for every camera
+  static const VImageSet::I Image = CoreVideoUtils::ColourBars( 160, 90 ); // the same for every camera
   o_rSet.Images.push_back( Image );
   o_rSet.Identifiers = { "m:123", "s:456" };
 }
