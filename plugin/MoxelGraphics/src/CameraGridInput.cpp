@@ -46,10 +46,7 @@ bool ReadNumber( const QVariantMap& i_rMap, const QString& i_rKey, float& o_rNum
 
 int VCameraGrid::TileAt( QPoint i_Point ) const
 {
-  // A pointer at the very edge is rounded out of the frame.
-  const QPoint Inside( i_Point.x() == m_FrameSize.width() ? i_Point.x() - 1 : i_Point.x(),
-                       i_Point.y() == m_FrameSize.height() ? i_Point.y() - 1 : i_Point.y() );
-  return MoxelGraphics::TileAt( m_Tiles, { Inside.x(), m_FrameSize.height() - 1 - Inside.y() } );
+  return TileUnder( m_Tiles, m_FrameSize, i_Point );
 }
 
 void VCameraGrid::EndGesture()

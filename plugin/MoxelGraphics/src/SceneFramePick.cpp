@@ -98,12 +98,10 @@ void VSceneFrame::Highlight()
   m_pScene->SetHighlighted( bDrawn );
 }
 
-const VCameraTile* VSceneFrame::TileUnder( QPoint i_Point ) const
+const VCameraTile* VSceneFrame::TileUnderPointer( QPoint i_Point ) const
 {
   const bool bTiles = m_Input.Options.CameraView && m_Input.Tiles;
-  // A pointer at the very edge is rounded out of the frame.
-  const QPoint Inside( std::min( i_Point.x(), m_Size.width() - 1 ), std::min( i_Point.y(), m_Size.height() - 1 ) );
-  const int Index = bTiles ? TileAt( *m_Input.Tiles, { Inside.x(), m_Size.height() - 1 - Inside.y() } ) : -1;
+  const int Index = bTiles ? TileUnder( *m_Input.Tiles, m_Size, i_Point ) : -1;
   return Index < 0 ? nullptr : &( *m_Input.Tiles )[static_cast< std::size_t >( Index )];
 }
 
@@ -140,7 +138,7 @@ void VSceneFrame::PickPoint()
   }
   m_Pixels.assign( static_cast< std::size_t >( Window.width() ) * static_cast< std::size_t >( Window.height() ), 0 );
   m_pScene->SetIgnoredIds( {} );
-  Draw( Window, TileUnder( m_Input.Pointer ) );
+  Draw( Window, TileUnderPointer( m_Input.Pointer ) );
   m_pContext->ReadPixels( Window, m_Pixels.data(), GL_RGBA );
 
   float Nearest = std::numeric_limits< float >::max();
@@ -168,9 +166,9 @@ void VSceneFrame::PickPoint()
 int VSceneFrame::PickBand()
 {
   constexpr double Scale = 0.5;
-  const VCameraTile* pTile = TileUnder( m_Input.Pointer );
+  const VCameraTile* pTile = TileUnderPointer( m_Input.Pointer );
   // A hand that slips off all tiles goes on with the one where it began.
-  pTile = pTile ? pTile : TileUnder( m_Input.BandStart );
+  pTile = pTile ? pTile : TileUnderPointer( m_Input.BandStart );
   const auto Scaled = [&]( QPoint i_Point )
   {
     QPoint Point( i_Point.x(), m_Size.height() - i_Point.y() );

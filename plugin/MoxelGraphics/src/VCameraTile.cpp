@@ -27,4 +27,12 @@ int TileAt( const VCameraTiles& i_rTiles, QPoint i_Point )
   return Found == i_rTiles.end() ? -1 : static_cast< int >( Found - i_rTiles.begin() );
 }
 
+int TileUnder( const VCameraTiles& i_rTiles, QSize i_Frame, QPoint i_Point )
+{
+  // A pointer at the very edge is rounded out of the frame.
+  const QPoint Inside( i_Point.x() == i_Frame.width() ? i_Point.x() - 1 : i_Point.x(),
+                       i_Point.y() == i_Frame.height() ? i_Point.y() - 1 : i_Point.y() );
+  return i_Frame.isEmpty() ? -1 : TileAt( i_rTiles, { Inside.x(), i_Frame.height() - 1 - Inside.y() } );
+}
+
 } // namespace MoxelGraphics

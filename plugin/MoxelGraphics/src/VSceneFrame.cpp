@@ -319,11 +319,11 @@ void VSceneFrame::PaintTiles( QPainter& io_rPainter )
   {
     const QRect& rRect = rTile.Rect;
     io_rPainter.save();
-    io_rPainter.setClipRect( rRect.x(), m_Size.height() - rRect.y() - rRect.height(), rRect.width(), rRect.height() );
     // The context's viewport is the painter's too.
     io_rPainter.beginNativePainting();
     ApplyTile( rTile, *m_pContext );
     io_rPainter.endNativePainting();
+    io_rPainter.setClipRect( rRect.x(), m_Size.height() - rRect.y() - rRect.height(), rRect.width(), rRect.height() );
     m_Input.Options.OverlayCamera = rTile.DeviceURN;
     m_pScene->Paint( io_rPainter, *m_pContext, m_Input.Options );
     io_rPainter.restore();

@@ -1,7 +1,9 @@
 #include "ItemFixture.h"
+#include "TileFixture.h"
 
 #include <QtOpenGL/QOpenGLDebugLogger>
 #include <random>
+#include <set>
 #include <thread>
 
 // Run once as it is, and once with QSG_RENDER_LOOP=threaded; that again under a thread sanitizer.
@@ -309,6 +311,41 @@ TEST_F( VWindowLife, OneSceneOverTwoTopLevelWindowsAndAViewThatMovesBetweenThem 
   ASSERT_TRUE( pA->Frames( 3 ) );
   EXPECT_EQ( First, pA->grabFramebuffer() );
   EXPECT_GE( Watch.Starts, 3 );
+}
+
+TEST_F( VWindowLife, ACameraViewWhoseCamerasComeAndGoUnderTheHand )
+{
+  // The cameras change on the thread that draws, tiles on that of the hand.
+  const auto pCameras = std::make_shared< VRenderCallback >();
+  pCameras->Function = [this, Step = 0]() mutable
+  {
+    pScene->SetCameraDefinitions( TestCameras( 3 + ++Step / 4 % 3 ) );
+  };
+  pScene->AddRenderCallback( pCameras );
+  const auto pGrid = std::make_shared< VCameraGrid >( false );
+  std::set< int > Counts;
+  {
+    VSource Source( *pScene );
+    VTestView Window( pScene );
+    Watch.Follow( Window );
+    Window.pItem->SetCameraGrid( pGrid.get() );
+    Window.pItem->setOption( "CameraView", true );
+    Window.show();
+    const auto Work = [&, Turn = 0]() mutable
+    {
+      const QPointF There( 20 + Turn * 7 % 600, 20 + Turn * 11 % 320 );
+      ++Turn % 8 == 0 ? Window.Press( There ) : Turn % 8 == 7 ? Window.Release( There ) : Window.Drag( There );
+      Window.pItem->setWidth( 400 + Turn % 200 );
+      Window.pItem->update();
+      Counts.insert( pGrid->Count() );
+      return Window.Drawn() > 60 && Counts.size() > 3;
+    };
+    EXPECT_TRUE( Until( Work ) );
+  }
+  pCameras->bDone = true;
+  pScene->MarkDirty();
+  pScene->ProcessPending();
+  EXPECT_EQ( Counts, ( std::set< int >{ 0, 3, 4, 5 } ) );
 }
 
 } // namespace MoxelGraphics

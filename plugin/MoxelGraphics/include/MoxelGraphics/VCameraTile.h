@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QtCore/QRect>
+#include <QtCore/QSize>
 #include <QtCore/QString>
 
 #include <array>
@@ -55,5 +56,7 @@ using VCameraTilesRef = std::shared_ptr< const VCameraTiles >;
 void ApplyTile( const VCameraTile& i_rTile, CoreGraphics::VRenderContext& io_rContext );
 /// The first tile that holds the point, in pixels of the frame, y up; -1 when there is none.
 int TileAt( const VCameraTiles& i_rTiles, QPoint i_Point );
+/// The same for a pointer, in pixels from the top left of the frame.
+int TileUnder( const VCameraTiles& i_rTiles, QSize i_Frame, QPoint i_Point );
 
 } // namespace MoxelGraphics

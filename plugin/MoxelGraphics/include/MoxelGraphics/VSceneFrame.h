@@ -130,7 +130,7 @@ private:
   void DrawView();
   void DrawAllTiles();
   /// Where a pick looks: the tile under a point, pixels from the top left; null when there is none.
-  const VCameraTile* TileUnder( QPoint i_Point ) const;
+  const VCameraTile* TileUnderPointer( QPoint i_Point ) const;
   void DrawTile( const VCameraTile& i_rTile, const QRect& i_rViewport, const QRect& i_rScissor );
   void PaintTiles( QPainter& io_rPainter );
   void PaintOverlay( const QOpenGLFramebufferObject& i_rTarget );

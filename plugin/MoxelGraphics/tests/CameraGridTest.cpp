@@ -1,0 +1,557 @@
+#include <MoxelGraphics/VCameraGrid.h>
+#include <MoxelGraphics/VCameraGridSelection.h>
+
+#include <HostServices/VSelectionService.h>
+
+#include <QtCore/QJsonDocument>
+#include <QtCore/QJsonObject>
+#include <QtGui/QKeyEvent>
+#include <QtGui/QMouseEvent>
+#include <QtGui/QWheelEvent>
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <random>
+#include <set>
+
+namespace MoxelGraphics
+{
+namespace
+{
+using VRoles = std::vector< QList< int > >;
+
+VCameraDefinition Camera( const std::string& i_rURN, int i_Width = 640, int i_Height = 480 )
+{
+  VCameraDefinition Definition;
+  Definition.DeviceURN = i_rURN;
+  Definition.DisplayType = "type of " + i_rURN;
+  Definition.UserId = 7;
+  Definition.ImageWidth = i_Width;
+  Definition.ImageHeight = i_Height;
+  return Definition;
+}
+
+std::vector< VCameraDefinition > Cameras( const std::vector< std::string >& i_rURNs )
+{
+  std::vector< VCameraDefinition > List;
+  for ( const std::string& rURN : i_rURNs )
+  {
+    List.push_back( Camera( rURN ) );
+  }
+  return List;
+}
+
+/// A grid whose signals are written down.
+class VGridTest : public testing::Test
+{
+protected:
+  VGridTest() { Show( false ); }
+  void Show( bool i_bSingle )
+  {
+    pGrid = std::make_shared< VCameraGrid >( i_bSingle );
+    QObject::connect( pGrid.get(), &VCameraGrid::dataChanged,
+                      [this]( const QModelIndex& i_rFrom, const QModelIndex& i_rTo, const QList< int >& i_rRoles )
+                      {
+                        EXPECT_EQ( i_rTo.row() - i_rFrom.row() + 1,
+                                   i_rRoles == QList< int >{ 266 } ? 1 : pGrid->rowCount() );
+                        Reported.push_back( i_rRoles );
+                      } );
+    QObject::connect( pGrid.get(), &VCameraGrid::modelReset,
+                      [this]
+                      {
+                        ++Resets;
+                      } );
+    QObject::connect( pGrid.get(), &VCameraGrid::CountChanged,
+                      [this]
+                      {
+                        ++Counts;
+                      } );
+    Requests = pGrid->TileRequested().Connect(
+        [this]( const QStringList& i_rURNs )
+        {
+          Requested.push_back( i_rURNs );
+        },
+        nullptr );
+  }
+  void Mouse( QEvent::Type i_Type, QPointF i_Place, Qt::MouseButton i_Button )
+  {
+    QMouseEvent Event( i_Type, i_Place, i_Place, i_Type == QEvent::MouseMove ? Qt::NoButton : i_Button, i_Button, {} );
+    i_Type == QEvent::MouseButtonPress      ? pGrid->MousePress( Event, Ratio )
+    : i_Type == QEvent::MouseButtonDblClick ? pGrid->DoubleClick( Event, Ratio )
+                                            : pGrid->MouseMove( Event, Ratio );
+  }
+  void Drag( Qt::MouseButton i_Button, QPointF i_From, QPointF i_To )
+  {
+    Mouse( QEvent::MouseButtonPress, i_From, i_Button );
+    Mouse( QEvent::MouseMove, ( i_From + i_To ) / 2, i_Button );
+    Mouse( QEvent::MouseMove, i_To, i_Button );
+  }
+  void Wheel( QPointF i_Place, int i_Delta )
+  {
+    QWheelEvent Event( i_Place, i_Place, {}, { 0, i_Delta }, {}, {}, Qt::NoScrollPhase, false );
+    pGrid->Wheel( Event, Ratio );
+  }
+  bool Key( Qt::Key i_Key ) { return pGrid->KeyPress( QKeyEvent( QEvent::KeyPress, i_Key, {} ) ); }
+  QVariant Data( int i_Row, int i_Role ) const { return pGrid->data( pGrid->index( i_Row ), i_Role ); }
+  QStringList URNs() const
+  {
+    VCameraGrid::VURNs Pinned;
+    QStringList List;
+    pGrid->GetPinnedCameras( Pinned, List );
+    return List;
+  }
+  const VCameraTile& Tile( std::size_t i_Index = 0 ) const { return pGrid->Tiles().at( i_Index ); }
+  /// The part of the image that stands under a point of the frame, y down.
+  std::array< double, 2 > Under( const VCameraTile& i_rTile, QPointF i_Point ) const
+  {
+    const QRect& rRect = i_rTile.Rect;
+    const double Top = pGrid->FrameSize().height() - rRect.y() - rRect.height();
+    const double X = ( i_Point.x() - rRect.x() ) / rRect.width() - 0.5;
+    const double Y = ( i_Point.y() - Top ) / rRect.height() - 0.5;
+    return { i_rTile.PanX + X / ( static_cast< double >( i_rTile.ScaleX ) * i_rTile.Zoom ),
+             i_rTile.PanY + Y / ( static_cast< double >( i_rTile.ScaleY ) * i_rTile.Zoom ) };
+  }
+
+  double Ratio = 1.0;
+  std::shared_ptr< VCameraGrid > pGrid;
+  ZEK::VConnection Requests;
+  VRoles Reported;
+  std::vector< QStringList > Requested;
+  int Resets = 0;
+  int Counts = 0;
+};
+
+/// Rows of the layout with the greatest score, worked out the long way.
+int BestRows( const VCameraTiles& i_rTiles, int i_Width, int i_Height )
+{
+  const int Count = static_cast< int >( i_rTiles.size() );
+  double Best = 0;
+  int Rows = 1;
+  for ( int Try = 1; Try <= Count; ++Try )
+  {
+    const int Columns = static_cast< int >( std::ceil( static_cast< double >( Count ) / Try ) );
+    std::set< int > Used;
+    for ( int Index = 0; Index < Count; ++Index )
+    {
+      Used.insert( Index / Columns );
+    }
+    const int W = i_Width / Columns, H = i_Height / Try;
+    if ( static_cast< int >( Used.size() ) < Try || W == 0 || H == 0 )
+    {
+      continue;
+    }
+    double Score = 0;
+    for ( const VCameraTile& rTile : i_rTiles )
+    {
+      const double A = static_cast< double >( W ) / H, B = rTile.RotatedAspect;
+      Score += std::min( A, B ) / std::max( A, B );
+    }
+    Score /= Columns * Try;
+    Rows = Score > Best ? Try : Rows;
+    Best = std::max( Best, Score );
+  }
+  return Rows;
+}
+
+/// All of the image is seen, as large as that allows, and nothing of it is stretched.
+void ExpectFit( const VCameraTile& i_rTile, double i_W, double i_H, const std::array< float, 4 >& i_rTurn )
+{
+  const double PixelX = i_W * i_rTile.ScaleX / i_rTile.ImageWidth, PixelY = i_H * i_rTile.ScaleY / i_rTile.ImageHeight;
+  EXPECT_NEAR( PixelX / PixelY, 1.0, 1e-4 );
+  double Left = 0, Right = 0, Bottom = 0, Top = 0;
+  for ( const auto& [X, Y] : { std::pair( 0, 0 ), { 1, 0 }, { 0, 1 }, { 1, 1 } } )
+  {
+    const double U = X * i_rTile.ImageWidth, V = Y * i_rTile.ImageHeight;
+    const double Across = i_rTurn[0] * U + i_rTurn[1] * V, Down = i_rTurn[2] * U + i_rTurn[3] * V;
+    Left = std::min( Left, Across ), Right = std::max( Right, Across );
+    Bottom = std::min( Bottom, Down ), Top = std::max( Top, Down );
+  }
+  EXPECT_NEAR( std::max( ( Right - Left ) * PixelX / i_W, ( Top - Bottom ) * PixelY / i_H ), 1.0, 1e-4 );
+}
+} // namespace
+
+TEST_F( VGridTest, LayoutsHaveTheBestScoreAndEveryTileItsPlace )
+{
+  const std::array< float, 4 > Upright{ 1, 0, 0, 1 }, Quarter{ 0, 1, -1, 0 }, Askew{ 0.8f, 0.6f, -0.6f, 0.8f };
+  const QSize Sensors[] = { { 640, 480 }, { 2048, 1088 }, { 1024, 1024 } };
+  std::mt19937 Random( 5 );
+  const auto Below = [&]( unsigned i_End )
+  {
+    return static_cast< int >( Random() % i_End );
+  };
+  for ( std::size_t Count = 1; Count <= 64; ++Count )
+  {
+    std::vector< VCameraDefinition > List;
+    const bool bMixed = Count % 2 == 0;
+    for ( std::size_t Index = 0; Index < Count; ++Index )
+    {
+      const QSize& rSensor = Sensors[bMixed ? Below( 3 ) : static_cast< int >( Count % 3 )];
+      List.push_back( Camera( std::to_string( Index ), rSensor.width(), rSensor.height() ) );
+      List.back().Rotation = bMixed ? Askew : Upright;
+      List.back().SnappedRotation = Below( 2 ) ? Quarter : Upright;
+    }
+    pGrid->SetCameras( List );
+    for ( int Frame = 0; Frame < 12; ++Frame )
+    {
+      const bool bRotated = Below( 4 ) != 0, bSnapped = Below( 2 ) != 0;
+      pGrid->SetRotation( bRotated, bSnapped );
+      const int Width = 70 + Below( 2000 ), Height = 70 + Below( 1200 );
+      pGrid->Resize( { Width, Height }, 1.0f );
+      SCOPED_TRACE( testing::Message() << Count << " in " << Width << " by " << Height );
+      const VCameraTiles& rTiles = pGrid->Tiles();
+      const int Rows = BestRows( rTiles, Width, Height );
+      const int Columns = ( static_cast< int >( Count ) + Rows - 1 ) / Rows;
+      const int W = Width / Columns, H = Height / Rows;
+      for ( int Index = 0; Index < static_cast< int >( Count ); ++Index )
+      {
+        const VCameraTile& rTile = rTiles[static_cast< std::size_t >( Index )];
+        const VCameraDefinition& rCamera = List[static_cast< std::size_t >( Index )];
+        const int Row = Rows - 1 - Index / Columns;
+        ASSERT_EQ( rTile.Rect,
+                   QRect( Index % Columns * W, Row * H, W, Row == Rows - 1 ? Height - ( Rows - 1 ) * H : H ) );
+        ASSERT_EQ( rTile.Viewport, rTile.Rect );
+        ExpectFit( rTile, W, H, !bRotated ? Upright : bSnapped ? rCamera.SnappedRotation : rCamera.Rotation );
+      }
+      if ( HasFailure() )
+      {
+        return;
+      }
+    }
+  }
+}
+
+TEST_F( VGridTest, FramesThatCannotBePartedEvenlyAndThoseWithoutPixels )
+{
+  pGrid->SetCameras( Cameras( { "a", "b", "c", "d" } ) );
+  pGrid->Resize( { 135, 101 }, 1.0f );
+  EXPECT_EQ( Tile( 0 ).Rect, QRect( 0, 50, 67, 51 ) );
+  EXPECT_EQ( Tile( 3 ).Rect, QRect( 67, 0, 67, 50 ) );
+  EXPECT_EQ( pGrid->TileAt( { 134, 20 } ), -1 ) << "the last column is nobody's";
+  EXPECT_EQ( pGrid->TileAt( { 0, 0 } ), 0 );
+  EXPECT_EQ( pGrid->TileAt( { 66, 50 } ), 0 );
+  EXPECT_EQ( pGrid->TileAt( { 67, 51 } ), 3 );
+  EXPECT_EQ( pGrid->TileAt( { 0, 101 } ), 2 ) << "a pointer is rounded to the edge";
+  EXPECT_EQ( pGrid->TileAt( { -1, 5 } ), -1 );
+  EXPECT_EQ( Data( 2, VCameraGrid::TileRect ).toRectF(), QRectF( 0, 51, 67, 50 ) );
+  pGrid->Resize( { 135, 101 }, 2.0f );
+  EXPECT_EQ( Data( 2, VCameraGrid::TileRect ).toRectF(), QRectF( 0, 25.5, 33.5, 25 ) );
+
+  const VCameraTiles Former = pGrid->Tiles();
+  for ( const QSize& rSize : { QSize( 0, 50 ), QSize( 50, 0 ), QSize( -3, -3 ) } )
+  {
+    pGrid->Resize( rSize, std::numeric_limits< float >::quiet_NaN() );
+    EXPECT_EQ( pGrid->Tiles(), Former );
+    EXPECT_FALSE( pGrid->FrameSize().width() < 0 );
+    Drag( Qt::LeftButton, { 0, 0 }, { 9, 9 } );
+  }
+  for ( const QSize& rSize : { QSize( 1, 1 ), QSize( 1, 900 ), QSize( 3, 1 ) } )
+  {
+    pGrid->Resize( rSize, 1.0f );
+    for ( const VCameraTile& rTile : pGrid->Tiles() )
+    {
+      EXPECT_TRUE( QRect( QPoint(), rSize ).contains( rTile.Rect ) || rTile.Rect.isEmpty() );
+      EXPECT_TRUE( std::isfinite( rTile.ScaleX ) && std::isfinite( rTile.ScaleY ) && rTile.ScaleX > 0 );
+    }
+    Drag( Qt::RightButton, { 0, 0 }, { 0, -5 } );
+  }
+  pGrid->SetCameras( { Camera( "none", 0, 0 ), Camera( "odd", -5, 100 ) } );
+  pGrid->Resize( { 200, 100 }, 1.0f );
+  EXPECT_EQ( Tile( 1 ).Rect, QRect( 100, 0, 100, 100 ) );
+  EXPECT_EQ( Tile( 1 ).ScaleX, 1.0f );
+}
+
+TEST_F( VGridTest, OneCameraFillsTheFrameAndGivesItsAspect )
+{
+  Show( true );
+  VCameraDefinition Turned = Camera( "a" );
+  Turned.SnappedRotation = { 0, 1, -1, 0 };
+  pGrid->SetCameras( { Turned } );
+  pGrid->Resize( { 333, 222 }, 1.0f );
+  EXPECT_EQ( Tile().Rect, QRect( 0, 0, 333, 222 ) );
+  EXPECT_EQ( Tile().Zoom, 1.0f );
+  EXPECT_FLOAT_EQ( pGrid->AspectRatio(), 4.0f / 3.0f );
+  int Announced = 0;
+  QObject::connect( pGrid.get(), &VCameraGrid::AspectRatioChanged,
+                    [&]
+                    {
+                      ++Announced;
+                    } );
+  pGrid->SetRotation( true, true );
+  EXPECT_FLOAT_EQ( pGrid->AspectRatio(), 0.75f );
+  EXPECT_EQ( Announced, 1 );
+  pGrid->SetCameras( Cameras( { "a", "b" } ) );
+  EXPECT_EQ( pGrid->AspectRatio(), 1.0f );
+}
+
+TEST_F( VGridTest, TheHandZoomsAndPansWhatLiesUnderIt )
+{
+  pGrid->SetCameras( Cameras( { "a", "b", "c" } ) );
+  pGrid->SetRotation( true, true );
+  for ( const double Each : { 1.0, 1.5, 2.0 } )
+  {
+    Ratio = Each;
+    pGrid->Resize( QSize( 900, 260 ) * Ratio, static_cast< float >( Ratio ) );
+    for ( const QPointF Press : { QPointF( 310, 20 ), QPointF( 455, 131 ), QPointF( 590, 250 ) } )
+    {
+      SCOPED_TRACE( testing::Message() << Press.x() << " at " << Ratio );
+      pGrid->ResetViews();
+      const VCameraTile Other = Tile( 0 );
+      const QPointF Pixel( std::round( Press.x() * Ratio ), std::round( Press.y() * Ratio ) );
+      const auto Before = Under( Tile( 1 ), Pixel );
+      Drag( Qt::RightButton, Press, Press + QPointF( 40, -100 ) );
+      EXPECT_NEAR( Tile( 1 ).Zoom, 0.9 * ( 1 + 100 * Ratio * 0.01 ), 1e-5 );
+      EXPECT_NEAR( Under( Tile( 1 ), Pixel )[0], Before[0], 1e-5 );
+      EXPECT_NEAR( Under( Tile( 1 ), Pixel )[1], Before[1], 1e-5 );
+      const float Zoomed = Tile( 1 ).Zoom;
+      Drag( Qt::RightButton, Press, Press + QPointF( 90, 0 ) );
+      EXPECT_EQ( Tile( 1 ).Zoom, Zoomed ) << "across is no zoom";
+      // What was under the hand moves with it.
+      const auto Held = Under( Tile( 1 ), Pixel );
+      const QPointF Way( -33, 71 );
+      Drag( Qt::LeftButton, Press, Press + Way );
+      const auto Moved =
+          Under( Tile( 1 ), { std::round( ( Press.x() - 33 ) * Ratio ), std::round( ( Press.y() + 71 ) * Ratio ) } );
+      EXPECT_NEAR( Moved[0], Held[0], 1e-5 );
+      EXPECT_NEAR( Moved[1], Held[1], 1e-5 );
+      EXPECT_EQ( Tile( 1 ).Zoom, Zoomed );
+      EXPECT_EQ( Tile( 0 ), Other );
+    }
+  }
+}
+
+TEST_F( VGridTest, ZoomHasItsLimitsAndGesturesTheirEnd )
+{
+  pGrid->SetCameras( Cameras( { "a", "b" } ) );
+  pGrid->Resize( { 800, 300 }, 1.0f );
+  const QPointF Place( 100, 100 );
+  const auto pStill = pGrid->Snapshot();
+  EXPECT_EQ( pGrid->Snapshot(), pStill );
+  const float PanX = Tile().PanX;
+  Wheel( Place, 120 );
+  EXPECT_FLOAT_EQ( Tile().Zoom, 0.99f );
+  EXPECT_EQ( pStill->front().Zoom, 0.9f ) << "what was handed out stays as it was";
+  EXPECT_NE( pGrid->Snapshot(), pStill );
+  for ( int Turn = 0; Turn < 120; ++Turn )
+  {
+    Wheel( Place, Turn < 100 ? 1 : 120 );
+  }
+  EXPECT_EQ( Tile().Zoom, 2000.0f );
+  for ( int Turn = 0; Turn < 120; ++Turn )
+  {
+    Wheel( Place, Turn < 100 ? 0 : -120 );
+  }
+  EXPECT_EQ( Tile().Zoom, 0.5f );
+  EXPECT_EQ( Tile().PanX, PanX );
+  EXPECT_EQ( Tile( 1 ).Zoom, 0.9f );
+  Drag( Qt::RightButton, Place, Place - QPointF( 0, 1e6 ) );
+  EXPECT_EQ( Tile().Zoom, 2000.0f );
+  Drag( Qt::RightButton, Place, Place + QPointF( 0, 1e6 ) );
+  EXPECT_EQ( Tile().Zoom, 0.5f );
+
+  // The middle button, a press off every tile, a button that was let go: nothing follows the pointer.
+  const VCameraTiles Before = pGrid->Tiles();
+  Drag( Qt::MiddleButton, Place, { 150, 150 } );
+  Drag( Qt::LeftButton, { 900, 100 }, { 150, 150 } );
+  Mouse( QEvent::MouseButtonPress, Place, Qt::LeftButton );
+  pGrid->MouseRelease( QMouseEvent( QEvent::MouseButtonRelease, Place, Place, Qt::LeftButton, {}, {} ) );
+  Mouse( QEvent::MouseMove, { 150, 150 }, Qt::LeftButton );
+  EXPECT_EQ( pGrid->Tiles(), Before );
+  EXPECT_FALSE( Key( Qt::Key_End ) );
+  EXPECT_TRUE( Key( Qt::Key_Home ) );
+  EXPECT_EQ( Tile().Zoom, 0.9f );
+  EXPECT_EQ( Tile().PanX, 0.5f );
+  // A camera leaves while it is dragged, and another one stands where it stood.
+  Mouse( QEvent::MouseButtonPress, Place, Qt::LeftButton );
+  Mouse( QEvent::MouseMove, { 110, 100 }, Qt::LeftButton );
+  EXPECT_NE( Tile().PanX, 0.5f );
+  pGrid->SetCameras( Cameras( { "b" } ) );
+  Mouse( QEvent::MouseMove, { 190, 190 }, Qt::LeftButton );
+  EXPECT_EQ( Tile().PanX, 0.5f );
+  pGrid->SetCameras( {} );
+  Mouse( QEvent::MouseMove, { 190, 190 }, Qt::LeftButton );
+  EXPECT_FALSE( Key( Qt::Key_Home ) );
+  EXPECT_EQ( pGrid->Snapshot(), nullptr );
+}
+
+TEST_F( VGridTest, WhatStaysKeepsItsViewAndWhatChangedIsReported )
+{
+  pGrid->Resize( { 800, 300 }, 1.0f );
+  pGrid->SetCameras( Cameras( { "a", "b" } ) );
+  EXPECT_EQ( Resets, 1 );
+  Wheel( { 100, 100 }, 120 );
+  Reported.clear();
+  pGrid->SetCameras( Cameras( { "a", "b" } ) );
+  EXPECT_TRUE( Reported.empty() );
+  auto Renamed = Cameras( { "a", "b" } );
+  Renamed[0].UserId = -1;
+  pGrid->SetCameras( Renamed );
+  EXPECT_EQ( Reported, VRoles{ ( QList< int >{ 261, 257, 259 } ) } );
+  EXPECT_EQ( Resets, 1 );
+  EXPECT_EQ( Data( 0, 257 ), "-1" );
+  pGrid->SetCameras( Cameras( { "c", "a" } ) );
+  EXPECT_EQ( Resets, 2 );
+  EXPECT_EQ( Counts, 2 );
+  EXPECT_FLOAT_EQ( Tile( 1 ).Zoom, 0.99f ) << "a camera keeps its view wherever it stands";
+  EXPECT_EQ( Tile( 0 ).Zoom, 0.9f );
+  pGrid->SetCameras( Cameras( { "c" } ) );
+  pGrid->SetCameras( Cameras( { "c", "a" } ) );
+  EXPECT_EQ( Tile( 1 ).Zoom, 0.9f ) << "one that leaves and returns starts anew";
+
+  // Written as JSON and read by another grid before its cameras come.
+  Wheel( { 100, 100 }, 120 );
+  Drag( Qt::LeftButton, { 100, 100 }, { 130, 90 } );
+  const VCameraTile Seen = Tile( 0 );
+  const QByteArray Text = QJsonDocument( QJsonObject::fromVariantMap( pGrid->SaveViews() ) ).toJson();
+  QVariantMap Views = QJsonDocument::fromJson( Text ).object().toVariantMap();
+  EXPECT_EQ( Views.keys(), QStringList{ "c" } );
+  Views["a"] = 5;
+  Views["x"] = QVariantMap{ { "zoom", "wide" }, { "panX", 0 }, { "panY", 0 } };
+  Views["y"] = QVariantMap{ { "zoom", 1e9 }, { "panX", 0.25 }, { "panY", 0.75 } };
+  Show( false );
+  pGrid->RestoreViews( Views );
+  pGrid->Resize( { 800, 300 }, 1.0f );
+  pGrid->SetCameras( Cameras( { "c", "a" } ) );
+  EXPECT_EQ( Tile( 0 ), Seen );
+  EXPECT_EQ( Tile( 1 ).Zoom, 0.9f );
+  EXPECT_EQ( pGrid->SaveViews().keys(), ( QStringList{ "c", "y" } ) );
+  pGrid->SetCameras( Cameras( { "y" } ) );
+  EXPECT_EQ( Tile().Zoom, 2000.0f );
+}
+
+TEST_F( VGridTest, RolesTellOfACamera )
+{
+  pGrid->Resize( { 1200, 300 }, 1.0f );
+  auto List = Cameras( { "a", "vi:b", "vf:b", "vi:", "", "a" } );
+  List[1].bVideo = true;
+  pGrid->SetCameras( List );
+  EXPECT_EQ( URNs(), ( QStringList{ "a", "vi:b", "vf:b", "vi:" } ) );
+  const QHash< int, QByteArray > Names = pGrid->roleNames();
+  EXPECT_EQ( Names.size(), 10 );
+  EXPECT_EQ( Names[257], "tileUserId" );
+  EXPECT_EQ( Names[266], "tileAdditionalData" );
+  EXPECT_EQ( Data( 0, 257 ), "7" );
+  EXPECT_FALSE( Data( 0, 258 ).isValid() );
+  EXPECT_EQ( Data( 0, 259 ), "type of a" );
+  EXPECT_EQ( Data( 1, 260 ), "vi:b" );
+  EXPECT_EQ( Data( 1, 262 ), true );
+  const bool Inputs[] = { false, true, false, true }, Files[] = { false, false, true, false };
+  for ( int Row = 0; Row < 4; ++Row )
+  {
+    EXPECT_EQ( Data( Row, 263 ), Inputs[Row] );
+    EXPECT_EQ( Data( Row, 264 ), Files[Row] );
+  }
+  EXPECT_FALSE( Data( 4, 257 ).isValid() );
+  EXPECT_FALSE( pGrid->data( {}, 257 ).isValid() );
+
+  // The further values come from a source, and go with their cameras.
+  struct VSource final : ICameraModelAdditionalDataSource
+  {
+    QVariantMap AdditionalData( const QString& i_rURN ) const override { return Values.value( i_rURN ); }
+    ZEK::IMultiCallback< void() >& Changed() override { return Notifier; }
+    QHash< QString, QVariantMap > Values;
+    ZEK::VMultiCallback< void() > Notifier;
+  };
+  const auto pSource = std::make_shared< VSource >();
+  pSource->Values["a"] = { { "isBumped", true } };
+  pGrid->SetAdditionalDataSource( pSource, nullptr );
+  EXPECT_EQ( Data( 0, 266 ).toMap(), pSource->Values["a"] );
+  EXPECT_TRUE( Data( 1, 266 ).toMap().isEmpty() );
+  Reported.clear();
+  pSource->Notifier.Fire();
+  EXPECT_TRUE( Reported.empty() );
+  pSource->Values["vi:b"] = { { "isBumped", false } };
+  pSource->Notifier.Fire();
+  EXPECT_EQ( Reported, VRoles{ { 266 } } );
+  pGrid->SetSelectionItems( { { ZEK::ESelectDevice, "b", 0, 0 }, { ZEK::ESelectSubject, "a", 0, 0 } } );
+  EXPECT_FALSE( Data( 0, 265 ).isValid() );
+  EXPECT_EQ( Data( 2, 265 ).toMap()["device"], "b" );
+  Reported.clear();
+  pGrid->SetCameras( Cameras( { "vi:b", "c" } ) );
+  EXPECT_EQ( Reported.back(), ( QList< int >{ 265, 266 } ) );
+  pGrid->SetCameras( Cameras( { "vi:b", "a" } ) );
+  EXPECT_EQ( Data( 1, 266 ).toMap(), pSource->Values["a"] ) << "a camera that comes back is asked for again";
+  pGrid.reset();
+  pSource->Notifier.Fire();
+}
+
+TEST_F( VGridTest, SelectedCamerasAreShownUnlessOthersArePinned )
+{
+  const auto pService = std::make_shared< HostServices::VSelectionService >();
+  const auto Select = [&]( const ZEK::VSelection& i_rItems )
+  {
+    pService->Set( ZEK::ISelectionService::EPrimary, i_rItems );
+  };
+  const ZEK::VSelectionItem B{ ZEK::ESelectDevice, "b", 0, 0 }, Plate{ ZEK::ESelectDevice, "plate", 0, 0 };
+  const ZEK::VSelectionItem Point{ ZEK::ESelectReconstruction, {}, 0, 3 };
+  const QStringList All{ "a", "b", "vi:b", "c" };
+  pGrid->Resize( { 900, 900 }, 1.0f );
+  VCameraGridSelection Loop( pGrid, pService, nullptr );
+  Select( { B, Point } );
+  EXPECT_EQ( URNs(), QStringList() );
+  pGrid->SetCameras( Cameras( { "a", "b", "vi:b", "c" } ) );
+  EXPECT_EQ( URNs(), ( QStringList{ "b", "vi:b" } ) ) << "cameras come after their selection";
+  EXPECT_TRUE( Data( 1, 265 ).isValid() );
+  Select( { Plate } );
+  EXPECT_EQ( URNs(), All ) << "what is no camera hides none";
+  Select( { Point } );
+  EXPECT_EQ( URNs(), All );
+
+  const auto DoubleClickOn = [&]( const QString& i_rURN )
+  {
+    const QRectF Rect = Data( static_cast< int >( URNs().indexOf( i_rURN ) ), 261 ).toRectF();
+    Mouse( QEvent::MouseButtonDblClick, Rect.center(), Qt::LeftButton );
+  };
+  DoubleClickOn( "c" );
+  EXPECT_EQ( URNs(), QStringList{ "c" } );
+  EXPECT_EQ( pService->Get( ZEK::ISelectionService::EPrimary ),
+             ( ZEK::VSelection{ Point, { ZEK::ESelectDevice, "c", 0, 0 } } ) );
+  DoubleClickOn( "c" );
+  EXPECT_EQ( URNs(), All );
+  EXPECT_EQ( pService->Get( ZEK::ISelectionService::EPrimary ), ZEK::VSelection{ Point } );
+  DoubleClickOn( "b" );
+  DoubleClickOn( "vi:b" );
+  EXPECT_EQ( URNs(), All ) << "a device and its video are one";
+  pGrid->SetShownCameras( { "a" } );
+  DoubleClickOn( "a" );
+  EXPECT_EQ( URNs(), All ) << "what was shown without a selection";
+  EXPECT_EQ( Requested,
+             ( std::vector< QStringList >{ { "c" }, QStringList(), { "b" }, QStringList(), QStringList() } ) );
+  Mouse( QEvent::MouseButtonDblClick, { 2000, 5 }, Qt::LeftButton );
+  EXPECT_EQ( Requested.size(), 5u );
+
+  Select( { B } );
+  pGrid->PinTiles( true );
+  Select( {} );
+  VCameraGrid::VURNs Pinned;
+  QStringList Tiles;
+  EXPECT_TRUE( pGrid->GetPinnedCameras( Pinned, Tiles ) );
+  EXPECT_EQ( Pinned, ( VCameraGrid::VURNs{ "b", "vi:b" } ) );
+  EXPECT_EQ( Tiles, ( QStringList{ "b", "vi:b" } ) );
+  pGrid->PinTiles( false );
+  EXPECT_FALSE( pGrid->GetPinnedCameras( Pinned, Tiles ) );
+  EXPECT_TRUE( Pinned.isEmpty() );
+  EXPECT_EQ( Tiles, All );
+  const int Before = Resets;
+  pGrid->SetShownCameras( {} );
+  EXPECT_EQ( Resets, Before );
+}
+
+TEST( CameraOrder, OpticalCamerasByNumberThenVideo )
+{
+  std::vector< VCameraDefinition > List = Cameras( { "z", "a", "b", "v", "w" } );
+  List[0].UserId = 1;
+  List[1].UserId = List[2].UserId = -1;
+  List[3].bVideo = List[4].bVideo = true;
+  List[4].UserId = 0;
+  std::shuffle( List.begin(), List.end(), std::mt19937( 3 ) );
+  std::sort( List.begin(), List.end(), StandsBefore );
+  std::string Order;
+  for ( const VCameraDefinition& rCamera : List )
+  {
+    Order += rCamera.DeviceURN;
+  }
+  EXPECT_EQ( Order, "zabwv" );
+}
+
+} // namespace MoxelGraphics
