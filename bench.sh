@@ -25,8 +25,8 @@ trap 'rm -rf "$parts"' EXIT
 for program in build/bench/bin/bench_*; do
   name=$(basename "$program")
   list=$(xvfb-run -a -s "-screen 0 1920x1080x24 -noreset" "$program" --benchmark_list_tests --benchmark_filter="$filter" 2>/dev/null || true)
-  empty=$(printf '%s\n' "$list" | grep -E '/(submit|still|floor_submit|floor_still)(/|$)' || true)
-  drawn=$(printf '%s\n' "$list" | grep -v -E '/(submit|still|floor_submit|floor_still)(/|$)' | grep '/' || true)
+  empty=$(printf '%s\n' "$list" | grep -E '/(submit|still|unchanged|floor_submit|floor_still)(/|$)' || true)
+  drawn=$(printf '%s\n' "$list" | grep -v -E '/(submit|still|unchanged|floor_submit|floor_still)(/|$)' | grep '/' || true)
   as_filter() { printf '%s\n' "$1" | sed 's/^/^/;s/$/$/' | paste -sd'|'; }
   if [ -n "$drawn" ]; then
     xvfb-run -a -s "-screen 0 1920x1080x24 -noreset" "$program" --benchmark_filter="$(as_filter "$drawn")" \
