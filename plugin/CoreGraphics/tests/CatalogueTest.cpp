@@ -25,7 +25,10 @@ ColoredLine: StippledLine; Camera: Camera; CameraRay: Colour CameraCoverageFurst
 Edge3D: Colour; Edge2D: Colour; General2D: Colour; MaskSquare: Mask MaskSelection;
 Greyscale2D: Greyscale2D Greyscale2DSelection; GreyscaleMaximised: Greyscale2D Greyscale2DSelection;
 Greyscale3D: Colour; WandWave2D: WandWave2D; Centroid2D: Centroid2D Centroid2DSelection Colour;
-Centroid3D: Colour; Frame: UniformColour; Video: VideoBayer VideoLuminance VideoYUV VideoYUVPlanar;
+Centroid3D: Colour; Frame: UniformColour; Centroid3DTiles: Colour; Centroid2DTiles: Colour Greyscale2DSelection;
+Centroid2DTileQuads: Centroid2DTileQuads Centroid2DTileQuadsSelection;
+Greyscale2DTiles: Greyscale2DTiles Greyscale2DTilesSelection;
+Video: VideoBayer VideoLuminance VideoYUV VideoYUVPlanar VideoImage;
 Stick: Colour SimpleLighting; StickShadow: Colour; Target: SimpleLighting Colour; Segment: Segment;
 NonUniformSphere: Covariance; MissingMarker: MissingMarker; FBXSkin: FBXMaterial XRay;
 FBXMesh: FBXMaterial XRay; FBXColoredMesh: FBXMaterial SimpleLighting XRay;)";
@@ -54,6 +57,11 @@ TEST_P( CatalogueTest, EverySourceIsInAPairAndEveryPairLinks )
     }
     // Whatever can be drawn can be picked.
     ExpectLinks( Vertex, "Selection", EFormSingle );
+    if ( !rRender.Context()->isOpenGLES() && Vertex == "Greyscale2DTiles" )
+    {
+      ExpectLinks( Vertex, Vertex, EFormTextureBuffers );
+      ExpectLinks( Vertex, Vertex + "Selection", EFormTextureBuffers );
+    }
     ExpectLinks( Vertex, "Selection", EFormInstancedSelection );
     ExpectLinks( Vertex, "Selection", EFormPointsSelection );
     Listed.insert( "VertexShaders/" + Vertex + ".glsl" );
