@@ -1,5 +1,7 @@
 #include <HarrowGraphics/VQMLSceneWidget.h>
 
+#include <MoxelGraphics/VCameraGrid.h>
+#include <MoxelGraphics/VCameraGridSelection.h>
 #include <MoxelGraphics/VMoxelScene.h>
 #include <ZEK/CoreUserPreferences.h>
 
@@ -38,11 +40,13 @@ constexpr float LargestManipulator = 10.0F;
 VQMLSceneWidget::VQMLSceneWidget( VSceneWidgetArguments i_Arguments )
   : VQuickWidget( i_Arguments.pQuickHost )
   , m_Arguments( std::move( i_Arguments ) )
+  , m_pCameraGrid( ZEK::MakeShared< MoxelGraphics::VCameraGrid >( m_Arguments.Kind == EWindowKind3D ) )
 {
   if ( m_Arguments.pStore )
   {
     m_pPreferences = std::make_shared< ZEK::ICoreUserPreferencesLayout >( m_Arguments.pStore );
   }
+  m_pCameraGrid->SetAdditionalDataSource( m_Arguments.pCameraData, m_Arguments.pPostal );
   InitSceneDocuments();
   PublishContext();
   connect( this, &QQuickWidget::statusChanged, this, &VQMLSceneWidget::FindSceneItem );
@@ -56,18 +60,9 @@ VQMLSceneWidget::VQMLSceneWidget( VSceneWidgetArguments i_Arguments )
   m_UpdateTimer.start( UpdateMilliseconds );
   setAcceptDrops( true );
 
-  if ( m_Arguments.Kind == EWindowKindCameras && m_Arguments.pActivityMode )
+  if ( m_Arguments.Kind == EWindowKindCameras )
   {
-    m_ActivityConnection = m_Arguments.pActivityMode->Changed().Connect(
-        [pSelf = QPointer( this )]
-        {
-          if ( pSelf )
-          {
-            pSelf->OnActivityChanged();
-          }
-        },
-        m_Arguments.pPostal );
-    OnActivityChanged();
+    StartCameraWindow();
   }
 }
 
@@ -84,7 +79,7 @@ void VQMLSceneWidget::PublishContext()
     return ( Flags & i_Bits ) != 0;
   };
   SetContextObject( "contextFlowScene", m_Arguments.pScene.get() );
-  SetContextObject( "contextCameraGrid", nullptr );
+  SetContextObject( "contextCameraGrid", m_pCameraGrid.get() );
   SetContextProperty( "contextCameraType", 0 );
   SetContextProperty( "contextFocusSelection", false );
   SetContextProperty( "contextMissingMarkersEnabled", Has( EFeatureSubjects | EFeatureLiveSubjects ) );
@@ -105,7 +100,7 @@ void VQMLSceneWidget::PublishContext()
 void VQMLSceneWidget::FindSceneItem()
 {
   QQuickItem* const pRoot = rootObject();
-  m_pSceneItem = pRoot ? pRoot->findChild< MoxelGraphics::VSceneFramebufferObject* >() : nullptr;
+  m_pSceneItem = pRoot ? pRoot->findChild< MoxelGraphics::VSceneFramebufferObject* >( "sceneFBO" ) : nullptr;
 }
 
 void VQMLSceneWidget::update()
@@ -176,14 +171,6 @@ ETracking VQMLSceneWidget::tracking() const
   return ContextProperty( "contextTracking" ).value< ETracking >();
 }
 
-void VQMLSceneWidget::OnActivityChanged()
-{
-  if ( m_pSceneItem )
-  {
-    m_pSceneItem->setOption( "CameraWandSmear", m_Arguments.pActivityMode->Name() == "Camera Calibration" );
-  }
-}
-
 void VQMLSceneWidget::ScaleManipulator( float i_Factor )
 {
   if ( m_pSceneItem )
@@ -204,6 +191,10 @@ bool VQMLSceneWidget::ExecuteCommand( const std::string& i_rText )
     }
     OnFocus();
     return true;
+  }
+  if ( m_Arguments.Kind == EWindowKindCameras )
+  {
+    return ExecuteCameraCommand( i_rText );
   }
   return b3D && Execute3DCommand( i_rText );
 }

@@ -1,5 +1,6 @@
 #include <HarrowGraphics/VSceneManager.h>
 
+#include <HarrowGraphics/VCameraModelStateCacheDataSource.h>
 #include <HarrowGraphics/VHarrowScene.h>
 #include <ZEK/DebugServices.h>
 #include <ZEK/Log.h>
@@ -17,7 +18,7 @@ VSceneManager::VSceneManager( HarrowPluginInterface::IHarrowApplication& io_rApp
 
 VSceneManager::~VSceneManager() = default;
 
-std::shared_ptr< VHarrowScene >
+VContextScene
 VSceneManager::ForContext( const std::shared_ptr< HarrowPluginInterface::IStateCacheContext >& i_rpContext )
 {
   const std::string Name = i_rpContext->Name();
@@ -36,19 +37,22 @@ VSceneManager::ForContext( const std::shared_ptr< HarrowPluginInterface::IStateC
   Arguments.pVolumeManipulator = m_rApplication.VolumeManipulator();
   const auto pServices = m_rApplication.SceneServices();
   Arguments.pPlaybackRange = pServices ? pServices->PlaybackRange() : nullptr;
-  const auto pScene = ZEK::MakeShared< VHarrowScene >( std::move( Arguments ) );
-  m_Scenes.emplace( Name, pScene );
-  return pScene;
+  VContextScene Scene;
+  Scene.pScene = ZEK::MakeShared< VHarrowScene >( std::move( Arguments ) );
+  Scene.pCameraData = ZEK::MakeShared< VCameraModelStateCacheDataSource >(
+      i_rpContext->Cache(), m_rApplication.PostalService(), m_rApplication.CameraDataSourceContext() );
+  m_Scenes.emplace( Name, Scene );
+  return Scene;
 }
 
-std::shared_ptr< VHarrowScene > VSceneManager::ForContextName( const std::string& i_rName )
+VContextScene VSceneManager::ForContextName( const std::string& i_rName )
 {
   static ZEK::VLogCategory& rCategory = ZEK::GlobalLog().Category( "SceneManager" );
   ZEK::Log( rCategory, ZEK::ELogDetail, "Create scene for context %1%", i_rName );
   const auto pStateCacheContext = m_rApplication.ContextRegistry()->Find( i_rName );
   if ( !DebugServices::Check( pStateCacheContext != nullptr, "pStateCacheContext", __FILE__, __LINE__ ) )
   {
-    return nullptr;
+    return {};
   }
   return ForContext( pStateCacheContext );
 }

@@ -1,8 +1,11 @@
 #include <HarrowGraphics/VSceneWindowContentFactory.h>
 
+#include <HarrowGraphics/VCameraModelStateCacheDataSource.h>
 #include <HarrowGraphics/VHarrowScene.h>
 #include <HarrowGraphics/VSceneManager.h>
 #include <HarrowGraphics/VSceneWindowContent.h>
+
+#include <Flow2Graphics/VContributionTileData.h>
 
 namespace HarrowGraphics
 {
@@ -26,7 +29,14 @@ void VSceneWindowContentFactory::Create(
     const QPointer< QWidget >& i_rpToolbar )
 {
   VSceneWidgetArguments Arguments;
-  Arguments.pScene = m_pSceneManager->ForContext( i_rpContext );
+  const VContextScene Scene = m_pSceneManager->ForContext( i_rpContext );
+  Arguments.pScene = Scene.pScene;
+  Arguments.pCameraData = Scene.pCameraData;
+  if ( Scene.pScene && m_Kind == EWindowKindCameras )
+  {
+    Arguments.pCameraData = std::make_shared< Flow2Graphics::VContributionTileData >( Scene.pCameraData,
+                                                                                      Scene.pScene->Contributions() );
+  }
   Arguments.pQuickHost = m_rWorkspace.QuickHost();
   Arguments.pSelection = m_rApplication.Selection();
   Arguments.pPostal = m_rApplication.PostalService();

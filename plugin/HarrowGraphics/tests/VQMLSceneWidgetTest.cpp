@@ -69,7 +69,7 @@ TEST_F( SceneWindow, WindowsOfOneContextShareTheSceneAndOthersDoNot )
 TEST_F( SceneWindow, AContextThatTheHostDoesNotKnowIsMisuse )
 {
   const TestSupport::VAssertRecorder Recorder;
-  EXPECT_EQ( pManager->ForContextName( "Nowhere" ), nullptr );
+  EXPECT_EQ( pManager->ForContextName( "Nowhere" ).pScene, nullptr );
   EXPECT_EQ( Recorder.Expressions(), std::vector< std::string >{ "pStateCacheContext" } );
   EXPECT_EQ( TestSupport::LogTexts( "SceneManager", 6 ),
              std::vector< std::string >{ "Create scene for context Nowhere" } );
@@ -155,7 +155,7 @@ TEST_F( SceneWindow, AltToSelectIsThePreferenceOfTheStore )
   }
   EXPECT_FALSE( rWidget.altToSelect() );
   HarrowGraphics::VSceneWidgetArguments Arguments;
-  Arguments.pScene = pManager->ForContext( Host.Contexts()->Find( "Live" ) );
+  Arguments.pScene = pManager->ForContext( Host.Contexts()->Find( "Live" ) ).pScene;
   Arguments.pQuickHost = Host.Workspace().QuickHost();
   Arguments.pSelection = Host.Selection();
   HarrowGraphics::VQMLSceneWidget Alone( Arguments );

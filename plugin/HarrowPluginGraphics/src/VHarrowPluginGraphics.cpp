@@ -50,6 +50,9 @@ bool VHarrowPluginGraphics::CreateWorkspaceContent( HarrowPluginInterface::IHarr
   pFactories->AddFactory(
       "3D View", std::make_shared< HarrowGraphics::VSceneWindowContentFactory >(
                      io_rApplication, io_rWorkspace, "3D View", pSceneManager, HarrowGraphics::EWindowKind3D ) );
+  pFactories->AddFactory(
+      "Cameras", std::make_shared< HarrowGraphics::VSceneWindowContentFactory >(
+                     io_rApplication, io_rWorkspace, "Cameras", pSceneManager, HarrowGraphics::EWindowKindCameras ) );
 
   if ( const auto pManipulator = io_rApplication.ObjectManipulator();
        pManipulator &&

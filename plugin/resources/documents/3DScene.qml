@@ -4,28 +4,6 @@ import Flow2Graphics 1.0
 Item {
     id: root
 
-    // Shown when the view cannot draw, or not as it should.
-    component Notice: Rectangle {
-        property alias text: label.text
-
-        visible: label.text !== ""
-        width: Math.min(label.implicitWidth, parent.width - 80) + 32
-        height: label.height + 20
-        radius: 5
-        color: "#C0202020"
-        border.color: "#E76500"
-
-        Text {
-            id: label
-
-            anchors.centerIn: parent
-            width: Math.min(implicitWidth, root.width - 80)
-            wrapMode: Text.Wrap
-            color: "#F0F0F0"
-            font.pixelSize: 14
-        }
-    }
-
     SceneFramebufferObject {
         id: sceneFBO
 
@@ -45,13 +23,44 @@ Item {
         }
     }
 
+    Repeater {
+        model: sceneFBO.cameraObjects
+
+        CameraNumber {
+            shown: sceneFBO.showCameraNumbers
+        }
+    }
+
+    Loader {
+        anchors.right: parent.right
+        anchors.top: parent.top
+        anchors.margins: 50
+        active: sceneFBO.previewCamera !== ""
+
+        sourceComponent: CameraPreview {
+            available: Qt.size(root.width, root.height)
+            camera: sceneFBO.previewCamera
+            onClosed: sceneFBO.previewCamera = ""
+        }
+    }
+
+    SceneContributions {
+        anchors.left: parent.left
+        anchors.bottom: parent.bottom
+        anchors.margins: 16
+        contributions: contextFlowScene ? contextFlowScene.contributions : null
+        sceneItem: sceneFBO
+        mostHeight: root.height / 2
+        onCameraClicked: urn => contextFlowScene.SelectCamera(urn, false)
+    }
+
     SceneToolTip {
         anchors.fill: parent
         text: sceneFBO.toolTipText
         pointer: sceneFBO.mousePos
     }
 
-    Notice {
+    SceneNotice {
         anchors.horizontalCenter: parent.horizontalCenter
         anchors.bottom: parent.bottom
         anchors.bottomMargin: 24

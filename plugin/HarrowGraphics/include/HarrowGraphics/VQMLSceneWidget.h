@@ -13,8 +13,11 @@
 
 namespace MoxelGraphics
 {
+class ICameraModelAdditionalDataSource;
+class VCameraGrid;
+class VCameraGridSelection;
 class VMoxelScene;
-}
+} // namespace MoxelGraphics
 
 namespace ZEK
 {
@@ -39,9 +42,10 @@ struct VSceneWidgetArguments
   std::shared_ptr< HarrowPluginInterface::IHarrowQuickHost > pQuickHost;
   std::shared_ptr< ZEK::ISelectionService > pSelection;
   std::shared_ptr< ZEK::IPostalService > pPostal;
-  std::shared_ptr< HarrowPluginInterface::IWidgetService > pWidgetService; ///< may be null
-  std::shared_ptr< HarrowPluginInterface::IActivityMode > pActivityMode;   ///< may be null
-  std::shared_ptr< ZEK::IStore > pStore;                                   ///< may be null
+  std::shared_ptr< HarrowPluginInterface::IWidgetService > pWidgetService;        ///< may be null
+  std::shared_ptr< HarrowPluginInterface::IActivityMode > pActivityMode;          ///< may be null
+  std::shared_ptr< ZEK::IStore > pStore;                                          ///< may be null
+  std::shared_ptr< MoxelGraphics::ICameraModelAdditionalDataSource > pCameraData; ///< may be null
   EWindowKind Kind = EWindowKind3D;
   std::uint32_t FeatureFlags = 0;
   bool bVolumeManipulator = false;
@@ -67,15 +71,30 @@ public:
 
   /// The item of the loaded document; null until the document is ready, and when it failed.
   MoxelGraphics::VSceneFramebufferObject* SceneItem() const { return m_pSceneItem; }
+  /// The cameras of a camera window, or the one camera that a 3D view shows beside the scene.
+  MoxelGraphics::VCameraGrid& CameraGrid() { return *m_pCameraGrid; }
+  /// The cameras that are selected, by URN.
+  QStringList SelectedCameras() const;
   /// Whether the text was a command of this window kind whose condition held.
   bool ExecuteCommand( const std::string& i_rText );
   /// The path of a drag that can be dropped here: exactly one local file that ends in ".fbx", else empty.
   static QString DroppedMesh( const QMimeData* i_pMimeData );
 
+  /// Of a camera window: each tile with "urn", "userId", "displayType", "sensorWidth", "sensorHeight", "zoom", "panX",
+  /// "panY", "rect" of "x", "y", "width", "height", and "centroids", each of "index", "x", "y", "radius"; device pixels
+  /// of the view from its top left. Empty in other windows.
+  Q_INVOKABLE QVariantList cameraReport() const;
+
 public slots:
   void OnViewSettingsToggled( bool i_bChecked );
   void OnCameraTypeChanged( int i_Index );
   void OnFocus();
+  void OnResetZoomClicked();
+  void OnPinCamerasToggled( bool i_bChecked );
+  /// Masks or unmasks the selected cells of the selected camera.
+  void OnMaskPaintClicked();
+  void OnMaskEraseClicked();
+  void OnMaskEraseAllClicked();
   /// The preference: whether Alt selects and the plain mouse navigates. False without a store.
   bool altToSelect() const;
   bool selectionHasBounds() const;
@@ -87,6 +106,8 @@ public slots:
 
 signals:
   void PoseIndexChanged();
+  /// Other devices or mask cells are selected. Only in a camera window.
+  void CameraSelectionChanged();
 
 protected:
   void dragEnterEvent( QDragEnterEvent* io_pEvent ) override;
@@ -95,16 +116,23 @@ protected:
 private:
   void PublishContext();
   void FindSceneItem();
+  void StartCameraWindow();
   void OnActivityChanged();
+  void PaintMask( std::uint8_t i_Value );
+  bool ExecuteCameraCommand( const std::string& i_rText );
   bool Execute3DCommand( const std::string& i_rText );
   void ScaleManipulator( float i_Factor );
 
   VSceneWidgetArguments m_Arguments;
-  std::shared_ptr< ZEK::ICoreUserPreferencesLayout > m_pPreferences; ///< null without a store
+  std::shared_ptr< MoxelGraphics::VCameraGrid > m_pCameraGrid;
+  std::unique_ptr< MoxelGraphics::VCameraGridSelection > m_pGridSelection; ///< of a camera window
+  std::shared_ptr< ZEK::ICoreUserPreferencesLayout > m_pPreferences;       ///< null without a store
   QTimer m_UpdateTimer;
   QPointer< MoxelGraphics::VSceneFramebufferObject > m_pSceneItem;
   uint m_PoseIndex = 0;
   ZEK::VConnection m_ActivityConnection;
+  std::shared_ptr< ZEK::IMultiCallback< void() > > m_pCameraSelection;
+  ZEK::VConnection m_SelectionConnection;
 };
 
 } // namespace HarrowGraphics

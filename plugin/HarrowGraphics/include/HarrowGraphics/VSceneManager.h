@@ -10,7 +10,15 @@
 namespace HarrowGraphics
 {
 
+class VCameraModelStateCacheDataSource;
 class VHarrowScene;
+
+/// What the windows of one context share. Both are null for a context that the host does not know.
+struct VContextScene
+{
+  std::shared_ptr< VHarrowScene > pScene;
+  std::shared_ptr< VCameraModelStateCacheDataSource > pCameraData;
+};
 
 /// Owns one scene for each context, shared by the context's windows. A scene stays when its windows close, so that
 /// a window that is opened again shows what the others show.
@@ -24,16 +32,15 @@ public:
   ~VSceneManager();
 
   /// The scene of that context, made on first use.
-  std::shared_ptr< VHarrowScene >
-  ForContext( const std::shared_ptr< HarrowPluginInterface::IStateCacheContext >& i_rpContext );
+  VContextScene ForContext( const std::shared_ptr< HarrowPluginInterface::IStateCacheContext >& i_rpContext );
   /// The same for a context's name. A name that the host does not know is misuse and gives null.
-  std::shared_ptr< VHarrowScene > ForContextName( const std::string& i_rName );
+  VContextScene ForContextName( const std::string& i_rName );
 
 private:
   HarrowPluginInterface::IHarrowApplication& m_rApplication;
   std::shared_ptr< HarrowPluginInterface::IRenderResources > m_pRenderResources;
   std::shared_ptr< HarrowPluginInterface::VMeshSceneCache > m_pMeshCache;
-  std::map< std::string, std::shared_ptr< VHarrowScene > > m_Scenes;
+  std::map< std::string, VContextScene > m_Scenes;
 };
 
 } // namespace HarrowGraphics

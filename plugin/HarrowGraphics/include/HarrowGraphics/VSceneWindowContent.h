@@ -3,9 +3,10 @@
 #include <HarrowGraphics/VQMLSceneWidget.h>
 #include <HarrowPluginInterface/IWorkspaceContent.h>
 
+#include <QtCore/QList>
 #include <QtCore/QPointer>
 
-class QComboBox;
+class QPushButton;
 
 namespace HarrowGraphics
 {
@@ -29,11 +30,21 @@ public:
 
 private:
   void FillToolbar( QWidget& io_rToolbar );
+  void AddCameraTypes( QWidget& io_rToolbar );
+  void AddCameraTools( QWidget& io_rToolbar );
+  QPushButton* AddButton( QWidget& io_rToolbar, const QString& i_rName, const QString& i_rText );
+  void UpdateMaskButtons();
+  void SaveCameras( HarrowPluginInterface::IStateWriter& io_rWriter, const QString& i_rPrefix );
+  void RestoreCameras( const HarrowPluginInterface::IStateReader& i_rReader, const QString& i_rPrefix );
 
   std::string m_Name;
   EWindowKind m_Kind;
-  VQMLSceneWidget* m_pWidget; ///< a child widget
-  QPointer< QComboBox > m_pCameraType;
+  VQMLSceneWidget* m_pWidget;           ///< a child widget
+  QList< QPointer< QWidget > > m_Tools; ///< in the host's toolbar
+  QPointer< QPushButton > m_pPin;
+  QPointer< QPushButton > m_pMaskPaint;
+  QPointer< QPushButton > m_pMaskErase;
+  QPointer< QPushButton > m_pMaskEraseAll;
 };
 
 } // namespace HarrowGraphics
