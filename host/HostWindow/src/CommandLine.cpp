@@ -141,6 +141,7 @@ void AddActions( CLI::App& io_rApp, VRenderOptions& o_rRender )
       { "--set", "Set an option of the scene to a bool, a number or a text", "KEY=VALUE" },
       { "--view", "Take a view type: Perspective, Front, Back, Left, Right, Top, Bottom", "NAME" },
       { "--click", "Click with the left button", "X,Y" },
+      { "--double-click", "Click twice, as to show one camera or all", "X,Y" },
       { "--band", "Draw a band of selection", "X0,Y0,X1,Y1" },
       { "--hover", "Move the pointer there", "X,Y" },
       { "--drag", "Drag with buttons down: left orbits, right zooms, left+right pans", "X0,Y0,X1,Y1[,BUTTONS]" },

@@ -63,8 +63,9 @@ VRunResult OpenSource( VSession& io_rSession, const std::string& i_rSource, doub
   return Shown.IsError() ? Fail( EExitFile, i_rSource + ": " + Shown.Text() ) : VRunResult();
 }
 
-/// A view on its own, as large as was asked. The toolbar is made because a window always has one.
-class VStandAloneView
+/// A view on its own, as large as was asked. The toolbar is made because a window always has one. Wherever the pointer
+/// of the display happens to be, it does nothing to the view.
+class VStandAloneView : public QObject
 {
 public:
   VStandAloneView( VSession& io_rSession, const std::string& i_rWindow, QSize i_Size )
@@ -78,9 +79,29 @@ public:
       m_pContent->show();
       m_View = VSceneView( m_pContent.get() );
       m_View.SetReporting( true );
+      if ( m_View.Widget() )
+      {
+        m_View.Widget()->installEventFilter( this );
+      }
     }
   }
   const VSceneView& View() const { return m_View; }
+
+protected:
+  bool eventFilter( QObject*, QEvent* io_pEvent ) override
+  {
+    switch ( io_pEvent->type() )
+    {
+    case QEvent::Enter:
+    case QEvent::Leave:
+    case QEvent::HoverEnter:
+    case QEvent::HoverMove:
+    case QEvent::HoverLeave:
+      return true;
+    default:
+      return io_pEvent->isPointerEvent() && io_pEvent->spontaneous();
+    }
+  }
 
 private:
   QWidget m_Toolbar;

@@ -68,7 +68,13 @@ void VMainWindow::RestoreLayout()
   }
   if ( m_Docks.empty() )
   {
-    AddWindow( m_rSession.FindWindowKind( "3d" ) );
+    VWorkspaceDock* const pScene = AddWindow( m_rSession.FindWindowKind( "3d" ) );
+    VWorkspaceDock* const pCameras = AddWindow( m_rSession.FindWindowKind( "cameras" ) );
+    if ( pScene && pCameras )
+    {
+      resizeDocks( { pScene, pCameras }, { 3, 2 }, Qt::Horizontal );
+      SetActive( pScene );
+    }
   }
   if ( !restoreGeometry( rPreferences.Geometry( pGeometryName ) ) )
   {

@@ -42,6 +42,9 @@ void VMainWindow::MakeFileMenu()
   QAction* pOpen = pMenu->addAction( tr( "&Open…" ), this, &VMainWindow::AskForFiles );
   pOpen->setShortcut( QKeySequence::Open );
   pOpen->setToolTip( tr( "Open recordings in C3D and TRC files" ) );
+  QAction* pFolder = pMenu->addAction( tr( "Open &Folder…" ), this, &VMainWindow::AskForFolder );
+  pFolder->setShortcut( QKeySequence( Qt::CTRL | Qt::SHIFT | Qt::Key_O ) );
+  pFolder->setToolTip( tr( "Open a folder of what cameras saw" ) );
   m_pRecentMenu = pMenu->addMenu( tr( "Open &Recent" ) );
   connect( m_pRecentMenu, &QMenu::aboutToShow, this, &VMainWindow::FillRecentMenu );
   m_pOpenedMenu = pMenu->addMenu( tr( "Opened &Before" ) );

@@ -9,10 +9,12 @@ namespace HostWindow
 {
 namespace
 {
-constexpr const char* pGesturesWithAlt =
-    "Drag: orbit · Right drag: zoom · Left+right: pan · Alt+drag: select · Click: select";
-constexpr const char* pGesturesWithoutAlt =
-    "Alt+drag: orbit · Alt+right drag: zoom · Alt+left+right: pan · Drag: select · Click: select";
+/// By whether the view is one of cameras, and by whether Alt selects.
+constexpr const char* Gestures[2][2] = {
+    { "Alt+drag: orbit · Alt+right drag: zoom · Alt+left+right: pan · Drag: select · Click: select",
+      "Drag: orbit · Right drag: zoom · Left+right: pan · Alt+drag: select · Click: select" },
+    { "Alt+drag: pan · Right drag: zoom · Double click: one camera or all · Drag: select · Click: select",
+      "Drag: pan · Right drag: zoom · Double click: one camera or all · Alt+drag: select · Click: select" } };
 } // namespace
 
 void VMainWindow::WatchPreferences()
@@ -91,7 +93,9 @@ void VMainWindow::ShowAltToSelect()
 {
   const bool bOn = AltToSelect();
   m_pAltAction->setChecked( bOn );
-  m_pGestures->setText( QString::fromUtf8( bOn ? pGesturesWithAlt : pGesturesWithoutAlt ) );
+  const VWorkspaceDock* const pDock = ActiveDock();
+  const bool bCameraView = pDock && pDock->View().Option( "CameraView" ).toBool();
+  m_pGestures->setText( QString::fromUtf8( Gestures[bCameraView ? 1 : 0][bOn ? 1 : 0] ) );
 }
 
 void VMainWindow::ShowLoaded( const VOpened& i_rOpened )

@@ -27,7 +27,7 @@ QStringList DroppedFiles( const QMimeData* i_pData )
   {
     const QString Path = rUrl.toLocalFile();
     const QString Suffix = QFileInfo( Path ).suffix().toLower();
-    if ( Suffix == "c3d" || Suffix == "trc" )
+    if ( Suffix == "c3d" || Suffix == "trc" || QFileInfo( Path ).isDir() )
     {
       Paths << Path;
     }
@@ -202,12 +202,14 @@ void VMainWindow::OnDockClosed( VWorkspaceDock* i_pDock )
   std::erase( m_Docks, i_pDock );
   i_pDock->deleteLater();
   m_pViewMenu->Refresh();
+  ShowAltToSelect();
 }
 
 void VMainWindow::SetActive( VWorkspaceDock* i_pDock )
 {
   m_pActive = i_pDock;
   m_pViewMenu->Refresh();
+  ShowAltToSelect();
 }
 
 VWorkspaceDock* VMainWindow::ActiveDock() const
@@ -232,6 +234,17 @@ void VMainWindow::AskForFiles()
   const QString Folder = Recent.isEmpty() ? QString() : QFileInfo( Recent.front() ).absolutePath();
   OpenFiles( QFileDialog::getOpenFileNames( this, tr( "Open Recordings" ), Folder,
                                             tr( "Recordings (*.c3d *.C3D *.trc *.TRC);;All files (*)" ) ) );
+}
+
+void VMainWindow::AskForFolder()
+{
+  const auto Recent = m_rSession.Host().Preferences().RecentFiles();
+  const QString Folder = Recent.isEmpty() ? QString() : QFileInfo( Recent.front() ).absolutePath();
+  const QString Chosen = QFileDialog::getExistingDirectory( this, tr( "Open Recording of Cameras" ), Folder );
+  if ( !Chosen.isEmpty() )
+  {
+    OpenFiles( { Chosen } );
+  }
 }
 
 void VMainWindow::OpenFiles( const QStringList& i_rPaths )

@@ -196,9 +196,13 @@ QJsonObject DescribeView( VSession& i_rSession, const VRenderOptions& i_rRender,
   Report["selection"] = DescribeSelection( rSelection, ZEK::ISelectionService::EPrimary );
   Report["preselection"] = DescribeSelection( rSelection, ZEK::ISelectionService::ESecondary );
   const QVariantMap Frame = i_rView.FrameReport();
-  for ( const char* pMember : { "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "notice" } )
+  for ( const char* pMember : { "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "notice", "contributions" } )
   {
     Report[pMember] = ToJson( Frame.value( pMember ) );
+  }
+  if ( const QVariantList Tiles = i_rView.CameraReport(); !Tiles.isEmpty() )
+  {
+    Report["tiles"] = ToJson( Tiles );
   }
   Report["log"] = LogOf( *i_rSession.LogRing() );
   return Report;

@@ -186,6 +186,16 @@ QVariantMap VSceneView::FrameReport() const
   return Report;
 }
 
+QVariantList VSceneView::CameraReport() const
+{
+  QVariantList Tiles;
+  if ( Widget() )
+  {
+    QMetaObject::invokeMethod( Widget(), "cameraReport", Q_RETURN_ARG( QVariantList, Tiles ) );
+  }
+  return Tiles;
+}
+
 qint64 VSceneView::Frames() const
 {
   return FrameReport().value( "frames" ).toLongLong();

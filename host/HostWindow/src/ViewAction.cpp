@@ -183,7 +183,7 @@ std::string ParsePoints( const std::string& i_rOption, const QStringList& i_rPar
   }
   else
   {
-    o_rWhat = VClickAction{ { N[0], N[1] } };
+    o_rWhat = VClickAction{ { N[0], N[1] }, i_rOption == "--double-click" };
   }
   return {};
 }

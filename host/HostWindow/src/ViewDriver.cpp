@@ -112,6 +112,11 @@ QString VViewDriver::Do( const VClickAction& i_rClick )
   Send( QEvent::MouseMove, i_rClick.At, Qt::NoButton, Qt::NoButton );
   Send( QEvent::MouseButtonPress, i_rClick.At, Qt::LeftButton, Qt::LeftButton );
   Send( QEvent::MouseButtonRelease, i_rClick.At, Qt::LeftButton, Qt::NoButton );
+  if ( i_rClick.bDouble )
+  {
+    Send( QEvent::MouseButtonDblClick, i_rClick.At, Qt::LeftButton, Qt::LeftButton );
+    Send( QEvent::MouseButtonRelease, i_rClick.At, Qt::LeftButton, Qt::NoButton );
+  }
   return WaitFrames( FramesForPick ) ? QString() : "the view does not draw";
 }
 

@@ -11,6 +11,7 @@ namespace HostWindow
 namespace
 {
 constexpr int AllContributions = 3;
+const QString CentroidColours = "CentroidColourScheme";
 
 bool IsOn( const QVariant& i_rValue )
 {
@@ -23,15 +24,25 @@ VViewMenu::VViewMenu( const QString& i_rTitle, std::function< VWorkspaceDock*() 
   , m_ActiveDock( std::move( i_ActiveDock ) )
   , m_ViewTypes( this )
   , m_Tracking( this )
+  , m_CentroidColours( this )
 {
   setToolTipsVisible( true );
   AddViewTypes();
-  addSeparator();
+  m_For3D = actions() << addSeparator();
   AddCamera();
   addSeparator();
+  const QList< QAction* > Before = actions();
   AddTracking();
   addSeparator();
   AddToggles();
+  for ( QAction* const pAction : actions().mid( Before.size() ) )
+  {
+    m_For3D << pAction;
+  }
+  m_For3D << m_ForBounds.front();
+  const QList< QAction* > All3D = actions();
+  AddCameraToggles();
+  m_ForCameras = actions().mid( All3D.size() );
   connect( this, &QMenu::aboutToShow, this,
            [this]
            {
@@ -84,7 +95,7 @@ void VViewMenu::AddCamera()
                                       }
                                     } );
   pHome->setShortcut( Qt::Key_Home );
-  pHome->setToolTip( tr( "Return to the view of the start" ) );
+  pHome->setToolTip( tr( "Return to the view of the start; in a view of cameras, show every image whole again" ) );
   m_ForView << pHome;
 }
 
@@ -118,28 +129,68 @@ void VViewMenu::AddTracking()
   m_pLock = m_Tracking.actions()[3];
 }
 
+void VViewMenu::AddToggle( const QString& i_rText, const QKeySequence& i_rKey, const QString& i_rOption, QVariant i_On,
+                           QVariant i_Off )
+{
+  const qsizetype Index = m_Toggles.size();
+  QAction* const pAction = addAction( i_rText, this,
+                                      [this, Index]
+                                      {
+                                        Toggle( m_Toggles[Index] );
+                                      } );
+  pAction->setCheckable( true );
+  pAction->setShortcut( i_rKey );
+  m_Toggles.push_back( { pAction, i_rOption, std::move( i_On ), std::move( i_Off ) } );
+}
+
 void VViewMenu::AddToggles()
 {
-  const auto Add = [this]( const QString& i_rText, const QKeySequence& i_rKey, const QString& i_rOption, QVariant i_On,
-                           QVariant i_Off )
+  AddToggle( tr( "Floor &Grid" ), Qt::Key_G, "FloorGrid" );
+  AddToggle( tr( "Translucent Floor" ), {}, "FloorGridIsTranslucent" );
+  AddToggle( tr( "Global A&xis" ), Qt::Key_X, "GlobalAxis" );
+  AddToggle( tr( "Reconstruction &Volume" ), Qt::Key_V, "ReconstructionVolume" );
+  AddToggle( tr( "&Recorded Radius" ), Qt::Key_R, "ReconstructedRadius" );
+  AddToggle( tr( "Residual &Colours" ), Qt::Key_C, "ReconstructionResiduals" );
+  AddToggle( tr( "Camera Contri&butions" ), Qt::Key_B, "ContributionsType", AllContributions, 0 );
+}
+
+void VViewMenu::AddCameraToggles()
+{
+  AddToggle( tr( "&Video" ), Qt::Key_V, "Video" );
+  AddToggle( tr( "&Border" ), Qt::Key_B, "CameraBorder" );
+  AddToggle( tr( "&Mask" ), Qt::Key_K, "CameraMaskGrid" );
+  addSeparator();
+  AddToggle( tr( "Show &Orientation" ), Qt::Key_O, "CameraShowRotated" );
+  AddToggle( tr( "&Snap to 90°" ), Qt::Key_S, "CameraSnap90Degrees" );
+  addSeparator();
+  AddToggle( tr( "&Grayscale" ), Qt::Key_G, "CameraGreyscale" );
+  AddToggle( tr( "Ma&ximize Grayscale" ), Qt::Key_X, "CameraMaximiseGreyscale" );
+  AddToggle( tr( "&Centroids" ), Qt::Key_C, "CameraCentroids" );
+  AddCentroidColours();
+  AddToggle( tr( "Camera &Wand Smear" ), Qt::Key_W, "CameraWandSmear" );
+  addSeparator();
+  AddToggle( tr( "&3D" ), Qt::Key_3, "3D" );
+  AddToggle( tr( "&Distort 3D" ), Qt::Key_D, "Distort3D" );
+}
+
+void VViewMenu::AddCentroidColours()
+{
+  QMenu* const pMenu = addMenu( tr( "Centroid Co&lors" ) );
+  for ( const QString& rText : { tr( "&Connection" ), tr( "&Generator" ), tr( "&Marker" ) } )
   {
-    const qsizetype Index = m_Toggles.size();
-    QAction* const pAction = addAction( i_rText, this,
-                                        [this, Index]
-                                        {
-                                          Toggle( m_Toggles[Index] );
-                                        } );
+    const auto Scheme = static_cast< int >( m_CentroidColours.actions().size() );
+    QAction* const pAction = pMenu->addAction( rText, this,
+                                               [this, Scheme]
+                                               {
+                                                 if ( VWorkspaceDock* const pDock = m_ActiveDock() )
+                                                 {
+                                                   pDock->View().SetOption( CentroidColours, Scheme );
+                                                 }
+                                                 Refresh();
+                                               } );
     pAction->setCheckable( true );
-    pAction->setShortcut( i_rKey );
-    m_Toggles.push_back( { pAction, i_rOption, std::move( i_On ), std::move( i_Off ) } );
-  };
-  Add( tr( "Floor &Grid" ), Qt::Key_G, "FloorGrid", true, false );
-  Add( tr( "Translucent Floor" ), {}, "FloorGridIsTranslucent", true, false );
-  Add( tr( "Global A&xis" ), Qt::Key_X, "GlobalAxis", true, false );
-  Add( tr( "Reconstruction &Volume" ), Qt::Key_V, "ReconstructionVolume", true, false );
-  Add( tr( "&Recorded Radius" ), Qt::Key_R, "ReconstructedRadius", true, false );
-  Add( tr( "Residual &Colours" ), Qt::Key_C, "ReconstructionResiduals", true, false );
-  Add( tr( "Camera Contri&butions" ), Qt::Key_B, "ContributionsType", AllContributions, 0 );
+    m_CentroidColours.addAction( pAction );
+  }
 }
 
 QAction* VViewMenu::AddCommand( const QString& i_rText, const QKeySequence& i_rKey, const char* i_pCommand,
@@ -190,7 +241,9 @@ void VViewMenu::Refresh()
       i_rGroup.actions()[Index]->setChecked( Index == i_Index );
     }
   };
+  ShowFor( View.Option( "CameraView" ).toBool() );
   Check( m_ViewTypes, View.ViewType() );
+  Check( m_CentroidColours, View.Item() ? View.Option( CentroidColours ).toInt() : -1 );
   Check( m_Tracking, View.Tracking() );
   const QStringList Keys = View.OptionKeys();
   for ( const VToggle& rToggle : m_Toggles )
@@ -198,6 +251,19 @@ void VViewMenu::Refresh()
     const bool bKnown = Keys.contains( rToggle.Key );
     rToggle.pAction->setEnabled( bKnown );
     rToggle.pAction->setChecked( bKnown && IsOn( View.Option( rToggle.Key ) ) );
+  }
+}
+
+void VViewMenu::ShowFor( bool i_bCameraView )
+{
+  // An action that is not shown has no shortcut either, so both kinds of view may use the same keys.
+  for ( QAction* const pAction : m_For3D )
+  {
+    pAction->setVisible( !i_bCameraView );
+  }
+  for ( QAction* const pAction : m_ForCameras )
+  {
+    pAction->setVisible( i_bCameraView );
   }
 }
 

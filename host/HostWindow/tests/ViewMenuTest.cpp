@@ -216,16 +216,50 @@ TEST_F( ViewMenu, ShowsTheTrueStateOfTheActiveViewAndChangesIt )
   EXPECT_TRUE( Checked().isEmpty() );
 }
 
-TEST_F( ViewMenu, NoTwoKeysAreTheSame )
+TEST_F( ViewMenu, AViewOfCamerasHasEntriesOfItsOwnAndNoTwoKeysThatAreShownAreTheSame )
 {
-  std::set< QString > Keys;
-  for ( const QAction* const pAction : m_pMenu->actions() )
+  const auto Shown = [this]
   {
-    const QString Key = pAction->shortcut().toString();
-    EXPECT_TRUE( Key.isEmpty() || Keys.insert( Key ).second ) << Key.toStdString();
+    QStringList Texts;
+    std::set< QString > Keys;
+    for ( const QAction* const pAction : m_pMenu->actions() )
+    {
+      if ( pAction->isVisible() && !pAction->isSeparator() )
+      {
+        Texts << QString( pAction->text() ).remove( '&' );
+        const QString Key = pAction->shortcut().toString();
+        EXPECT_TRUE( Key.isEmpty() || Keys.insert( Key ).second ) << Key.toStdString();
+      }
+    }
+    // Of the transport bar and of the plug-in.
+    EXPECT_FALSE( Keys.contains( "L" ) || Keys.contains( "M" ) || Keys.contains( "Space" ) );
+    return Texts;
+  };
+  const QStringList Only3D = Shown();
+  m_pDock = std::make_unique< VWorkspaceDock >( *m_pSession, "3D View" );
+  m_pActive = m_pDock.get();
+  auto& rOptions = Fake().pItem->Map;
+  for ( const char* pKey : { "CameraView", "Video", "CameraShowRotated" } )
+  {
+    rOptions.insert( pKey, true );
   }
-  // Of the transport bar and of the plug-in.
-  EXPECT_FALSE( Keys.contains( "L" ) || Keys.contains( "M" ) || Keys.contains( "Space" ) );
+  rOptions.insert( "CentroidColourScheme", 1 );
+  m_pMenu->Refresh();
+  const QStringList OnlyCameras = Shown();
+  EXPECT_EQ( OnlyCameras, QStringList( { "Home", "Video", "Border", "Mask", "Show Orientation", "Snap to 90°",
+                                         "Grayscale", "Maximize Grayscale", "Centroids", "Centroid Colors",
+                                         "Camera Wand Smear", "3D", "Distort 3D" } ) );
+  EXPECT_FALSE( Only3D.contains( "Video" ) );
+  EXPECT_TRUE( Action( "Video" ).isChecked() );
+  EXPECT_FALSE( Action( "Border" ).isEnabled() ) << "a view without that option";
+  EXPECT_FALSE( Action( "Reconstruction Volume" ).isEnabled() ) << "its key is the video's here";
+  Action( "Video" ).trigger();
+  EXPECT_EQ( rOptions.value( "Video" ), QVariant( false ) );
+  const QList< QAction* > Schemes = Action( "Centroid Colors" ).menu()->actions();
+  EXPECT_TRUE( Schemes[1]->isChecked() );
+  Schemes[2]->trigger();
+  EXPECT_EQ( rOptions.value( "CentroidColourScheme" ), QVariant( 2 ) );
+  EXPECT_FALSE( Schemes[1]->isChecked() );
 }
 
 TEST_F( ViewMenu, AScriptSelectsAndRunsCommandsAsAPersonDoes )

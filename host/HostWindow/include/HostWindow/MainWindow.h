@@ -72,6 +72,7 @@ private:
   void MakeCommandBox();
   void ConnectLoader();
   void AskForFiles();
+  void AskForFolder();
   void LoadNext();
   void OnLoaded( const QString& i_rPath, std::shared_ptr< const HostSources::VRecording > i_pRecording,
                  const QString& i_rMessage );

@@ -46,6 +46,8 @@ public:
 
   void SetReporting( bool i_bOn );
   QVariantMap FrameReport() const;
+  /// The tiles of a view of cameras with what they show; empty in other views.
+  QVariantList CameraReport() const;
   /// The number of frames drawn so far.
   qint64 Frames() const;
   QString ToolTip() const;

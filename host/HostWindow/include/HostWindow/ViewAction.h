@@ -11,10 +11,11 @@
 namespace HostWindow
 {
 
-/// A press and release of the left button.
+/// A press and release of the left button, or two of them.
 struct VClickAction
 {
   QPointF At;
+  bool bDouble = false;
 };
 
 /// A rectangle drawn with the gesture of selection.
@@ -88,7 +89,7 @@ struct VViewAction
 /// The names of the view types, by their index.
 const QStringList& ViewTypeNames();
 
-/// Reads the value of one of the options "--click", "--band", "--hover", "--drag", "--wheel", "--key", "--view",
+/// Reads the value of one of the options "--click", "--double-click", "--band", "--hover", "--drag", "--wheel", "--key", "--view",
 /// "--set", "--select", "--tracking" and "--command". An empty text means success, anything else says what is wrong
 /// with the value.
 std::string ParseViewAction( const std::string& i_rOption, const std::string& i_rText, VViewAction& o_rAction );

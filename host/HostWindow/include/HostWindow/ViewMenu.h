@@ -10,7 +10,8 @@ namespace HostWindow
 class VWorkspaceDock;
 
 /// The part of the View menu that is about the active view: from where it looks, what its camera follows and what it
-/// shows. The checks tell the true state of that view; without a view everything is disabled. Thread: GUI.
+/// shows. A view of the scene and a view of cameras have entries of their own, and the keys of those that are not shown
+/// do nothing. The checks tell the true state of the view; without a view everything is disabled. Thread: GUI.
 class VViewMenu : public QMenu
 {
   Q_OBJECT
@@ -38,16 +39,24 @@ private:
   void AddCamera();
   void AddTracking();
   void AddToggles();
+  void AddCameraToggles();
+  void AddCentroidColours();
+  void AddToggle( const QString& i_rText, const QKeySequence& i_rKey, const QString& i_rOption, QVariant i_On = true,
+                  QVariant i_Off = false );
   QAction* AddCommand( const QString& i_rText, const QKeySequence& i_rKey, const char* i_pCommand,
                        const QString& i_rRefusal );
   void Run( const char* i_pCommand, const QString& i_rRefusal );
   void Toggle( const VToggle& i_rToggle );
+  void ShowFor( bool i_bCameraView );
   void ShowConditions( bool i_bExact );
 
   std::function< VWorkspaceDock*() > m_ActiveDock;
   QActionGroup m_ViewTypes;
   QActionGroup m_Tracking;
-  QList< QAction* > m_ForView; ///< need a view
+  QActionGroup m_CentroidColours; ///< in the order of the option's values
+  QList< QAction* > m_For3D;      ///< shown for a view of the scene only
+  QList< QAction* > m_ForCameras; ///< shown for a view of cameras only
+  QList< QAction* > m_ForView;    ///< need a view
   QList< VToggle > m_Toggles;
   QList< QAction* > m_ForBounds; ///< need something selected that has a place
   QAction* m_pLock = nullptr;
