@@ -1,6 +1,6 @@
-// Laying cameras out as tiles. layout: a frame of another size; the floor is one division for each tile and number of
-// rows, summed up. gesture: a turn of the wheel over one tile, and the tiles as the next frame draws them; the floor
-// copies as many tiles.
+// Laying cameras out as tiles. layout: a frame of another size; the floor is one division for each tile and each number
+// of rows that leaves none empty, summed up. gesture: a turn of the wheel over one tile, and the tiles as the next
+// frame draws them; the floor copies as many tiles.
 
 #include <MoxelGraphics/VCameraGrid.h>
 
@@ -48,6 +48,11 @@ void LayoutFloor( benchmark::State& io_rState )
     double Best = 0.0;
     for ( std::size_t Rows = 1; Rows <= Aspects.size(); ++Rows )
     {
+      const std::size_t Columns = ( Aspects.size() + Rows - 1 ) / Rows;
+      if ( ( Rows - 1 ) * Columns >= Aspects.size() )
+      {
+        continue;
+      }
       Cell += 1e-9;
       double Sum = 0.0;
       for ( const double Aspect : Aspects )
