@@ -155,6 +155,11 @@ std::shared_ptr< IFlowStateCacheManager > MakeCacheManager( std::size_t i_Ring )
   return std::make_shared< VCacheManager >( i_Ring );
 }
 
+VPoolFigures CountPools()
+{
+  return { VItemPools::Instance().Count(), VFlowState::Count(), VNameBook::Instance().Count() };
+}
+
 void TrimPools()
 {
   VFlowState::TrimPool();

@@ -18,6 +18,7 @@ struct VStatePool
 {
   std::mutex Guard;
   VFreeList< VFlowState > Free;
+  std::size_t Made = 0; ///< and not ended
 };
 
 VStatePool& Pool()
@@ -35,10 +36,11 @@ VFlowStateRef VFlowState::Make( const VFlowTimeKey& i_rKey, const VFlowInfoA& i_
   {
     const std::lock_guard Lock( Pool().Guard );
     pState = Pool().Free.Take();
-  }
-  if ( !pState )
-  {
-    pState = new VFlowState;
+    if ( !pState )
+    {
+      pState = new VFlowState;
+      ++Pool().Made;
+    }
   }
   pState->m_Key = i_rKey;
   pState->m_InfoA = i_rInfoA;
@@ -52,7 +54,14 @@ void VFlowState::TrimPool()
   while ( const VFlowState* pState = Pool().Free.Take() )
   {
     delete pState;
+    --Pool().Made;
   }
+}
+
+std::size_t VFlowState::Count()
+{
+  const std::lock_guard Lock( Pool().Guard );
+  return Pool().Made;
 }
 
 void VFlowState::Release() const

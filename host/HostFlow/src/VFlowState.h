@@ -21,6 +21,8 @@ public:
   static ZEK::VFlowStateRef Make( const ZEK::VFlowTimeKey& i_rKey, const ZEK::VFlowInfoA& i_rInfoA,
                                   const ZEK::VFlowInfoB& i_rInfoB );
   static void TrimPool();
+  /// The states there are, in use or not.
+  static std::size_t Count();
 
   /// From now on the state does not change.
   void Freeze() const;

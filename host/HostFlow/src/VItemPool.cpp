@@ -93,6 +93,7 @@ VPooledItem& VItemPool::Take()
   if ( !pItem )
   {
     pItem = m_pMake( *this );
+    ++m_Made;
   }
   pItem->Renew( m_Salt, m_Tag, ++m_Number );
   return *pItem;
@@ -104,7 +105,14 @@ void VItemPool::Trim()
   while ( VPooledItem* pItem = m_Free.Take() )
   {
     delete pItem;
+    --m_Made;
   }
+}
+
+std::size_t VItemPool::Count()
+{
+  const std::lock_guard Lock( m_Guard );
+  return m_Made;
 }
 
 VItemPools& VItemPools::Instance()
@@ -161,6 +169,16 @@ void VItemPools::Trim()
     rpPool->Trim();
   }
   VNameBook::Instance().Trim();
+}
+
+std::size_t VItemPools::Count() const
+{
+  std::size_t Count = 0;
+  for ( const auto& rpPool : m_Pools )
+  {
+    Count += rpPool->Count();
+  }
+  return Count;
 }
 
 } // namespace HostFlow

@@ -68,6 +68,8 @@ public:
   VPooledItem& Take();
   void GiveBack( VPooledItem& i_rItem ) { m_Free.GiveBack( i_rItem ); }
   void Trim();
+  /// The items there are, in use or not.
+  std::size_t Count();
   /// The item as this pool's own, or null for one that somebody else implements.
   const VPooledItem* Own( const ZEK::IFlowItem& i_rItem ) const
   {
@@ -79,6 +81,7 @@ private:
   const std::uint32_t m_Tag;
   const std::uint32_t m_Salt;
   std::int64_t m_Number = 0;
+  std::size_t m_Made = 0; ///< and not ended
   const VMake m_pMake;
   const std::type_info& m_rItemType;
   VFreeList< VPooledItem > m_Free;
@@ -93,6 +96,7 @@ public:
   /// Null for a tag that nobody registered.
   VItemPool* Find( std::uint32_t i_Tag ) const;
   void Trim();
+  std::size_t Count() const;
 
 private:
   VItemPools();

@@ -1,6 +1,7 @@
 #include "SimulatedCameras.h"
 
 #include <cmath>
+#include <numbers>
 
 using namespace CoreMoxelTypes;
 using namespace ZEK;
@@ -11,6 +12,23 @@ namespace
 {
 
 constexpr float WarmCamera = 41; // degrees Celsius
+
+/// Of a camera's own, in [0, 1).
+f32 SpreadOf( const VHash& i_rHash )
+{
+  return static_cast< f32 >( i_rHash.Uniform() );
+}
+
+/// The room warms and cools within ten minutes, the air conditioning within one.
+double Drift( const VHash& i_rHash, std::int64_t i_Second )
+{
+  const auto Wave = [&]( double i_Period, std::uint64_t i_Stream )
+  {
+    const double Turn = std::fmod( static_cast< double >( i_Second ), i_Period ) / i_Period;
+    return std::sin( 2 * std::numbers::pi * ( Turn + i_rHash.With( i_Stream ).Uniform() ) );
+  };
+  return 1.2 * Wave( 600, 1 ) + 0.3 * Wave( 53, 2 );
+}
 
 } // namespace
 
@@ -56,10 +74,8 @@ void VSimulatedCameras::AddHealth( const VCamera& i_rCamera, std::size_t i_Index
                                    std::vector< VFlowItemRef >& io_rSlow ) const
 {
   const bool bBumped = ( i_rCamera.Faults & FaultBit( ESimulatedFault::Bumped ) ) != 0;
-  const bool bHot = ( i_rCamera.Faults & FaultBit( ESimulatedFault::Hot ) ) != 0;
   const bool bWarned = ( i_rCamera.Faults & FaultBit( ESimulatedFault::Warned ) ) != 0;
-  const VHash Hash = VHash( m_rOptions.Seed ).With( 0x4865 ).With( i_Index );
-  const auto Spread = static_cast< f32 >( Hash.Uniform() );
+  const f32 Spread = SpreadOf( HealthHash( i_Index ) );
   const f32 Temperature = WarmCamera + 2 * Spread;
   if ( !( i_rCamera.Faults & FaultBit( ESimulatedFault::Uncalibrated ) ) )
   {
@@ -75,14 +91,41 @@ void VSimulatedCameras::AddHealth( const VCamera& i_rCamera, std::size_t i_Index
     io_rMaker.AddSlow< FlowCameraCalibrationDetails >( io_rSlow, EFlowNameDevice, i_rCamera.Name,
                                                        { Temperature - 0.6F, Temperature, true, 0 } );
   }
-  // The way down on the ring, in the camera's own axes, is the same for all but the tilt.
-  const f32 Tilt = static_cast< f32 >( std::atan2( i_rCamera.Calibration.Position.z - 900, 4800.0 ) );
   io_rMaker.AddSlow< FlowCameraPhysicalStatus >( io_rSlow, EFlowNameDevice, i_rCamera.Name,
                                                  { bBumped, bBumped ? 3.0F : 0.0F, 0 } );
-  io_rMaker.AddSlow< FlowCameraPhysicalSensorData >(
-      io_rSlow, EFlowNameDevice, i_rCamera.Name,
-      { Temperature + ( bHot ? 25 : 0 ), { 0, std::cos( Tilt ), std::sin( Tilt ) }, 5 } );
   io_rMaker.AddSlow< FlowCameraWarnings >( io_rSlow, EFlowNameDevice, i_rCamera.Name, { bWarned ? 0xFFu : 0u } );
+}
+
+void VSimulatedCameras::AddSensors( double i_Seconds, VItemMaker& io_rMaker, IFlowState& io_rState )
+{
+  for ( std::size_t Index = 0; Index < m_Cameras.size(); ++Index )
+  {
+    VCamera& rCamera = m_Cameras[Index];
+    const VHash Hash = HealthHash( Index );
+    const bool bHot = ( rCamera.Faults & FaultBit( ESimulatedFault::Hot ) ) != 0;
+    const double Celsius = WarmCamera + 2 * static_cast< double >( SpreadOf( Hash ) ) + ( bHot ? 25 : 0 ) +
+                           Drift( Hash, static_cast< std::int64_t >( i_Seconds ) );
+    const auto Tenths = static_cast< std::int32_t >( std::lround( 10 * Celsius ) );
+    if ( !rCamera.Sensor || rCamera.Tenths != Tenths )
+    {
+      auto* const pSensor =
+          io_rMaker.MakeNamed< FlowCameraPhysicalSensorData >( rCamera.Sensor, EFlowNameDevice, rCamera.Name );
+      if ( !pSensor )
+      {
+        return;
+      }
+      rCamera.Tenths = Tenths;
+      // The way down on the ring, in the camera's own axes, is the same for all but the tilt.
+      const f32 Tilt = static_cast< f32 >( std::atan2( rCamera.Calibration.Position.z - 900, 4800.0 ) );
+      *pSensor = { static_cast< f32 >( Tenths ) / 10, { 0, std::cos( Tilt ), std::sin( Tilt ) }, 5 };
+    }
+    io_rState.AddItem( rCamera.Sensor );
+  }
+}
+
+VHash VSimulatedCameras::HealthHash( std::size_t i_Camera ) const
+{
+  return VHash( m_rOptions.Seed ).With( 0x4865 ).With( i_Camera );
 }
 
 } // namespace HostSources::Simulation

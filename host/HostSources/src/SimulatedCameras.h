@@ -43,6 +43,9 @@ public:
   /// Video frames come at a rate of their own: between two of them the item stays.
   void AddVideo( const VMarkerStage& i_rStage, double i_Seconds, VItemMaker& io_rMaker, ZEK::IFlowState& io_rState );
 
+  /// What the cameras' own sensors read. The item stays while the reading does.
+  void AddSensors( double i_Seconds, VItemMaker& io_rMaker, ZEK::IFlowState& io_rState );
+
 private:
   struct VCamera
   {
@@ -55,10 +58,13 @@ private:
     bool bEdges = false;
     std::vector< CoreMoxelTypes::u8 > Mask;
     ZEK::VFlowItemRef Video; ///< the frame last made
+    ZEK::VFlowItemRef Sensor = {};
+    std::int32_t Tenths = 0; ///< of a degree, in that item
   };
   /// The items of one camera in one frame.
   struct VFrameSets;
 
+  VHash HealthHash( std::size_t i_Camera ) const;
   void MakeMask( VCamera& io_rCamera ) const;
   void AddHealth( const VCamera& i_rCamera, std::size_t i_Index, VItemMaker& io_rMaker,
                   std::vector< ZEK::VFlowItemRef >& io_rSlow ) const;

@@ -37,11 +37,20 @@ VSimulatedCaptureOptions Limited( VSimulatedCaptureOptions i_Options )
   i_Options.GapProbability = Within( i_Options.GapProbability, 0.0, 1.0 );
   i_Options.ExtraPoints = Within( i_Options.ExtraPoints, 0u, 1000u );
   i_Options.VideoCameras = Within( i_Options.VideoCameras, 0u, i_Options.Cameras / 2 );
+  i_Options.LateFrames = Within( i_Options.LateFrames, 0u, 15u );
   if ( i_Options.VideoFormat && *i_Options.VideoFormat > EPixelFormat::NV12 )
   {
     i_Options.VideoFormat.reset();
   }
   return i_Options;
+}
+
+/// The frame that comes at a place in the order of arrival, when one in 32 is late.
+std::int64_t FrameAt( std::int64_t i_Place, std::int64_t i_Late )
+{
+  constexpr std::int64_t Round = 32, First = 8;
+  const std::int64_t Place = i_Place % Round - First;
+  return Place < 0 || Place > i_Late ? i_Place : Place < i_Late ? i_Place + 1 : i_Place - i_Late;
 }
 
 bool SameLabels( const VReconstructionLabelSet& i_rA, const std::vector< VReconstructionLabelSet::L >& i_rB )
@@ -166,6 +175,7 @@ void VSimulatedCapture::VImpl::AddPoints( double i_Seconds, std::int64_t i_Index
   }
   Cameras.AddFrame( Markers, Maker, i_rState, *pSet );
   Cameras.AddVideo( Stage, i_Seconds, Maker, i_rState );
+  Cameras.AddSensors( i_Seconds, Maker, i_rState );
   i_rState.AddItem( Item );
   AddLabels( i_rState );
 }
@@ -239,6 +249,11 @@ double VSimulatedCapture::RateHz() const
   return m_pImpl->Options.RateHz;
 }
 
+std::int64_t VSimulatedCapture::FrameNumber( std::int64_t i_Index ) const
+{
+  return FrameAt( i_Index, m_pImpl->Options.LateFrames );
+}
+
 EUpAxis VSimulatedCapture::UpAxis() const
 {
   return m_pImpl->Up;
@@ -274,7 +289,8 @@ IResult VSimulatedCapture::MakeState( std::int64_t i_Index, const VStateMaker& i
   {
     return IResult::InvalidHandle;
   }
-  const double Seconds = static_cast< double >( i_Index ) / rImpl.Options.RateHz;
+  const std::int64_t Frame = FrameNumber( i_Index );
+  const double Seconds = static_cast< double >( Frame ) / rImpl.Options.RateHz;
   const auto Whole = static_cast< std::int64_t >( Seconds );
   VFlowInfoA InfoA{ static_cast< std::int64_t >( std::min( Seconds * 1e9, 9e18 ) ),
                     std::llround( rImpl.Options.RateHz * 1000 ), 1000 };
@@ -284,7 +300,7 @@ IResult VSimulatedCapture::MakeState( std::int64_t i_Index, const VStateMaker& i
       static_cast< std::int32_t >( ( Seconds - static_cast< double >( Whole ) ) * rImpl.Options.RateHz + 0.5 ), 0 };
   VFlowStateRef State;
   const IResult Created =
-      i_rMaker.Factory->CreateState( State, { i_Index * Ticks, Ticks, i_rMaker.Clock }, InfoA, InfoB );
+      i_rMaker.Factory->CreateState( State, { Frame * Ticks, Ticks, i_rMaker.Clock }, InfoA, InfoB );
   if ( Created.IsError() )
   {
     return Created;
@@ -307,10 +323,10 @@ IResult VSimulatedCapture::MakeState( std::int64_t i_Index, const VStateMaker& i
   {
     State->AddItemAt( rImpl.UpAxisItem, Always );
   }
-  rImpl.AddPoints( Seconds, i_Index, *State );
+  rImpl.AddPoints( Seconds, Frame, *State );
   if ( rImpl.Options.bForcePlates )
   {
-    rImpl.AddPlateSamples( i_Index, *State );
+    rImpl.AddPlateSamples( Frame, *State );
   }
   if ( rImpl.Maker.Failure().IsOk() )
   {

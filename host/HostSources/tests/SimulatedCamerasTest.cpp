@@ -18,19 +18,6 @@ using namespace HostSources::Simulation;
 namespace
 {
 
-template < typename T >
-std::map< std::string, const T* > ByCamera( const IFlowState& i_rState, std::uint32_t i_Tag )
-{
-  std::map< std::string, const T* > Found;
-  for ( const VFlowItemRef& rItem : ItemsOf( i_rState, i_Tag ) )
-  {
-    std::string_view Name;
-    EXPECT_TRUE( rItem->Value().GetName( EFlowNameDevice, Name ) ) << i_Tag;
-    EXPECT_TRUE( Found.emplace( Name, FlowPayload< T >( rItem.Get() ) ).second ) << Name << " twice, " << i_Tag;
-  }
-  return Found;
-}
-
 /// From the camera through a point of the raw image, by way of the matrices that views draw with.
 struct VRay
 {

@@ -153,9 +153,9 @@ TEST( SimulatedCapture, SlowItemsAreTheSameObjectsInEveryState )
   VSimulatedCapture Capture( { .GapProbability = 0 } );
   const auto First = StateOf( Capture, 10 ), Second = StateOf( Capture, 5000000 );
   const std::map< std::uint32_t, std::size_t > Counts = {
-      { 0x1000, 12 }, { 0x1001, 12 }, { 0x1002, 10 }, { 0x100a, 12 }, { 0x100b, 12 }, { 0x102d, 12 },
-      { 0x102e, 12 }, { 0x102f, 12 }, { 0x1037, 12 }, { 0x1012, 2 },  { 0x1013, 2 },  { 0x1023, 2 },
-      { 0x1029, 1 },  { 0x1031, 1 },  { 0x100f, 1 },  { 0x1, 1 } };
+      { 0x1000, 12 }, { 0x1001, 12 }, { 0x1002, 10 }, { 0x100a, 12 }, { 0x100b, 12 },
+      { 0x102d, 12 }, { 0x102f, 12 }, { 0x1037, 12 }, { 0x1012, 2 },  { 0x1013, 2 },
+      { 0x1023, 2 },  { 0x1029, 1 },  { 0x1031, 1 },  { 0x100f, 1 },  { 0x1, 1 } };
   for ( const auto& [Tag, Count] : Counts )
   {
     EXPECT_EQ( ItemsOf( *First, Tag ).size(), Count ) << Tag;
@@ -279,5 +279,80 @@ TEST( SimulatedCapture, TakesAnyOptionsAndRefusesFramesThatCannotBe )
   for ( const VReconstruction& rPoint : PointsOf( Late, std::int64_t{ 1 } << 40 ) )
   {
     ASSERT_TRUE( std::abs( rPoint.Position.x ) < FloorHalf + 10 && std::isfinite( rPoint.Position.z ) );
+  }
+}
+
+// A late state is what a view has to take as the newest, though its key is not.
+TEST( SimulatedCapture, SendsOneFrameInThirtyTwoTooLateWhereThatIsAskedFor )
+{
+  VSimulatedCapture InOrder( { .Cameras = 2, .Performers = 1 } );
+  VSimulatedCapture Late( { .Cameras = 2, .Performers = 1, .LateFrames = 5 } );
+  const auto pCache = HostFlow::MakeCache( 4 );
+  std::set< std::int64_t > Frames;
+  std::vector< std::int64_t > Back;
+  std::int64_t Newest = -1;
+  for ( std::int64_t Index = 0; Index < 128; ++Index )
+  {
+    const auto State = StateOf( Late, Index );
+    ASSERT_TRUE( pCache->Add( State ).IsOk() );
+    VFlowStateRef Fetched;
+    ASSERT_TRUE( pCache->Fetch( Fetched, 31, 2, 0 ) );
+    EXPECT_TRUE( Fetched == State );
+    const std::int64_t Frame = State->GetKey().Frame / Late.TicksPerFrame();
+    EXPECT_TRUE( Frames.insert( Frame ).second );
+    if ( Frame < Newest )
+    {
+      Back.push_back( Newest - Frame );
+    }
+    Newest = std::max( Newest, Frame );
+    const auto& rPoints = Only< VReconstructionSet >( *State, 0x100d ).Items;
+    const auto Expected = StateOf( InOrder, Frame );
+    ASSERT_EQ( rPoints.size(), Only< VReconstructionSet >( *Expected, 0x100d ).Items.size() );
+    EXPECT_EQ( rPoints[0].Position.x, Only< VReconstructionSet >( *Expected, 0x100d ).Items[0].Position.x );
+  }
+  EXPECT_EQ( Frames.size(), 128u );
+  EXPECT_EQ( *Frames.rbegin(), 127 );
+  EXPECT_EQ( Back, ( std::vector< std::int64_t >{ 5, 5, 5, 5 } ) );
+}
+
+TEST( SimulatedCapture, TemperaturesDriftSlowlyAndInWhateverOrderTheyAreAskedFor )
+{
+  VSimulatedCapture Capture( { .Cameras = 4, .Performers = 0, .RateHz = 25, .bGreyscale = false, .VideoCameras = 0 } );
+  VSimulatedCapture Other( Capture.Options() );
+  std::map< std::string, std::set< float > > Read;
+  std::size_t Changes = 0;
+  VFlowStateRef Before;
+  for ( std::int64_t Second = 0; Second < 900; ++Second )
+  {
+    const auto State = StateOf( Capture, Second * 25 );
+    EXPECT_EQ( ItemsOf( *StateOf( Capture, Second * 25 + 24 ), 0x102e ), ItemsOf( *State, 0x102e ) ) << "read once";
+    for ( const auto& [rName, pSensor] : ByCamera< VCameraPhysicalSensorData >( *State, 0x102e ) )
+    {
+      Read[rName].insert( pSensor->Temperature );
+      if ( Before )
+      {
+        const auto* pBefore = ByCamera< VCameraPhysicalSensorData >( *Before, 0x102e ).at( rName );
+        const float Step = std::abs( pSensor->Temperature - pBefore->Temperature );
+        ASSERT_LT( Step, 0.25F ) << rName << " jumps in second " << Second;
+        ASSERT_EQ( pSensor == pBefore, Step == 0 ) << "another item for another reading, and for no other reason";
+        Changes += Step > 0;
+      }
+    }
+    Before = State;
+  }
+  EXPECT_TRUE( Changes > 200 && Changes < 2400 ) << Changes;
+  ASSERT_EQ( Read.size(), 4u );
+  for ( const auto& [rName, rReadings] : Read )
+  {
+    EXPECT_GT( *rReadings.rbegin() - *rReadings.begin(), 1.5F ) << rName;
+    EXPECT_LT( *rReadings.rbegin() - *rReadings.begin(), 3.2F ) << rName;
+  }
+  for ( const std::int64_t Frame : { 20000, 3, 7777 } )
+  {
+    for ( const char* pName : { "Camera 1", "Camera 4" } )
+    {
+      EXPECT_EQ( ByCamera< VCameraPhysicalSensorData >( *StateOf( Other, Frame ), 0x102e ).at( pName )->Temperature,
+                 ByCamera< VCameraPhysicalSensorData >( *StateOf( Capture, Frame ), 0x102e ).at( pName )->Temperature );
+    }
   }
 }

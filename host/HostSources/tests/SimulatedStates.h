@@ -8,6 +8,8 @@
 
 #include <gtest/gtest.h>
 
+#include <map>
+#include <string>
 #include <vector>
 
 inline ZEK::VFlowStateRef StateOf( HostSources::VSimulatedCapture& i_rCapture, std::int64_t i_Index )
@@ -37,4 +39,17 @@ const T& Only( const ZEK::IFlowState& i_rState, std::uint32_t i_Tag )
   const auto Items = ItemsOf( i_rState, i_Tag );
   EXPECT_EQ( Items.size(), 1u );
   return *ZEK::FlowPayload< T >( Items.at( 0 ).Get() );
+}
+
+template < typename T >
+std::map< std::string, const T* > ByCamera( const ZEK::IFlowState& i_rState, std::uint32_t i_Tag )
+{
+  std::map< std::string, const T* > Found;
+  for ( const ZEK::VFlowItemRef& rItem : ItemsOf( i_rState, i_Tag ) )
+  {
+    std::string_view Name;
+    EXPECT_TRUE( rItem->Value().GetName( ZEK::EFlowNameDevice, Name ) ) << i_Tag;
+    EXPECT_TRUE( Found.emplace( Name, ZEK::FlowPayload< T >( rItem.Get() ) ).second ) << Name << " twice, " << i_Tag;
+  }
+  return Found;
 }

@@ -17,7 +17,28 @@ void* operator new( std::size_t i_Size )
   throw std::bad_alloc();
 }
 
+void* operator new( std::size_t i_Size, std::align_val_t i_Alignment )
+{
+  s_Allocations.fetch_add( 1, std::memory_order_relaxed );
+  const auto Alignment = static_cast< std::size_t >( i_Alignment );
+  if ( void* const pMemory = std::aligned_alloc( Alignment, ( i_Size + Alignment - 1 ) / Alignment * Alignment ) )
+  {
+    return pMemory;
+  }
+  throw std::bad_alloc();
+}
+
 void operator delete( void* i_pMemory ) noexcept
+{
+  std::free( i_pMemory );
+}
+
+void operator delete( void* i_pMemory, std::align_val_t ) noexcept
+{
+  std::free( i_pMemory );
+}
+
+void operator delete( void* i_pMemory, std::size_t, std::align_val_t ) noexcept
 {
   std::free( i_pMemory );
 }

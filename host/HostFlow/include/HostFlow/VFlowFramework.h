@@ -52,6 +52,15 @@ std::shared_ptr< IHostStateCache > MakeCache( std::size_t i_Ring = DefaultRing )
 /// Its caches are `IHostStateCache`s of that ring. An empty name gives `InvalidName`. Thread: any.
 std::shared_ptr< ZEK::IFlowStateCacheManager > MakeCacheManager( std::size_t i_Ring = DefaultRing );
 
+/// What is there, in use or waiting for its next use; it grows with what is in use at once, not with time.
+struct VPoolFigures
+{
+  std::size_t Items = 0;
+  std::size_t States = 0;
+  std::size_t Names = 0;
+};
+VPoolFigures CountPools();
+
 /// Gives back to the system the memory that pooled items and states keep for the next. Every cache does this when it
 /// goes away; a source that was large does it when it closes. Thread: any.
 void TrimPools();

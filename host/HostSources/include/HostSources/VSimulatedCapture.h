@@ -47,6 +47,8 @@ struct VSimulatedCaptureOptions
   std::optional< CoreMoxelTypes::EPixelFormat > VideoFormat =
       std::nullopt; ///< none: every format in turn, two seconds each
   std::vector< VSimulatedFault > Faults = {};
+  /// 0 to 15. In every 32 frames one is sent that many frames too late, after newer ones: 0 sends all in order.
+  std::uint32_t LateFrames = 0;
 };
 
 /// A capture without hardware: people who walk in circles on a floor of 6 by 6 m, within a ring of cameras.
@@ -62,7 +64,10 @@ struct VSimulatedCaptureOptions
 /// `SubjectId` is `VSubject::Id`, its `MarkerId` the index into `VSubject::Markers`, which is also `VMarker::Id`. Prop,
 /// wand and extra points have no label. 0x1025 holds the samples of the frame's own time, at a whole multiple of the
 /// rate near 1000 Hz; the moment is about the middle of the plate. All but 0x1003, 0x1005 to 0x1007, 0x100c, 0x100d,
-/// 0x1022 and 0x1025 are the same objects in every state; 0x100f is while no label comes or goes.
+/// 0x1022 and 0x1025 are the same objects in every state; 0x100f is while no label comes or goes, 0x102e while a camera
+/// reads the same temperature: it drifts by a degree or two within minutes and is read once a second, to a tenth.
+///
+/// With `LateFrames` the index counts states in the order in which they come; their keys tell the frames they are.
 ///
 /// Centroids are the exact images of where markers truly are, without the noise of reconstructions. `Rays` counts the
 /// centroids that are assigned to a reconstruction. A marker in a gap may have centroids, without an assignment. A
@@ -80,7 +85,7 @@ public:
   std::string Name() const override;
   double RateHz() const override;
   std::int64_t FrameCount() const override { return -1; }
-  std::int64_t FrameNumber( std::int64_t i_Index ) const override { return i_Index; }
+  std::int64_t FrameNumber( std::int64_t i_Index ) const override;
   EUpAxis UpAxis() const override;
   std::string UpAxisReason() const override;
   void SetUpAxis( EUpAxis i_Axis ) override;
