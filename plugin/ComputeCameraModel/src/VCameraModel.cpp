@@ -178,7 +178,7 @@ void VCameraModel::Set( const CoreMoxelTypes::VCameraHardware& i_rHardware,
   const VMatrix4 Sensor = MakeSensorTransform( Lens );
   const VMatrix4 ToUnit = Scaling( 1 / Lens.W, 1 / Lens.H, 1 );
   DistortionCentre = { Single( i_rCalibration.DistortionCentre[0] ), Single( i_rCalibration.DistortionCentre[1] ) };
-  const auto& [CentreX, CentreY] = DistortionCentre;
+  const auto CentreX = DistortionCentre[0], CentreY = DistortionCentre[1];
   const auto Turned = [&]( const VMatrix2& i_rRotation )
   {
     return Normalised( ToUnit * Translation( CentreX, CentreY, 0 ) * PlaneRotation( i_rRotation ) *
