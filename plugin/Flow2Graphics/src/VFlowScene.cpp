@@ -2,6 +2,9 @@
 
 #include "StateUpAxis.h"
 
+#include <Flow2Graphics/VContributions.h>
+#include <Flow2Graphics/VFlowContributions.h>
+#include <Flow2Graphics/VFlowRenderCameras.h>
 #include <Flow2Graphics/VFlowRenderCentroidAssignments.h>
 #include <Flow2Graphics/VFlowRenderFloorGrid.h>
 #include <Flow2Graphics/VFlowRenderForcePlates.h>
@@ -10,11 +13,49 @@
 
 #include <CoreMoxelTypes/FlowTypes.h>
 #include <MoxelGraphics/VRenderAxis.h>
+#include <MoxelGraphics/VRenderCameraBackdrop.h>
+#include <MoxelGraphics/VRenderCameraData2D.h>
+#include <MoxelGraphics/VRenderCameraData3D.h>
 #include <MoxelGraphics/VRenderOutlines.h>
 
 namespace Flow2Graphics
 {
-VFlowScene::~VFlowScene() = default;
+VFlowScene::VFlowScene( std::shared_ptr< HarrowPluginInterface::IRenderResources > i_pRenderResources,
+                        std::shared_ptr< ZEK::ISelectionService > i_pSelectionService,
+                        std::shared_ptr< HarrowPluginInterface::VMeshSceneCache > i_pMeshCache,
+                        std::shared_ptr< ZEK::IPostalService > i_pPostalService, bool i_bDeveloperMode )
+  : VMoxelScene( std::move( i_pRenderResources ), std::move( i_pSelectionService ), std::move( i_pMeshCache ),
+                 i_pPostalService, i_bDeveloperMode )
+  , m_pContributions( std::make_shared< VContributions >( i_pPostalService ) )
+{
+  m_pContributions->SetOnWatched(
+      [this]
+      {
+        MarkDirty(); // the frame that is shown is looked at again
+      } );
+}
+
+VFlowScene::~VFlowScene()
+{
+  // Documents may let go of the list after the scene.
+  m_pContributions->SetOnWatched( {} );
+}
+
+QObject* VFlowScene::ContributionsObject() const
+{
+  return m_pContributions.get();
+}
+
+QVariantMap VFlowScene::SceneReport()
+{
+  if ( !m_bReported )
+  {
+    m_bReported = true;
+    m_pContributions->watch();
+  }
+  m_pContributions->Flush();
+  return { { "contributions", m_pContributions->Rows() } };
+}
 
 void VFlowScene::Initialise( CoreGraphics::VRenderContext& io_rContext )
 {
@@ -35,12 +76,19 @@ void VFlowScene::CreateRenderTypes()
   const auto pReconstructions = std::make_shared< VFlowRenderReconstructions >( *this );
   m_pCameraProvider = std::make_shared< VFlowRenderCameraProvider >( *this );
   const auto pAssignments = std::make_shared< VFlowRenderCentroidAssignments >( *this, m_pCameraProvider );
+  const auto pBackdrop = std::make_shared< MoxelGraphics::VRenderCameraBackdrop >( *this, m_pCameraProvider );
+  m_pCameras = std::make_shared< VFlowRenderCameras >( *this, m_pCameraProvider );
+  const auto pData2D = std::make_shared< MoxelGraphics::VRenderCameraData2D >( *this, m_pCameraProvider );
+  const auto pData3D = std::make_shared< MoxelGraphics::VRenderCameraData3D >( *this, m_pCameraProvider );
   const auto pVolume = std::make_shared< VFlowRenderReconstructionVolume >( Resources() );
   const auto pAxis = std::make_shared< MoxelGraphics::VRenderAxis >( Resources() );
 
   m_PostList = { std::make_shared< MoxelGraphics::VRenderOutlines >( *this ) };
-  m_RenderList = { pFloor, pPlates, pReconstructions, pAssignments, pVolume, pAxis };
-  m_FlowRenderTypes = { pFloor, pPlates, pReconstructions, pVolume, m_pCameraProvider, pAssignments };
+  m_pBackdrop = pBackdrop;
+  m_RenderList = { pFloor,     pPlates, pReconstructions, pAssignments, pBackdrop,
+                   m_pCameras, pData3D, pData2D,          pVolume,      pAxis };
+  m_FlowRenderTypes = { pFloor, pPlates, pReconstructions, pVolume, m_pCameraProvider, pAssignments, m_pCameras,
+                        std::make_shared< VFlowContributions >( *this, m_pCameraProvider, m_pContributions ) };
 }
 
 bool VFlowScene::ProcessPending()

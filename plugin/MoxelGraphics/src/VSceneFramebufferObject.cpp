@@ -311,6 +311,10 @@ QVariantMap VSceneFramebufferObject::frameReport() const
                       { "picked_labels", Texts( m_PickedLabels ) },
                       { "notice", m_Notice } };
   HandOver( this );
+  if ( m_pScene )
+  {
+    Report.insert( m_pScene->SceneReport() );
+  }
   return Report;
 }
 

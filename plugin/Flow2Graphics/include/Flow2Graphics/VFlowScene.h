@@ -9,7 +9,9 @@
 namespace Flow2Graphics
 {
 
+class VContributions;
 class VFlowRenderCameraProvider;
+class VFlowRenderCameras;
 
 /// A scene that draws frames of state. A derived scene decides where the states come from: it calls `MarkDirty` when
 /// there is something new, and answers `FetchState`.
@@ -18,10 +20,20 @@ class VFlowRenderCameraProvider;
 class VFlowScene : public MoxelGraphics::VMoxelScene
 {
   Q_OBJECT
+  Q_PROPERTY( QObject* contributions READ ContributionsObject CONSTANT )
 
 public:
-  using VMoxelScene::VMoxelScene;
+  VFlowScene( std::shared_ptr< HarrowPluginInterface::IRenderResources > i_pRenderResources,
+              std::shared_ptr< ZEK::ISelectionService > i_pSelectionService,
+              std::shared_ptr< HarrowPluginInterface::VMeshSceneCache > i_pMeshCache,
+              std::shared_ptr< ZEK::IPostalService > i_pPostalService, bool i_bDeveloperMode );
   ~VFlowScene() override;
+
+  /// Which cameras see the selection; never null. Thread: GUI.
+  const std::shared_ptr< VContributions >& Contributions() const { return m_pContributions; }
+  QObject* ContributionsObject() const;
+  /// "contributions": the rows of the list. Watches it from the first call on.
+  QVariantMap SceneReport() override;
 
   /// Makes the render types in their fixed order; does nothing when they exist.
   void CreateRenderTypes();
@@ -51,6 +63,8 @@ public:
 
   /// The cameras of the present state; null before the render types are made.
   const std::shared_ptr< VFlowRenderCameraProvider >& CameraProvider() const { return m_pCameraProvider; }
+  /// What draws them; null before the render types are made.
+  const std::shared_ptr< VFlowRenderCameras >& Cameras() const { return m_pCameras; }
   const std::vector< std::shared_ptr< IFlowRenderType > >& FlowRenderTypes() const { return m_FlowRenderTypes; }
 
 protected:
@@ -60,6 +74,9 @@ protected:
 private:
   std::vector< std::shared_ptr< IFlowRenderType > > m_FlowRenderTypes;
   std::shared_ptr< VFlowRenderCameraProvider > m_pCameraProvider;
+  std::shared_ptr< VFlowRenderCameras > m_pCameras;
+  std::shared_ptr< VContributions > m_pContributions;
+  bool m_bReported = false; ///< the report watches
 };
 
 } // namespace Flow2Graphics

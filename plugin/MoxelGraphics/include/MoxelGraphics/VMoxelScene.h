@@ -11,6 +11,7 @@
 
 #include <QtCore/QObject>
 #include <QtCore/QString>
+#include <QtCore/QVariantMap>
 
 #include <array>
 #include <atomic>
@@ -93,6 +94,8 @@ public:
   virtual QString GetSelectedCameraURN();
   /// Makes the named item the whole selection or preselection. Nothing in the base.
   virtual void SelectDevice( const QString& i_rName, bool i_bPreselect );
+  /// What a view's report tells of the scene beside the frame. Thread: GUI. Nothing in the base.
+  virtual QVariantMap SceneReport() { return {}; }
 
   // What a frame does, in the order of a frame.
   bool IsPending() const { return m_pFlags->bPending.load( std::memory_order_acquire ); }
@@ -115,6 +118,15 @@ public:
   void RenderPass( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, std::uint32_t i_Pass );
   /// After the last tile of a camera view: every type draws what it collected from them.
   void DrawTiles( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
+  /// A view goes through its tiles. As long as its number is the one of the last walk, types hold what they collected.
+  std::uint64_t BeginTileWalk() { return ++m_TileWalk; }
+  std::uint64_t TileWalk() const { return m_TileWalk; }
+  /// True in `DrawTiles` when the view did not go through its tiles because all is as it was: types then draw once more
+  /// what they collected last.
+  bool TilesAgain() const { return m_bTilesAgain; }
+  void SetTilesAgain( bool i_bAgain ) { m_bTilesAgain = i_bAgain; }
+  /// Grows each time the scene may have been brought up to date.
+  std::uint64_t UpdateCount() const { return m_UpdateCount; }
   void DrawPost( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
   bool WantsPaint( const VSceneOptions& i_rOptions ) const;
   void Paint( QPainter& io_rPainter, CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
@@ -197,6 +209,9 @@ private:
   bool m_bDeveloperMode = false;
   bool m_bCanDraw = false;
   bool m_bHighlighted = false;
+  bool m_bTilesAgain = false;
+  std::uint64_t m_TileWalk = 0;
+  std::uint64_t m_UpdateCount = 0;
   std::atomic< bool > m_bYUp{ false };
   static constexpr std::uint32_t IdsPerWord = 64;
   std::vector< std::uint32_t > m_IgnoredIds;
