@@ -1,7 +1,9 @@
 set( HostSourcesReaderSources
-  src/C3dLayout.cpp src/C3dNumbers.cpp src/C3dParameters.cpp src/ForcePlates.cpp src/Labels.cpp src/ReaderSupport.cpp
-  src/ReadRecording.cpp src/RecordingInfo.cpp src/RecordingSubjects.cpp src/UpAxis.cpp src/VByteSource.cpp
-  src/VC3dReader.cpp src/VRecordingSource.cpp src/VTrcReader.cpp )
+  src/BvhSkeleton.cpp src/C3dLayout.cpp src/C3dNumbers.cpp src/C3dParameters.cpp src/ForcePlates.cpp src/Labels.cpp
+  src/ReaderSupport.cpp src/ReadRecording.cpp src/RecordingInfo.cpp src/RecordingSkeletons.cpp
+  src/RecordingSubjects.cpp src/UpAxis.cpp src/VBvhReader.cpp src/VByteSource.cpp src/VC3dReader.cpp
+  src/VRecordingSource.cpp src/VTrcReader.cpp )
 set( HostSourcesReaderTests
+  tests/BvhTest.cpp
   tests/C3dDamageTest.cpp tests/C3dFormsTest.cpp tests/ForcePlateTest.cpp tests/ReadRecordingTest.cpp
   tests/RealC3dTest.cpp tests/RealTrcTest.cpp tests/RecordingSourceTest.cpp tests/TrcTest.cpp )

@@ -1,5 +1,6 @@
 #include <HostSources/ReadRecording.h>
 
+#include <HostSources/VBvhReader.h>
 #include <HostSources/VC3dReader.h>
 #include <HostSources/VFolderReader.h>
 #include <HostSources/VTrcReader.h>
@@ -25,11 +26,13 @@ bool HasSuffix( const std::filesystem::path& i_rPath, const char* i_pSuffix )
 }
 
 /// A text is read as a whole before its lines are.
-ZEK::IResult ReadTrcFile( VFileSource& io_rSource, const std::string& i_rName, VRecording& o_rRecording,
-                          std::string& o_rMessage, const VProgress& i_rProgress )
+template < typename TRead >
+ZEK::IResult ReadTextFile( ERecordingFormat i_Format, TRead&& i_rRead, VFileSource& io_rSource,
+                           const std::string& i_rName, VRecording& o_rRecording, std::string& o_rMessage,
+                           const VProgress& i_rProgress )
 {
   std::span< const std::byte > Bytes;
-  const ZEK::IResult Loaded = ReadGuarded( ERecordingFormat::Trc, i_rName, o_rRecording, o_rMessage,
+  const ZEK::IResult Loaded = ReadGuarded( i_Format, i_rName, o_rRecording, o_rMessage,
                                            [&]
                                            {
                                              if ( i_rProgress && !i_rProgress( 0 ) )
@@ -48,7 +51,7 @@ ZEK::IResult ReadTrcFile( VFileSource& io_rSource, const std::string& i_rName, V
                                              }
                                              return ZEK::IResult();
                                            } );
-  return Loaded.IsOk() ? ReadTrc( Bytes, i_rName, o_rRecording, o_rMessage, i_rProgress ) : Loaded;
+  return Loaded.IsOk() ? i_rRead( Bytes, i_rName, o_rRecording, o_rMessage, i_rProgress ) : Loaded;
 }
 } // namespace
 
@@ -71,27 +74,31 @@ ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_
   const std::string Name = i_rPath.string();
   if ( Source.Size() == 0 )
   {
-    o_rMessage = Name + ": byte offset 0: expected a C3D or TRC recording, found an empty file";
+    o_rMessage = Name + ": byte offset 0: expected a C3D, TRC or BVH recording, found an empty file";
     return ZEK::IResult::EndOfData;
   }
   const auto Head = Source.Read( 0, 64 );
   if ( Head.empty() )
   {
-    o_rMessage = Name + ": byte offset 0: expected a C3D or TRC recording, and the file could not be read";
+    o_rMessage = Name + ": byte offset 0: expected a C3D, TRC or BVH recording, and the file could not be read";
     return ZEK::IResult::FileIOFailure;
   }
   const bool bC3d = LooksLikeC3d( Head ), bTrc = LooksLikeTrc( Head );
   // With damaged first bytes the reader of the file's suffix can still say best what is wrong.
   if ( bTrc || ( !bC3d && HasSuffix( i_rPath, ".trc" ) ) )
   {
-    return ReadTrcFile( Source, Name, o_rRecording, o_rMessage, i_rProgress );
+    return ReadTextFile( ERecordingFormat::Trc, ReadTrc, Source, Name, o_rRecording, o_rMessage, i_rProgress );
+  }
+  if ( LooksLikeBvh( Head ) || ( !bC3d && HasSuffix( i_rPath, ".bvh" ) ) )
+  {
+    return ReadTextFile( ERecordingFormat::Bvh, ReadBvh, Source, Name, o_rRecording, o_rMessage, i_rProgress );
   }
   if ( bC3d || HasSuffix( i_rPath, ".c3d" ) )
   {
     return ReadC3d( Source, Name, o_rRecording, o_rMessage, i_rProgress );
   }
-  o_rMessage = Name + ": byte offset 0: expected a C3D file (0x50 at byte offset 1) or a TRC file (\"PathFileType\" " +
-               "in line 1), found neither";
+  o_rMessage = Name + ": byte offset 0: expected a C3D file (0x50 at byte offset 1), a TRC file (\"PathFileType\" " +
+               "in line 1) or a BVH file (\"HIERARCHY\" in line 1), found none of them";
   return ZEK::IResult::InvalidFormat;
 }
 

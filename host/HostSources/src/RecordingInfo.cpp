@@ -269,6 +269,48 @@ void WriteAnalogAndEvents( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
   io_rWriter.EndArray();
 }
 
+VRecordingInfo::VSkeleton DescribeSkeleton( const VRecordingSkeleton& i_rS )
+{
+  VRecordingInfo::VSkeleton Skeleton{ i_rS.Subject.Name, {}, i_rS.EndSiteCount, i_rS.ChannelCount, i_rS.StateSize };
+  for ( const CoreMoxelTypes::VSegment& rSegment : i_rS.Subject.Segments )
+  {
+    Skeleton.Segments.push_back( rSegment.Name );
+  }
+  return Skeleton;
+}
+
+std::string SkeletonText( const VRecordingInfo::VSkeleton& i_rSkeleton )
+{
+  std::string Lines =
+      "Skeleton:  " + Shown( i_rSkeleton.Name ) +
+      Format( ", %zu joints, %llu end sites, %llu channels, %llu degrees of freedom\n", i_rSkeleton.Segments.size(),
+              static_cast< unsigned long long >( i_rSkeleton.EndSiteCount ),
+              static_cast< unsigned long long >( i_rSkeleton.ChannelCount ),
+              static_cast< unsigned long long >( i_rSkeleton.StateSize ) );
+  for ( const std::string& rName : i_rSkeleton.Segments )
+  {
+    Lines += "  joint    " + Shown( rName ) + "\n";
+  }
+  return Lines;
+}
+
+void WriteSkeletons( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
+{
+  io_rWriter.Key( "skeletons" );
+  io_rWriter.StartArray();
+  for ( const VRecordingInfo::VSkeleton& rSkeleton : i_rInfo.Skeletons )
+  {
+    io_rWriter.StartObject();
+    Text( io_rWriter, "name", rSkeleton.Name );
+    Texts( io_rWriter, "segments", rSkeleton.Segments );
+    Integer( io_rWriter, "endSites", static_cast< std::int64_t >( rSkeleton.EndSiteCount ) );
+    Integer( io_rWriter, "channels", static_cast< std::int64_t >( rSkeleton.ChannelCount ) );
+    Integer( io_rWriter, "degreesOfFreedom", static_cast< std::int64_t >( rSkeleton.StateSize ) );
+    io_rWriter.EndObject();
+  }
+  io_rWriter.EndArray();
+}
+
 void WritePoints( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
 {
   Integer( io_rWriter, "points", static_cast< std::int64_t >( i_rInfo.PointCount ) );
@@ -351,6 +393,7 @@ VRecordingInfo DescribeRecording( const VRecording& i_rRecording )
   Info.Format = i_rRecording.Format == ERecordingFormat::C3d      ? "C3D"
                 : i_rRecording.Format == ERecordingFormat::Trc    ? "TRC"
                 : i_rRecording.Format == ERecordingFormat::Folder ? "folder"
+                : i_rRecording.Format == ERecordingFormat::Bvh    ? "BVH"
                                                                   : "none";
   Info.Form = i_rRecording.Form;
   Info.Unit = i_rRecording.Unit;
@@ -375,6 +418,10 @@ VRecordingInfo DescribeRecording( const VRecording& i_rRecording )
   for ( const VForcePlate& rPlate : i_rRecording.ForcePlates )
   {
     Info.ForcePlates.push_back( DescribePlate( rPlate, i_rRecording.AnalogPerFrame ) );
+  }
+  for ( const VRecordingSkeleton& rSkeleton : i_rRecording.Skeletons )
+  {
+    Info.Skeletons.push_back( DescribeSkeleton( rSkeleton ) );
   }
   for ( const VRecordingCamera& rCamera : i_rRecording.Cameras )
   {
@@ -404,6 +451,10 @@ std::string VRecordingInfo::Text() const
   for ( const VPlate& rPlate : ForcePlates )
   {
     Lines += ( &rPlate == &ForcePlates.front() ? "Plates:\n" : "" ) + PlateText( rPlate );
+  }
+  for ( const VSkeleton& rSkeleton : Skeletons )
+  {
+    Lines += SkeletonText( rSkeleton );
   }
   for ( const VCamera& rCamera : Cameras )
   {
@@ -439,6 +490,7 @@ std::string VRecordingInfo::Json() const
   WritePoints( Writer, *this );
   HostSources::Text( Writer, "upAxis", UpAxis == EUpAxis::Y ? "y" : "z" );
   HostSources::Text( Writer, "upAxisReason", UpAxisReason );
+  WriteSkeletons( Writer, *this );
   WriteCameras( Writer, *this );
   WriteAnalogAndEvents( Writer, *this );
   Texts( Writer, "notes", Notes );

@@ -2,6 +2,7 @@
 
 #include "RecordingCameras.h"
 #include "RecordingItems.h"
+#include "RecordingSkeletons.h"
 #include "RecordingSubjects.h"
 #include "RecordingVideos.h"
 
@@ -62,6 +63,7 @@ public:
     , m_Subjects( SubjectsOf( i_rRecording ) )
     , m_Cameras( i_rRecording, m_Subjects )
     , m_Videos( i_rRecording )
+    , m_Skeletons( i_rRecording, static_cast< u32 >( m_Subjects.Subjects.size() ) + 1 )
   {
   }
 
@@ -83,6 +85,7 @@ private:
   const VRecordingSubjects m_Subjects;
   VRecordingCameras m_Cameras;
   VRecordingVideos m_Videos;
+  VRecordingSkeletons m_Skeletons;
   ZEK::VFlowStoreRef m_Store; ///< that made the items
   EUpAxis m_Up = EUpAxis::Z;
   std::vector< ZEK::VFlowItemRef > m_Slow;
@@ -172,6 +175,7 @@ ZEK::IResult VRecordingSource::VState::MakeSlowItems( const VStateMaker& i_rMake
   m_Videos.Forget();
   ZEK::IResult Result = MakeAxisItems( i_rMaker, i_Up );
   Result = Result.IsOk() ? MakeSubjectItems( i_rMaker ) : Result;
+  Result = Result.IsOk() ? m_Skeletons.MakeSlowItems( i_rMaker, m_Slow ) : Result;
   Result = Result.IsOk() ? m_Cameras.MakeSlowItems( i_rMaker, m_Slow ) : Result;
   ZEK::VFlowItemRef Item;
   for ( const VForcePlate& rPlate : m_rRecording.ForcePlates )
@@ -281,6 +285,7 @@ ZEK::IResult VRecordingSource::VState::MakeFastItems( const VStateMaker& i_rMake
   {
     Result = MakeLabels( i_rMaker, i_Index );
   }
+  Result = Result.IsOk() ? m_Skeletons.MakeFastItems( i_rMaker, i_Index ) : Result;
   Result = Result.IsOk() ? m_Cameras.MakeFastItems( i_rMaker, i_Index ) : Result;
   return Result.IsOk() ? m_Videos.MakeItems( i_rMaker, i_Index ) : Result;
 }
@@ -320,6 +325,7 @@ void VRecordingSource::VState::AddItems( const ZEK::VFlowTimeKey& i_rSlowKey, ZE
   {
     io_rState.AddItem( m_Labels );
   }
+  m_Skeletons.AddItems( io_rState );
   m_Cameras.AddItems( io_rState );
   m_Videos.AddItems( io_rState );
   for ( const ZEK::VFlowItemRef& rItem : m_Slow )

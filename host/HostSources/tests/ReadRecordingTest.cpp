@@ -60,7 +60,7 @@ TEST_F( ReadFile, WhatCannotBeReadIsNamed )
       { Bare, ZEK::IResult::FileIOFailure, "found a folder" },
       { Pipe, ZEK::IResult::FileIOFailure, "no plain file" },
       { Save( "empty.trc", {} ), ZEK::IResult::EndOfData, "byte offset 0: expected" },
-      { Save( "other.txt", Other ), ZEK::IResult::InvalidFormat, "found neither" },
+      { Save( "other.txt", Other ), ZEK::IResult::InvalidFormat, "found none of them" },
       { Save( "other.trc", Other ), ZEK::IResult::InvalidFormat, "line 1: expected" },
       { Save( "other.C3D", Other ), ZEK::IResult::InvalidFormat, "byte offset 0: expected" } };
   for ( const auto& [rPath, Result, pText] : Cases )

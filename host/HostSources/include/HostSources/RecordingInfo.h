@@ -31,6 +31,12 @@ struct VRecordingInfo
     CoreMoxelTypes::D3 PeakCentre; ///< mm, world; NaN where there is none
   };
 
+  struct VSkeleton
+  {
+    std::string Name;
+    std::vector< std::string > Segments;
+    std::uint64_t EndSiteCount = 0, ChannelCount = 0, StateSize = 0;
+  };
   struct VVideo
   {
     std::string File, Codec, PixelFormat;
@@ -63,6 +69,7 @@ struct VRecordingInfo
   std::vector< VAnalogChannel > AnalogChannels;
   std::vector< VPlate > ForcePlates;
   std::vector< VCamera > Cameras;
+  std::vector< VSkeleton > Skeletons;
   std::vector< VRecordingEvent > Events;
   EUpAxis UpAxis = EUpAxis::Z;
   std::string UpAxisReason;

@@ -2,6 +2,7 @@
 
 #include <HostSources/IFrameSource.h>
 #include <HostSources/VRecordingCamera.h>
+#include <HostSources/VRecordingSkeleton.h>
 
 #include <CoreMoxelTypes/Basic.h>
 
@@ -20,7 +21,8 @@ enum class ERecordingFormat : std::uint32_t
   Unknown,
   C3d,
   Trc,
-  Folder
+  Folder,
+  Bvh
 };
 
 /// One point in one frame, in millimetres; all of it NaN where the point is missing.
@@ -116,10 +118,11 @@ struct VRecording
 
   std::vector< VForcePlate > ForcePlates;
   std::vector< VRecordingCamera > Cameras;
+  std::vector< VRecordingSkeleton > Skeletons;
   std::vector< VRecordingEvent > Events;
   std::vector< std::string > Notes; ///< what was odd about the file, as sentences
 
-  VRecordingBounds Bounds;    ///< of all valid points
+  VRecordingBounds Bounds;    ///< of all valid points, or of all joints
   std::uint64_t GapCount = 0; ///< missing samples in `Points`
 
   std::size_t PointCount() const { return Labels.size(); }

@@ -18,8 +18,9 @@ namespace HostSources
 /// prefix "Subject:" (the file's stem where there is none); `SubjectId` is the subject's `Id`, from 1, and `MarkerId`
 /// the index into its `Markers`. Beside them stand the up axis, the volume's floor, each force plate with the samples
 /// of the frame, and each camera with its hardware, calibration, centroids, their labels and their assignments (index
-/// into the frame's reconstructions), and the frame of its video where it has one. Coordinates stay as they are when y
-/// is up: the view is told by the up axis.
+/// into the frame's reconstructions), and the frame of its video where it has one. A skeleton is one `FlowSubject`
+/// more, with its structure and poses as `FlowSubjectParametrised` and each frame's as `FlowSubjectDynamicParameters`.
+/// Coordinates stay as they are when y is up: the view is told by the up axis.
 class VRecordingSource final : public IFrameSource
 {
 public:

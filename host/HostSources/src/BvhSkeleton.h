@@ -1,0 +1,45 @@
+#pragma once
+
+// A skeleton as a BVH file has it, and as a subject.
+
+#include <HostSources/VRecordingSkeleton.h>
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace HostSources::Bvh
+{
+
+using VVector = std::array< double, 3 >;
+
+/// What a number of a row says; the order of its axes within both.
+enum class EChannel : std::uint8_t
+{
+  Xposition,
+  Yposition,
+  Zposition,
+  Xrotation,
+  Yrotation,
+  Zrotation
+};
+
+struct VJoint
+{
+  std::string Name;
+  std::int32_t Parent = -1;
+  VVector Offset{}; ///< mm
+  std::vector< EChannel > Channels;
+  std::optional< VVector > End; ///< mm; where the bone ends that has no joint below
+};
+
+/// Segments in the order of the joints: Free with a position, Ball with a rotation alone, Dummy without a channel. Each
+/// is turned so that its x axis points to the first joint below or to the end site.
+CoreMoxelTypes::VSubject SubjectOf( const std::vector< VJoint >& i_rJoints );
+
+/// Appends the joint state of a row, which has one number a channel, degrees and mm.
+void AppendState( const std::vector< VJoint >& i_rJoints, const double* i_pRow, std::vector< double >& io_rStates );
+
+} // namespace HostSources::Bvh
