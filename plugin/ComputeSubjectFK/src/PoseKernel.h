@@ -7,9 +7,6 @@ namespace ComputeSubject
 
 using VLanes = double __attribute__( ( vector_size( PoseLanes * sizeof( double ) ) ) );
 using VFlags = long long __attribute__( ( vector_size( PoseLanes * sizeof( double ) ) ) );
-using VLanesAnywhere = double __attribute__( ( vector_size( PoseLanes * sizeof( double ) ), aligned( 8 ), may_alias ) );
-using VPairAnywhere = double __attribute__( ( vector_size( 16 ), aligned( 8 ), may_alias ) );
-
 /// The loops of a pose. `TProcessor` is a type of the including source alone, so that its instance stays there too.
 ///
 /// First each joint's fixed transform times its moving part, four joints of a kind at a time. Turns are taken by half
@@ -24,8 +21,14 @@ struct VPoseKernel
     VLanes E[12];
   };
 
-  static VLanes Load( const double* i_pFrom ) { return *reinterpret_cast< const VLanesAnywhere* >( i_pFrom ); }
-  static void Store( double* o_pTo, VLanes i_Value ) { *reinterpret_cast< VLanesAnywhere* >( o_pTo ) = i_Value; }
+  // From and to any place: neither states nor results need to stand where vectors would.
+  static VLanes Load( const double* i_pFrom )
+  {
+    VLanes Value;
+    __builtin_memcpy( &Value, i_pFrom, sizeof Value );
+    return Value;
+  }
+  static void Store( double* o_pTo, VLanes i_Value ) { __builtin_memcpy( o_pTo, &i_Value, sizeof i_Value ); }
   static VLanes Splat( double i_Value ) { return VLanes{ i_Value, i_Value, i_Value, i_Value }; }
   static VLanes Number( const VPoseBlock& i_rBlock, const double* i_pState, int i_Which )
   {
@@ -229,7 +232,8 @@ struct VPoseKernel
       Store( pResult, A );
       Store( pResult + 3, B );
       Store( pResult + 6, C );
-      *reinterpret_cast< VPairAnywhere* >( pResult + 9 ) = VPairAnywhere{ A[3], B[3] };
+      pResult[9] = A[3];
+      pResult[10] = B[3];
       pResult[11] = C[3];
     }
   }
