@@ -1,5 +1,6 @@
 #include "RenderCamerasTest.h"
 
+#include <TestSupport/Allocations.h>
 #include <TestSupport/Golden.h>
 
 using namespace FlowTest;
@@ -149,4 +150,67 @@ TEST_F( VRenderCameras, WhoeverNeedsACameraFindsItByItsItemAndItsNumberStandsWhe
   EXPECT_TRUE( pScene->GetSelectionPositions( { Device( 1 ) } ).empty() );
   pScene->Show( Maker.State( 3, { Items.begin() + 3, Items.end() } ) );
   EXPECT_EQ( pScene->SelectionItemsToIds( { Device( 1 ) } ), std::vector{ pScene->Cameras()->FirstId() } );
+}
+
+TEST_F( VRenderCameras, TenThousandAreShownAndPickedAsOne )
+{
+  AddRing( 10000 );
+  Options().CameraRays = Options().CameraAxes = true;
+  Show();
+  const QImage All = Draw();
+  const std::uint64_t Calls = Figures().DrawCalls;
+  pScene->Select( { Device( 9999 ) } );
+  EXPECT_NE( Draw(), All );
+  EXPECT_EQ( Pick( Seen( 9999 ) ).size(), 1u );
+  pScene->Select( {} );
+  Items.resize( 3 );
+  Show();
+  Draw();
+  EXPECT_EQ( Figures().DrawCalls, Calls );
+}
+
+TEST_F( VRenderCameras, FramesAllocateNothing )
+{
+  AddRing( 100 );
+  VCameraMaskGrid Mask{ 2, 2, 640, 512, { 0xFF, 0, 0, 0xFF } };
+  VEdgePairSet Edges;
+  Edges.Pairs = { { 500, 600, 700, 10, 200 } };
+  Items.push_back( Maker.Device< FlowCameraMaskGrid >( Mask, Name( 1 ) ) );
+  Items.push_back( Maker.Device< FlowEdgePairSet >( Edges, Name( 1 ) ) );
+  pScene->Select( { Device( 1 ), { ZEK::ESelectMaskCell, Name( 1 ), 0, 2 } } );
+  Show();
+  Draw();
+  CoreGraphics::VRenderContext& rContext = *View.Frame().Context();
+  MoxelGraphics::VSceneOptions Tile = Options();
+  Tile.CameraView = Tile.CameraBorder = Tile.CameraWandSmear = true;
+  Tile.OverlayCamera = QString::fromStdString( Name( 1 ) );
+  MoxelGraphics::VRenderCameras& rCameras = *pScene->Cameras();
+  const auto DrawAll = [&]
+  {
+    pScene->Registry().Reset();
+    pScene->CameraProvider()->Update( *pScene->State );
+    pScene->Cameras()->Update( *pScene->State );
+    rContext.ResetState();
+    for ( const int Mode : { 0, 1, 2 } )
+    {
+      rContext.SetRenderMode( Mode );
+      for ( const std::uint32_t Pass : { 0u, 1u, 2u } )
+      {
+        rCameras.Render( rContext, Options(), Pass );
+        rCameras.Render( rContext, Tile, Pass );
+      }
+      rCameras.RenderTiles( rContext, Tile );
+    }
+  };
+  DrawAll();
+  DrawAll();
+  rContext.ResetCounters();
+  const std::uint64_t Before = TestSupport::AllocationCount();
+  for ( int Times = 0; Times < 5; ++Times )
+  {
+    DrawAll();
+  }
+  EXPECT_EQ( TestSupport::AllocationCount(), Before );
+  EXPECT_EQ( rContext.BytesUploaded(), 0u );
+  EXPECT_GT( rContext.DrawCalls(), 5u * 9 );
 }
