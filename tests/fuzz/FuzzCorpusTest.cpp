@@ -10,6 +10,7 @@
 
 extern "C" int FuzzC3dOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzTrcOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
+extern "C" int FuzzBvhOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzCamerasOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzSettingsOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzSchemaOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
@@ -52,6 +53,11 @@ TEST( FuzzCorpus, C3d )
 TEST( FuzzCorpus, Trc )
 {
   EXPECT_GE( Replay( "trc", FuzzTrcOneInput ), 8u );
+}
+
+TEST( FuzzCorpus, Bvh )
+{
+  EXPECT_GE( Replay( "bvh", FuzzBvhOneInput ), 8u );
 }
 
 TEST( FuzzCorpus, Cameras )
