@@ -304,18 +304,24 @@ ZEK::IResult VReader::ReadMotionHeader()
     return Expected( "\"Frames:\"", Word );
   }
   ZEK::IResult Result = ReadNumberOf( "the count of frames", Frames );
-  if ( Result.IsOk() && !( Frames >= 0 && Frames < 1e15 ) )
+  if ( Result.IsError() )
+  {
+    return Result;
+  }
+  if ( !( Frames >= 0 && Frames < 1e15 ) )
   {
     return Expected( "a count of frames", "another number" );
   }
-  Word = Result.IsOk() ? m_Words.Next() : Word;
-  const std::string_view Second = Result.IsOk() ? m_Words.Next() : Word;
-  if ( Result.IsOk() && ( Word != "Frame" || Second != "Time:" ) )
-  {
-    return Expected( "\"Frame Time:\"", Word == "Frame" ? Second : Word );
-  }
-  Result = Result.IsOk() ? ReadNumberOf( "the time of a frame", Time ) : Result;
   m_Promised = static_cast< std::int64_t >( Frames );
+  for ( const std::string_view Part : { "Frame", "Time:" } )
+  {
+    Word = m_Words.Next();
+    if ( Word != Part )
+    {
+      return Expected( "\"Frame Time:\"", Word );
+    }
+  }
+  Result = ReadNumberOf( "the time of a frame", Time );
   // Times such as 0.008333 stand for whole rates.
   const double Rate = Time > 0 ? 1 / Time : 0, Whole = std::round( Rate );
   m_rRecording.RateHz = Whole > 0 && std::abs( Rate - Whole ) < 1e-4 * Whole ? Whole : Rate;

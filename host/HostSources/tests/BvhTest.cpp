@@ -201,6 +201,7 @@ TEST( Bvh, DamagedFilesGiveTheirWholeRowsOrAReason )
       { With( "  End Site", "  CHANNELS 1 Xrotation" ), InvalidFormat, "once a joint" },
       { With( "\n}\nMOTION", "\nMOTION" ), InvalidFormat, "found \"MOTION\"" },
       { With( "Frames: 3", "Frames: many" ), InvalidFormat, "the count of frames" },
+      { With( "Frames: 3", "Frames: 1e999" ), InvalidFormat, "the count of frames" },
       { With( "Frames: 3", "Frames: -3" ), InvalidFormat, "a count of frames" },
       { With( "Frame Time:", "Frame Rate:" ), InvalidFormat, "\"Frame Time:\", found \"Rate:\"" },
       { With( "90 90 0 0 90", "90 90 zero 0 90" ), InvalidFormat, "a number for a channel, found \"zero\"" },
