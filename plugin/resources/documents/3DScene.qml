@@ -45,7 +45,7 @@ Item {
     }
 
     SceneContributions {
-        anchors.left: parent.left
+        anchors.right: parent.right
         anchors.bottom: parent.bottom
         anchors.margins: 16
         contributions: contextFlowScene ? contextFlowScene.contributions : null

@@ -40,7 +40,9 @@ Rectangle {
     border.color: open ? "#E76500" : "#40FFFFFF"
     clip: true
 
-    onOpenChanged: showRays(open)
+    // Without a selection that type would show the rays of everything.
+    onOpenChanged: showRays(open && known)
+    onKnownChanged: showRays(open && known)
     onContributionsChanged: if (contributions) contributions.watch()
     Component.onDestruction: {
         showRays(false)
