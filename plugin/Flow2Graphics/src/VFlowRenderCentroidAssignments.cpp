@@ -36,11 +36,17 @@ void VFlowRenderCentroidAssignments::Update( const ZEK::IFlowState& i_rState )
   const bool bCameras = TakeCameras();
   const std::uint64_t Generation = m_rScene.Registry().MarksGeneration();
   const bool bMarks = std::exchange( m_MarksGeneration, Generation ) != Generation;
-  if ( bCameras || bMarks )
+  m_bCamerasStale = m_bCamerasStale || bCameras || bMarks;
+  m_bReconstructionsStale = m_bReconstructionsStale || m_bCamerasStale || bSet || bLabels;
+}
+
+void VFlowRenderCentroidAssignments::FillRecords()
+{
+  if ( std::exchange( m_bCamerasStale, false ) )
   {
     FillCameras();
   }
-  if ( bCameras || bMarks || bSet || bLabels )
+  if ( std::exchange( m_bReconstructionsStale, false ) )
   {
     FillReconstructions();
   }

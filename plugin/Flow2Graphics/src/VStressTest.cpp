@@ -21,6 +21,18 @@ constexpr int IntervalMs = 8;
 constexpr std::uint32_t MostBlobs = 10, MostBlobSide = 128, MostCentroids = 128;
 constexpr float LeastCentroidValue = 0.01f, MostCentroidValue = 64;
 
+/// Room for the most that may come, written to at once: what only some later tick would touch the system gives only
+/// then, and the test, which looks for what grows, would seem to grow itself.
+template < typename T >
+void TakeRoom( std::vector< T >& io_rVector, std::size_t i_Most )
+{
+  if ( io_rVector.capacity() < i_Most )
+  {
+    io_rVector.resize( i_Most );
+    io_rVector.clear();
+  }
+}
+
 ZEK::VLogCategory& Category()
 {
   static ZEK::VLogCategory& rCategory = ZEK::GlobalLog().Category( "StressTest" );
@@ -168,10 +180,9 @@ std::uint32_t VStressTest::Draw( std::uint32_t i_Most )
 void VStressTest::FillBlobs( ZEK::IFlowItem& io_rItem )
 {
   VGreyscaleBlobSet& rSet = TestPayload< FlowGreyscaleBlobSet >( io_rItem );
-  // Room for the largest of all, so that no later tick needs more; memory is taken only as it is written to.
-  rSet.Blobs.reserve( MostBlobs );
-  rSet.Lines.reserve( MostBlobs * MostBlobSide );
-  rSet.Pixels.reserve( MostBlobs * MostBlobSide * MostBlobSide );
+  TakeRoom( rSet.Blobs, MostBlobs );
+  TakeRoom( rSet.Lines, MostBlobs * MostBlobSide );
+  TakeRoom( rSet.Pixels, MostBlobs * MostBlobSide * MostBlobSide );
   std::size_t PixelCount = 0;
   for ( std::uint32_t Blob = Draw( MostBlobs ); Blob > 0; --Blob )
   {
@@ -202,7 +213,7 @@ void VStressTest::FillCentroids( ZEK::IFlowItem& io_rItem )
            ( MostCentroidValue - LeastCentroidValue ) * static_cast< float >( Draw( Steps ) ) / Steps;
   };
   VCentroidSet& rSet = TestPayload< FlowCentroidSet >( io_rItem );
-  rSet.Centroids.reserve( MostCentroids );
+  TakeRoom( rSet.Centroids, MostCentroids );
   const std::uint32_t Count = Draw( MostCentroids );
   for ( std::uint32_t Id = 0; Id < Count; ++Id )
   {

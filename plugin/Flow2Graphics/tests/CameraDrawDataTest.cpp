@@ -255,6 +255,8 @@ TEST_F( CameraDrawData, AssignmentsRunFromCalibratedCamerasToTheReconstructionsO
                                      Maker.Points( 3 ),
                                      Maker.Item< FlowReconstructionLabelSet >( Labels ) };
   Show( Items );
+  EXPECT_EQ( Lines( MoxelGraphics::ENone ), 0u );
+  EXPECT_TRUE( Feed.Cameras().empty() ) << "nobody looks at them";
   EXPECT_EQ( Lines( MoxelGraphics::EUnion ), 3u ) << "the other camera is not calibrated";
   const auto Line = Feed.Lines( MoxelGraphics::EUnion );
   EXPECT_FLOAT_EQ( Line[0], 3000 );

@@ -219,6 +219,62 @@ TEST( StressTest, TicksWithNewItemsInThePlacesOfOldOnesAndAllocatesNothing )
   EXPECT_TRUE( Drawn.Least >= 0.01f && Drawn.Least < 0.02f && Drawn.Most <= 64 && Drawn.Most > 63.99f );
 }
 
+TEST( StressTest, ThousandsOfTicksLeaveNothingBehind )
+{
+  HostFlow::TrimPools();
+  const std::size_t Others = HostFlow::CountPools().Items;
+  HostServices::VHost Host( { .bDeveloperMode = true } );
+  VStressTest StressTest( Host.CacheManager(), Host.StateFactory(), Host.ItemStore() );
+  ASSERT_TRUE( StressTest.Start().IsOk() );
+  const auto pCache = Host.CacheManager()->FindCache( VStressTest::CacheName );
+  ASSERT_TRUE( pCache );
+  FlowTest::VScene Scene;
+  VCameras Cameras;
+  const auto Run = [&]( int i_Ticks )
+  {
+    for ( int Tick = 0; Tick < i_Ticks; ++Tick )
+    {
+      ASSERT_TRUE( StressTest.Tick().IsOk() );
+      if ( Tick % 8 == 0 ) // a view that does not keep up
+      {
+        Scene.Show( Latest( *pCache ) );
+        Cameras.Of( *Scene.State );
+      }
+    }
+  };
+  /// All room that the kept frames' payloads have, used or not.
+  const auto Bytes = [&]
+  {
+    std::vector< ZEK::VFlowStateRef > Kept;
+    pCache->FetchMany( { { 0, 1, 1 }, { INT64_MAX, 1, 1 } }, Kept, 0 );
+    std::size_t Sum = 0;
+    for ( const ZEK::VFlowStateRef& rState : Kept )
+    {
+      const auto& rJoin = Cameras.Of( *rState );
+      for ( std::size_t Camera = 0; Camera < 128; ++Camera )
+      {
+        const VGreyscaleBlobSet& rBlobs = *rJoin.Values< FlowGreyscaleBlobSet >()[Camera];
+        Sum += rBlobs.Blobs.capacity() * sizeof( VGreyscaleBlob ) + rBlobs.Lines.capacity() * sizeof( VGreyscaleLine ) +
+               rBlobs.Pixels.capacity() +
+               rJoin.Values< FlowCentroidSet >()[Camera]->Centroids.capacity() * sizeof( VCentroid );
+      }
+    }
+    return Sum / Kept.size();
+  };
+  Run( 40 );
+  const HostFlow::VPoolFigures Before = HostFlow::CountPools();
+  const std::size_t BytesBefore = Bytes();
+  const std::uint64_t Allocated = TestSupport::AllocationCount();
+  Run( 3000 );
+  EXPECT_EQ( TestSupport::AllocationCount(), Allocated );
+  const HostFlow::VPoolFigures After = HostFlow::CountPools();
+  EXPECT_EQ( std::tuple( After.Items, After.States, After.Names ),
+             std::tuple( Before.Items, Before.States, Before.Names ) );
+  EXPECT_EQ( Bytes(), BytesBefore );
+  // Four frames in the ring, two that a view and its join hold, one being made; two new items a camera in each.
+  EXPECT_LE( After.Items - Others, 128u * ( 6 + 7 * 2 ) );
+}
+
 TEST( StressTest, GoesOnFromWhatItsCacheHoldsAndClonesAStateThatSomebodyHolds )
 {
   const auto pManager = HostFlow::MakeCacheManager();

@@ -73,9 +73,14 @@ void VRenderCentroidAssignments::SetReconstructions( std::span< const VAssignedR
 
 std::span< const float > VRenderCentroidAssignments::Lines( int i_ContributionsType )
 {
-  if ( i_ContributionsType == ENone || m_LinesType == i_ContributionsType )
+  if ( i_ContributionsType == ENone )
   {
-    return m_LinesType == ENone ? std::span< const float >() : m_Lines;
+    return {};
+  }
+  FillRecords();
+  if ( m_LinesType == i_ContributionsType )
+  {
+    return m_Lines;
   }
   const auto IsSelected = []( const auto& i_rRecord )
   {

@@ -12,7 +12,8 @@ namespace Flow2Graphics
 {
 
 /// Feeds the centroids of calibrated cameras that were assigned to reconstructions of the frame. A labelled
-/// reconstruction counts as selected when its marker is. Updated after the provider.
+/// reconstruction counts as selected when its marker is. Updated after the provider. While the lines are off an update
+/// only holds what came.
 class VFlowRenderCentroidAssignments : public MoxelGraphics::VRenderCentroidAssignments, public IFlowRenderType
 {
 public:
@@ -20,6 +21,9 @@ public:
                                   std::shared_ptr< const VFlowRenderCameraProvider > i_pProvider );
 
   void Update( const ZEK::IFlowState& i_rState ) override;
+
+protected:
+  void FillRecords() override;
 
 private:
   struct VTaken
@@ -38,6 +42,8 @@ private:
   std::vector< VTaken > m_Taken; ///< by camera
   std::vector< MoxelGraphics::VAssignedReconstruction > m_Reconstructions;
   std::uint64_t m_MarksGeneration = 0;
+  bool m_bCamerasStale = false; ///< what is held differs from the records
+  bool m_bReconstructionsStale = false;
 };
 
 } // namespace Flow2Graphics

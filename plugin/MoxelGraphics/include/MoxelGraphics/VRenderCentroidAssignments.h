@@ -53,6 +53,10 @@ public:
   /// The ends of the lines that a mode shows, two a line, x y z.
   std::span< const float > Lines( int i_ContributionsType );
 
+protected:
+  /// Called before lines are made or drawn, and not while there are none to show: the place to fill what has changed.
+  virtual void FillRecords() {}
+
 private:
   struct VGl;
   std::unique_ptr< VGl > m_pGl;
