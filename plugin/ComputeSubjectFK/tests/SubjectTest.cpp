@@ -211,6 +211,33 @@ TEST( SubjectFK, NumbersThatAreNoneStayOnTheirBranch )
   }
 }
 
+/// And a place that is none leaves rotations alone.
+TEST( SubjectFK, PlacesThatAreNoneStillTurn )
+{
+  VRandom Random( 9 );
+  VRandomTree Tree( Random, 30, true );
+  for ( std::size_t Broken = 0; Broken < 30; ++Broken )
+  {
+    const EJointType Type = Tree.Joints[Broken].m_Type;
+    if ( Type != EJointType::Free && Type != EJointType::Slider )
+    {
+      continue;
+    }
+    std::vector< double > State = Tree.RandomState( Random, 2 );
+    ASSERT_EQ( Tree.Subject.LoadState( State ), Ok );
+    std::vector< VRigidTransform > Whole( Tree.Subject.WorldTransforms().begin(),
+                                          Tree.Subject.WorldTransforms().end() );
+    State[Tree.Subject.FirstDegree( Broken ) + ( Type == EJointType::Free ? 5 : 0 )] = NAN;
+    EXPECT_EQ( Tree.Subject.LoadState( State ), ZEK::IResult( ZEK::IResult::OkButPartial ) );
+    for ( std::size_t Index = 0; Index < Whole.size(); ++Index )
+    {
+      EXPECT_TRUE( std::equal( Whole[Index].m_Rotation, Whole[Index].m_Rotation + 9,
+                               Tree.Subject.WorldTransforms()[Index].m_Rotation ) )
+          << Index << " under " << Broken;
+    }
+  }
+}
+
 TEST( SubjectFK, AClonePosesOnItsOwn )
 {
   VRandom Random( 7 );
