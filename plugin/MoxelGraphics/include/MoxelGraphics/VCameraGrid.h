@@ -144,7 +144,6 @@ private:
   void Rebuild();
   void TakeInPlace( VCameraTiles i_Tiles );
   void TakeAnew( VCameraTiles i_Tiles );
-  void DropLeft();
   void ReadAdditionalData( bool i_bReport );
   void LayOut();
   void Report( const QList< int >& i_rRoles );
