@@ -14,7 +14,7 @@ using namespace CoreGraphics;
 
 constexpr float Radius = 40.0F;  // mm, of the program's cylinder
 constexpr float Length = 100.0F; // mm
-constexpr std::uint32_t Sides = 16;
+constexpr std::uint32_t Sides = 12;
 
 struct VBodyVertex
 {
@@ -67,18 +67,6 @@ struct VBodyMaker
               { A * i_ToScale, i_ToZ } } );
     }
   }
-  /// A ridge of triangular section along x on a face of constant y. Its front leans back: what faces straight ahead out
-  /// here would be taken for a strobe.
-  void Rib( float i_HalfWidth, float i_Y, float i_Z )
-  {
-    constexpr float Height = 4, Depth = 10;
-    const QVector3D Left( -i_HalfWidth, i_Y, i_Z ), Right( i_HalfWidth, i_Y, i_Z );
-    const QVector3D Front( 0, 0, Depth ), Top( 0, -Height, Depth / 4 );
-    Face( { Right + Top, Left + Top, Left, Right } );
-    Face( { Left + Front, Left + Top, Right + Top, Right + Front } );
-    Face( { Right, Right + Front, Right + Top } );
-    Face( { Left, Left + Top, Left + Front } );
-  }
   /// The surface that a line from (radius, z) to another sweeps about z; rising lines face outwards.
   void Sweep( QVector2D i_From, QVector2D i_To )
   {
@@ -127,11 +115,6 @@ VMesh MakeCameraMesh()
                 { Housing[1] * BackScale, Back } } );
   Maker.Wall( Housing, BackScale, Back, 1, Bevel );
   Maker.Wall( Housing, 1, Bevel, 1, Ring );
-  // Ribs across its upper side tell which way is up.
-  for ( const float Z : { -88.0F, -76.0F, -64.0F } )
-  {
-    Maker.Rib( Cut, -Half, Z );
-  }
   // The collar that carries the strobes, with a rim about them.
   Maker.Sweep( { Half - 4, Neck }, { Radius, Ring } );
   Maker.Sweep( { Radius, Ring }, { Radius, -3 } );

@@ -8,7 +8,7 @@ namespace MoxelGraphics
 {
 
 /// The body of a camera for the program `Camera`, which makes of the unit cylinder about z a body of 40 mm radius and
-/// 100 mm length that ends at the lens: a housing with bevelled edges and ribs, a ring of strobes, a sunk lens.
+/// 100 mm length that ends at the lens: a housing with bevelled edges, a ring of strobes, a sunk lens.
 CoreGraphics::VMesh MakeCameraMesh();
 
 /// Lines that stand for one object each, to be drawn many times; two vertices a line.
@@ -19,8 +19,8 @@ struct VLineVertex
 };
 const CoreGraphics::VVertexLayout& LineLayout();
 
-/// Of the frustum whose tip is the origin and whose far face is z = 1, x and y from -1 to 1: its edges, the far face
-/// drawn as a pane of two triangles among the four of its sides, and the marks of its upper edge.
+/// Of the frustum whose tip is the origin and whose far face is z = 1, x and y from -1 to 1: its edges, and its faces
+/// as triangles.
 std::vector< VLineVertex > FrustumLines( std::uint32_t i_Colour );
 std::vector< VLineVertex > FrustumFaces();
 /// Three axes, red, green and blue, of that length.

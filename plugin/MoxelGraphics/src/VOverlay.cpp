@@ -92,9 +92,23 @@ QPointF VOverlay::ToItem( const QVector4D& i_rClip ) const
            ( 1 - i_rClip.y() / i_rClip.w() ) / 2 * m_Size.height() };
 }
 
+/// Whether anything that the cameras' records are made of is another than it was.
+bool VOverlay::CamerasMoved( const VMoxelScene& i_rScene )
+{
+  const VSeen New{ &i_rScene, i_rScene.CameraGeneration(), m_SelectionGeneration, m_ToClip, m_Size };
+  const bool bMoved = !( m_Seen == New );
+  m_Seen = New;
+  return bMoved;
+}
+
 bool VOverlay::CollectCameras( VMoxelScene& io_rScene )
 {
-  m_NewCameras.clear();
+  if ( !CamerasMoved( io_rScene ) )
+  {
+    return false;
+  }
+  // Records are written over: names keep their memory.
+  std::size_t Count = 0;
   bool bHeld = false;
   for ( const VCameraDefinition& rDefinition : io_rScene.CameraDefinitions() )
   {
@@ -106,12 +120,19 @@ bool VOverlay::CollectCameras( VMoxelScene& io_rScene )
     {
       const QPointF Place = ToItem( Clip );
       const auto Depth = static_cast< float >( ( Clip.z() / Clip.w() + 1 ) / 2 );
-      m_NewCameras.push_back(
-          { rDefinition.DeviceURN, rDefinition.UserId,
-            QVector3D( static_cast< float >( Place.x() ), static_cast< float >( Place.y() ), Depth ), bSelected,
-            bPreselected } );
+      if ( Count == m_NewCameras.size() )
+      {
+        m_NewCameras.emplace_back();
+      }
+      VOverlayCamera& rCamera = m_NewCameras[Count++];
+      rCamera.DeviceURN = rDefinition.DeviceURN;
+      rCamera.UserId = rDefinition.UserId;
+      rCamera.Position = { static_cast< float >( Place.x() ), static_cast< float >( Place.y() ), Depth };
+      rCamera.bSelected = bSelected;
+      rCamera.bPreselected = bPreselected;
     }
   }
+  m_NewCameras.resize( Count );
   const bool bHeldChanged = Write( m_bCameraHeld, bHeld );
   const bool bChanged = m_NewCameras != m_Cameras;
   m_Cameras.swap( m_NewCameras );
@@ -154,14 +175,19 @@ bool UpdateCameraObjects( QList< QObject* >& io_rObjects, const std::vector< VOv
                           QObject& io_rParent )
 {
   QList< QObject* > Objects;
+  Objects.reserve( static_cast< qsizetype >( i_rCameras.size() ) );
   for ( const VOverlayCamera& rCamera : i_rCameras )
   {
     const QString URN = QString::fromStdString( rCamera.DeviceURN );
-    const auto Found = std::find_if( io_rObjects.begin(), io_rObjects.end(),
-                                     [&]( const QObject* i_pObject )
-                                     {
-                                       return static_cast< const VCameraObject* >( i_pObject )->DeviceURN() == URN;
-                                     } );
+    const auto Is = [&]( const QObject* i_pObject )
+    {
+      return static_cast< const VCameraObject* >( i_pObject )->DeviceURN() == URN;
+    };
+    // Nearly always it stands where it stood: great numbers are not searched one for the other.
+    const qsizetype Place = Objects.size();
+    const auto Found = Place < io_rObjects.size() && Is( io_rObjects[Place] )
+                           ? io_rObjects.begin() + Place
+                           : std::find_if( io_rObjects.begin(), io_rObjects.end(), Is );
     auto* const pObject =
         Found == io_rObjects.end() ? new VCameraObject( URN, &io_rParent ) : static_cast< VCameraObject* >( *Found );
     Objects.append( pObject );

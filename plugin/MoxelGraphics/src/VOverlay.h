@@ -59,6 +59,18 @@ public:
   bool IsCameraHeld() const { return m_bCameraHeld; }
 
 private:
+  /// All that places of cameras depend on.
+  struct VSeen
+  {
+    const void* pScene = nullptr;
+    std::uint64_t Cameras = 0, Selection = 0;
+    QMatrix4x4 ToClip;
+    QSizeF Size;
+
+    friend bool operator==( const VSeen&, const VSeen& ) = default;
+  };
+
+  bool CamerasMoved( const VMoxelScene& i_rScene );
   void CollectSelection( const VMoxelScene& i_rScene );
   bool CollectCameras( VMoxelScene& io_rScene );
   bool CollectSubjects( VMoxelScene& io_rScene );
@@ -73,6 +85,7 @@ private:
   ZEK::VSelection m_Preselected;
   std::uint64_t m_SelectionGeneration = 0;
   bool m_bCameraHeld = false;
+  VSeen m_Seen;
   QMatrix4x4 m_View;
   QMatrix4x4 m_ToClip;
   QSizeF m_Size;
