@@ -27,7 +27,8 @@ Greyscale2D: Greyscale2D Greyscale2DSelection; GreyscaleMaximised: Greyscale2D G
 Greyscale3D: Colour; WandWave2D: WandWave2D; Centroid2D: Centroid2D Centroid2DSelection Colour;
 Centroid3D: Colour; Frame: UniformColour; Centroid3DTiles: Colour; Centroid2DTiles: Colour Greyscale2DSelection;
 Centroid2DTileQuads: Centroid2DTileQuads Centroid2DTileQuadsSelection;
-Greyscale2DTiles: Greyscale2DTiles Greyscale2DTilesSelection;
+Greyscale2DTiles: Greyscale2DTiles Greyscale2DTilesSelection; MaskSquareTiles: MaskTiles MaskTilesSelection;
+Edge2DTiles: MaskTiles; WandWave2DTiles: WandWave2DTiles;
 Video: VideoBayer VideoLuminance VideoYUV VideoYUVPlanar VideoImage;
 Stick: Colour SimpleLighting; StickShadow: Colour; Target: SimpleLighting Colour; Segment: Segment;
 NonUniformSphere: Covariance; MissingMarker: MissingMarker; FBXSkin: FBXMaterial XRay;
