@@ -265,7 +265,7 @@ TEST( StressTest, ThousandsOfTicksLeaveNothingBehind )
   const HostFlow::VPoolFigures Before = HostFlow::CountPools();
   const std::size_t BytesBefore = Bytes();
   const std::uint64_t Allocated = TestSupport::AllocationCount();
-  Run( 3000 );
+  Run( 2000 );
   EXPECT_EQ( TestSupport::AllocationCount(), Allocated );
   const HostFlow::VPoolFigures After = HostFlow::CountPools();
   EXPECT_EQ( std::tuple( After.Items, After.States, After.Names ),
