@@ -106,9 +106,10 @@ protected:
   static QList< QQuickItem* > Tiles( VSceneWindowContent& i_rContent )
   {
     QList< QQuickItem* > Found;
-    for ( QQuickItem* const pItem : i_rContent.SceneWidget().rootObject()->childItems() )
+    for ( QQuickItem* const pItem :
+          i_rContent.SceneWidget().rootObject()->findChild< QQuickItem* >( "tiles" )->childItems() )
     {
-      if ( pItem->objectName() == "cameraTile" )
+      if ( pItem->property( "tileDeviceURN" ).isValid() )
       {
         Found << pItem;
       }

@@ -4,7 +4,8 @@ import Flow2Graphics 1.0
 Item {
     id: root
 
-    property CameraTile hoveredTile: null
+    // Looked up, for a handler in every tile would keep the pointer from the view below.
+    readonly property Item hoveredTile: pointer.hovered ? tiles.childAt(sceneFBO.mousePos.x, sceneFBO.mousePos.y) : null
 
     // What lies under the pointer, and of a small tile what it has no room for.
     function tip() {
@@ -22,6 +23,10 @@ Item {
         scene: contextFlowScene
         cameraGrid: contextCameraGrid
 
+        HoverHandler {
+            id: pointer
+        }
+
         Component.onCompleted: {
             const window = contextThemeWindow
             setOption("CameraView", true)
@@ -31,21 +36,18 @@ Item {
         }
     }
 
-    Repeater {
-        model: contextCameraGrid
+    Item {
+        id: tiles
 
-        CameraTile {
-            objectName: "cameraTile"
-            loaderCompact: contextCameraGrid.count > 6
-            onHoveredChanged: {
-                if (hovered)
-                    root.hoveredTile = this
-                else if (root.hoveredTile === this)
-                    root.hoveredTile = null
-            }
-            Component.onDestruction: {
-                if (root.hoveredTile === this)
-                    root.hoveredTile = null
+        objectName: "tiles"
+        anchors.fill: parent
+
+        Repeater {
+            model: contextCameraGrid
+
+            CameraTile {
+                loaderCompact: contextCameraGrid.count > 6
+                hovered: root.hoveredTile === this
             }
         }
     }

@@ -15,10 +15,10 @@ Item {
     required property var tileSelectionItem
     required property var tileAdditionalData
     property bool loaderCompact: false
+    property bool hovered: false
     property color accent: "#E76500"
 
     readonly property bool selected: tileSelectionItem !== undefined && tileSelectionItem !== null
-    readonly property bool hovered: hover.hovered
     readonly property var knowledge: tileAdditionalData || ({})
     readonly property string number: tileUserId === "" || tileUserId === "-1" || tileUserId === "4294967295"
                                      ? "–" : tileUserId
@@ -42,10 +42,6 @@ Item {
     width: tileRect.width
     height: tileRect.height
     clip: true
-
-    HoverHandler {
-        id: hover
-    }
 
     Rectangle {
         anchors.fill: parent
@@ -113,7 +109,7 @@ Item {
         anchors.right: parent.right
         anchors.rightMargin: root.margin
         anchors.verticalCenter: title.verticalCenter
-        visible: title.visible && root.mark !== ""
+        visible: title.visible && root.mark !== "" && root.width >= 120
                  && title.x + title.implicitWidth + 8 + width + root.margin <= root.width
         width: pillText.implicitWidth + 10
         height: 15
