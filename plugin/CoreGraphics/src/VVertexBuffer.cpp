@@ -16,6 +16,8 @@ std::atomic< std::uint64_t > s_Uploaded{ 0 };
 // A ring holds several writes, so that its storage is exchanged once in a few frames only.
 constexpr std::size_t WritesPerRing = 4;
 constexpr std::size_t SmallestRing = 4096;
+// From this size on a write has the whole buffer: fresh memory for several such writes costs more than what it saves.
+constexpr std::size_t LargeWrite = 1u << 18;
 // Parts begin where any attribute type is aligned, and where mapping is cheap.
 constexpr std::size_t PartAlignment = 64;
 
@@ -85,6 +87,16 @@ bool VDynamicBuffer::Reserve( std::size_t i_Bytes )
     return false;
   }
   const std::size_t Wanted = RoundUp( i_Bytes );
+  if ( Wanted >= LargeWrite )
+  {
+    if ( Wanted > m_Capacity )
+    {
+      m_Capacity = Wanted + Wanted / 4;
+      m_Buffer.allocate( int( m_Capacity ) );
+    }
+    m_Head = 0;
+    return true;
+  }
   if ( m_Capacity != 0 && m_Head + Wanted <= m_Capacity )
   {
     return true;
@@ -111,9 +123,13 @@ void* VDynamicBuffer::Map( std::size_t i_Bytes )
   {
     return nullptr;
   }
-  void* pMemory = m_Buffer.mapRange( int( m_Head ), int( i_Bytes ),
-                                     QOpenGLBuffer::RangeWrite | QOpenGLBuffer::RangeInvalidate |
-                                         QOpenGLBuffer::RangeUnsynchronized );
+  // A pending draw keeps what it reads: the driver gives the buffer other memory where there is one.
+  const bool bLarge = RoundUp( i_Bytes ) >= LargeWrite;
+  void* pMemory =
+      m_Buffer.mapRange( int( m_Head ), int( i_Bytes ),
+                         bLarge ? QOpenGLBuffer::RangeWrite | QOpenGLBuffer::RangeInvalidateBuffer
+                                : QOpenGLBuffer::RangeWrite | QOpenGLBuffer::RangeInvalidate |
+                                      QOpenGLBuffer::RangeUnsynchronized );
   if ( !pMemory )
   {
     m_Capacity = 0; // the storage itself may be missing: ask for it anew next time
@@ -122,7 +138,7 @@ void* VDynamicBuffer::Map( std::size_t i_Bytes )
   m_bMapped = true;
   m_Offset = m_Head;
   m_Size = i_Bytes;
-  m_Head += RoundUp( i_Bytes );
+  m_Head = bLarge ? m_Capacity : m_Head + RoundUp( i_Bytes );
   return pMemory;
 }
 

@@ -51,10 +51,17 @@ struct VCorrection
   }
 };
 
-/// Calls back with each line of the set's blobs whose pixels are there, and its blob; with no more lines than the set
-/// has, so that blobs which share lines are no burden.
+/// Whether a line's pixels are there, and its columns are numbers that a span can hold.
+bool IsThere( const VGreyscaleBlobSet& i_rSet, const VGreyscaleLine& i_rLine )
+{
+  return std::uint64_t{ i_rLine.First } + i_rLine.length <= i_rSet.Pixels.size() && i_rLine.length > 0 &&
+         i_rLine.x + i_rLine.length <= 0x10000;
+}
+
+/// Calls back with each blob that has lines; with no more lines than the set has, so that blobs which share lines are
+/// no burden.
 template < typename TTake >
-void ForEachLine( const VGreyscaleBlobSet& i_rSet, TTake&& i_rTake )
+void ForEachBlob( const VGreyscaleBlobSet& i_rSet, TTake&& i_rTake )
 {
   std::size_t Left = i_rSet.Lines.size();
   for ( std::size_t Blob = 0; Blob < i_rSet.Blobs.size(); ++Blob )
@@ -63,37 +70,103 @@ void ForEachLine( const VGreyscaleBlobSet& i_rSet, TTake&& i_rTake )
     const std::size_t First = std::min< std::size_t >( rBlob.FirstLine, i_rSet.Lines.size() );
     const std::size_t Count = std::min( { std::size_t{ rBlob.LineCount }, i_rSet.Lines.size() - First, Left } );
     Left -= Count;
-    for ( std::size_t Line = First; Line < First + Count; ++Line )
+    if ( Count > 0 )
     {
-      const VGreyscaleLine& rLine = i_rSet.Lines[Line];
-      const bool bThere = rLine.First <= i_rSet.Pixels.size() && rLine.length <= i_rSet.Pixels.size() - rLine.First;
-      if ( bThere && rLine.length > 0 && rLine.x + rLine.length <= 0x10000 )
-      {
-        i_rTake( static_cast< std::uint32_t >( Blob ), rLine );
-      }
+      i_rTake( static_cast< std::uint32_t >( Blob ), std::span( i_rSet.Lines ).subspan( First, Count ) );
     }
   }
 }
 
-void ListLines( const VGreyscaleBlobSet& i_rSet, std::uint32_t i_Camera, VGreyscaleData& o_rData )
+/// Calls back with each line of the set's blobs whose pixels are there.
+template < typename TTake >
+void ForEachLine( const VGreyscaleBlobSet& i_rSet, TTake&& i_rTake )
 {
-  ForEachLine( i_rSet,
-               [&]( std::uint32_t i_Blob, const VGreyscaleLine& i_rLine )
+  ForEachBlob( i_rSet,
+               [&]( std::uint32_t, std::span< const VGreyscaleLine > i_Lines )
                {
-                 const auto Right = static_cast< std::uint16_t >( i_rLine.x + i_rLine.length - 1 );
-                 if ( o_rData.Records.empty() || o_rData.Blobs.back() != i_Blob ||
-                      o_rData.Records.back().Bottom + 1 != i_rLine.y )
+                 for ( const VGreyscaleLine& rLine : i_Lines )
                  {
-                   o_rData.Records.push_back( { i_rLine.x, i_rLine.y, Right, i_rLine.y,
-                                                static_cast< std::uint32_t >( o_rData.Lines.size() ), i_Camera } );
-                   o_rData.Blobs.push_back( i_Blob );
+                   if ( IsThere( i_rSet, rLine ) )
+                   {
+                     i_rTake( rLine );
+                   }
                  }
-                 ZEK::VGreyscaleRecord& rRecord = o_rData.Records.back();
-                 rRecord.Left = std::min( rRecord.Left, i_rLine.x );
-                 rRecord.Right = std::max( rRecord.Right, Right );
-                 rRecord.Bottom = i_rLine.y;
-                 o_rData.Lines.push_back( { i_rLine.x, i_rLine.length, i_rLine.First } );
                } );
+}
+
+/// Lists the lines of one blob, which are all in the set, when their pixels are there and they follow one another row
+/// by row, as they do unless something is wrong; false, with nothing listed, when not. Without a branch in the loop.
+bool ListWholeBlob( const VGreyscaleBlobSet& i_rSet, std::uint32_t i_Blob, std::span< const VGreyscaleLine > i_Lines,
+                    std::uint32_t i_Camera, std::size_t& io_rCount, VGreyscaleData& io_rData )
+{
+  const std::uint64_t PixelCount = i_rSet.Pixels.size();
+  const std::uint32_t Top = i_Lines.front().y;
+  ZEK::VGreyscaleSpan* const pSpan = io_rData.Lines.data() + io_rCount;
+  std::uint32_t Left = 0xFFFF, Right = 0;
+  bool bWrong = false;
+  for ( std::size_t Index = 0; Index < i_Lines.size(); ++Index )
+  {
+    const VGreyscaleLine& rLine = i_Lines[Index];
+    const std::uint32_t End = std::uint32_t{ rLine.x } + rLine.length;
+    bWrong |= ( std::uint64_t{ rLine.First } + rLine.length > PixelCount ) | ( rLine.length == 0 ) | ( End > 0x10000 ) |
+              ( rLine.y != Top + Index );
+    Left = std::min< std::uint32_t >( Left, rLine.x );
+    Right = std::max( Right, End );
+    pSpan[Index] = { rLine.x, rLine.length, rLine.First };
+  }
+  if ( bWrong )
+  {
+    return false;
+  }
+  io_rData.Records.push_back( { static_cast< std::uint16_t >( Left ), static_cast< std::uint16_t >( Top ),
+                                static_cast< std::uint16_t >( Right - 1 ), i_Lines.back().y,
+                                static_cast< std::uint32_t >( io_rCount ), i_Camera } );
+  io_rData.Blobs.push_back( i_Blob );
+  io_rCount += i_Lines.size();
+  return true;
+}
+
+/// The same for any blob: lines without pixels are left out, and each run of rows is a record of its own.
+void ListParts( const VGreyscaleBlobSet& i_rSet, std::uint32_t i_Blob, std::span< const VGreyscaleLine > i_Lines,
+                std::uint32_t i_Camera, std::size_t& io_rCount, VGreyscaleData& io_rData )
+{
+  bool bFirst = true;
+  for ( const VGreyscaleLine& rLine : i_Lines )
+  {
+    if ( !IsThere( i_rSet, rLine ) )
+    {
+      continue;
+    }
+    const auto Right = static_cast< std::uint16_t >( rLine.x + rLine.length - 1 );
+    if ( bFirst || io_rData.Records.back().Bottom + 1 != rLine.y )
+    {
+      io_rData.Records.push_back(
+          { rLine.x, rLine.y, Right, rLine.y, static_cast< std::uint32_t >( io_rCount ), i_Camera } );
+      io_rData.Blobs.push_back( i_Blob );
+      bFirst = false;
+    }
+    ZEK::VGreyscaleRecord& rRecord = io_rData.Records.back();
+    rRecord.Left = std::min( rRecord.Left, rLine.x );
+    rRecord.Right = std::max( rRecord.Right, Right );
+    rRecord.Bottom = rLine.y;
+    io_rData.Lines[io_rCount++] = { rLine.x, rLine.length, rLine.First };
+  }
+}
+
+void ListLines( const VGreyscaleBlobSet& i_rSet, std::uint32_t i_Camera, VGreyscaleData& io_rData )
+{
+  // What stands there from before is written over: clearing it first would cost as much again.
+  io_rData.Lines.resize( i_rSet.Lines.size() );
+  std::size_t Count = 0;
+  ForEachBlob( i_rSet,
+               [&]( std::uint32_t i_Blob, std::span< const VGreyscaleLine > i_Lines )
+               {
+                 if ( !ListWholeBlob( i_rSet, i_Blob, i_Lines, i_Camera, Count, io_rData ) )
+                 {
+                   ListParts( i_rSet, i_Blob, i_Lines, i_Camera, Count, io_rData );
+                 }
+               } );
+  io_rData.Lines.resize( Count );
 }
 
 /// The items of the frame that colours are made of, one lookup for all centroids.
@@ -255,13 +328,16 @@ void VCameraDrawData::MakeGreyscale( const VSource& i_rSource )
   VGreyscaleData& rData = Refill( m_pGreyscale2D );
   rData.Records.clear();
   rData.Blobs.clear();
-  rData.Lines.clear();
   rData.Pixels = {};
   if ( const auto* const pSet = i_rSource.rCamera.Value< VGreyscaleBlobSet >( ECameraGreyscaleBlobs ) )
   {
     rData.Pixels = pSet->Pixels;
     rData.OffsetScale = { pSet->SensorOffset.x, pSet->SensorOffset.y, pSet->SensorScale.x, pSet->SensorScale.y };
     ListLines( *pSet, i_rSource.rCamera.GetInfo().Number, rData );
+  }
+  else
+  {
+    rData.Lines.clear();
   }
 }
 
@@ -282,7 +358,7 @@ void VCameraDrawData::MakeGreyscale3D( const VSource& i_rSource )
   }
   const VCorrection Correction{ i_rSource.rCamera.GetModel() };
   ForEachLine( *pSet,
-               [&]( std::uint32_t, const VGreyscaleLine& i_rLine )
+               [&]( const VGreyscaleLine& i_rLine )
                {
                  const float Half = 0.5F * static_cast< float >( i_rLine.length );
                  VCentroidVertex Vertex{

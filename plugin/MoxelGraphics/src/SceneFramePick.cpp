@@ -121,6 +121,7 @@ void VSceneFrame::Draw( const QRect& i_rScissor, const VCameraTile* i_pTile )
   {
     return;
   }
+  m_pScene->BeginTileWalk();
   DrawTile( *i_pTile, InFrame( i_pTile->Viewport, m_Size, Frame.size() ), Part );
   m_pContext->SetViewport( Frame );
   m_pContext->SetScissor( i_rScissor );

@@ -154,12 +154,16 @@ void VCameraGreyscale::DrawTiles( CoreGraphics::VRenderContext& io_rContext, con
     rGl.Maximised.Forget();
     return;
   }
-  const std::size_t Tiles = rGl.Batch.TileCount();
+  if ( rGl.rScene.TilesAgain() )
+  {
+    rGl.Batch.Again();
+    rGl.Maximised.Again();
+  }
   if ( !rGl.Draw( io_rContext, i_rOptions ) )
   {
     // The buffers may have died with the windows that shared them.
     rGl.Batch.Invalidate();
-    rGl.Batch.Again( Tiles );
+    rGl.Batch.Again();
     rGl.Draw( io_rContext, i_rOptions );
   }
   rGl.Maximised.DrawTiles( io_rContext, i_rOptions );

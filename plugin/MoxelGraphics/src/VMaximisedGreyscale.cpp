@@ -112,7 +112,8 @@ VMaximisedGreyscale::~VMaximisedGreyscale() = default;
 
 void VMaximisedGreyscale::Collect( const VRenderContext& i_rContext, const VSceneOptions& i_rOptions )
 {
-  m_Tiles.push_back( { i_rOptions.OverlayCamera.toStdString(), i_rContext.View2D(), i_rContext.Viewport() } );
+  m_Tiles.resize( std::max( m_Tiles.size(), m_Collected + 1 ) );
+  m_Tiles[m_Collected++] = { i_rOptions.OverlayCamera.toStdString(), i_rContext.View2D(), i_rContext.Viewport() };
 }
 
 void VMaximisedGreyscale::DropGone()
@@ -126,13 +127,14 @@ void VMaximisedGreyscale::DropGone()
 
 void VMaximisedGreyscale::DrawTiles( VRenderContext& io_rContext, const VSceneOptions& i_rOptions )
 {
-  if ( m_Tiles.empty() )
+  m_Last = std::exchange( m_Collected, 0 );
+  if ( m_Last == 0 )
   {
     return;
   }
   const QRect Viewport = io_rContext.Viewport(), Scissor = io_rContext.Scissor();
   const QVector4D View2D = io_rContext.View2D();
-  for ( const VTile& rTile : m_Tiles )
+  for ( const VTile& rTile : std::span( m_Tiles ).first( m_Last ) )
   {
     const QRect Seen = rTile.Rect.intersected( Scissor );
     if ( !Seen.isEmpty() )
@@ -143,7 +145,6 @@ void VMaximisedGreyscale::DrawTiles( VRenderContext& io_rContext, const VSceneOp
       DrawTile( io_rContext, i_rOptions, rTile );
     }
   }
-  m_Tiles.clear();
   io_rContext.SetViewport( Viewport );
   io_rContext.SetScissor( Scissor );
   io_rContext.SetView2D( View2D );

@@ -37,7 +37,9 @@ public:
   ~VMaximisedGreyscale();
 
   void Collect( const CoreGraphics::VRenderContext& i_rContext, const VSceneOptions& i_rOptions );
-  void Forget() { m_Tiles.clear(); }
+  void Forget() { m_Collected = m_Last = 0; }
+  /// Once more the tiles of the last `DrawTiles`.
+  void Again() { m_Collected = m_Last; }
   void DrawTiles( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
 
 private:
@@ -85,7 +87,9 @@ private:
 
   VMoxelScene& m_rScene;
   const std::shared_ptr< const ZEK::IRenderCameraProvider > m_pProvider;
-  std::vector< VTile > m_Tiles;
+  std::vector< VTile > m_Tiles; ///< only the first m_Collected are of this walk
+  std::size_t m_Collected = 0;
+  std::size_t m_Last = 0;
   std::map< std::string, VCamera, std::less<> > m_Cameras;
   std::vector< std::uint32_t > m_Words;
   std::shared_ptr< CoreGraphics::VShaderProgram > m_pNormal, m_pSelection;

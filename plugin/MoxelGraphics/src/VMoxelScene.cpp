@@ -78,6 +78,7 @@ void VMoxelScene::Initialise( CoreGraphics::VRenderContext& )
 bool VMoxelScene::ProcessPending()
 {
   m_pFlags->bPending.store( false, std::memory_order_release );
+  ++m_UpdateCount;
   {
     const std::lock_guard Lock( m_CallbackGuard );
     m_RunningCallbacks.assign( m_Callbacks.begin(), m_Callbacks.end() );

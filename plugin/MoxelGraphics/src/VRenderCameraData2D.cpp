@@ -303,12 +303,15 @@ void VRenderCameraData2D::RenderTiles( CoreGraphics::VRenderContext& io_rContext
     rGl.Batch.Forget();
     return;
   }
-  const std::size_t Tiles = rGl.Batch.TileCount();
+  if ( rGl.rScene.TilesAgain() )
+  {
+    rGl.Batch.Again();
+  }
   if ( !rGl.DrawAll( io_rContext, i_rOptions ) )
   {
     // The buffers may have died with the windows that shared them.
     rGl.Batch.Invalidate();
-    rGl.Batch.Again( Tiles );
+    rGl.Batch.Again();
     rGl.DrawAll( io_rContext, i_rOptions );
   }
 }

@@ -235,17 +235,39 @@ void VSceneFrame::DrawAllTiles()
   {
     return;
   }
-  for ( const VCameraTile& rTile : *m_Input.Tiles )
+  const bool bAgain = AreTilesAgain();
+  if ( !bAgain )
   {
-    if ( !rTile.Rect.isEmpty() )
+    const std::uint64_t Number = m_pScene->BeginTileWalk(), Draws = m_pContext->DrawCalls();
+    for ( const VCameraTile& rTile : *m_Input.Tiles )
     {
-      DrawTile( rTile, rTile.Viewport, rTile.Rect );
+      if ( !rTile.Rect.isEmpty() )
+      {
+        DrawTile( rTile, rTile.Viewport, rTile.Rect );
+      }
     }
+    m_TileWalk = { m_Input.Tiles,
+                   m_Input.Options,
+                   m_Size,
+                   m_pContext->RenderMode(),
+                   Number,
+                   m_pScene->UpdateCount(),
+                   m_pContext->DrawCalls() == Draws };
   }
   const QRect Frame( QPoint( 0, 0 ), m_Size );
   m_pContext->SetViewport( Frame );
   m_pContext->SetScissor( Frame );
+  m_pScene->SetTilesAgain( bAgain );
   m_pScene->DrawTiles( *m_pContext, m_Input.Options );
+  m_pScene->SetTilesAgain( false );
+}
+
+bool VSceneFrame::AreTilesAgain() const
+{
+  return m_TileWalk.bCollected && m_TileWalk.Number == m_pScene->TileWalk() &&
+         m_TileWalk.Updates == m_pScene->UpdateCount() && m_TileWalk.Tiles == m_Input.Tiles &&
+         m_TileWalk.Size == m_Size && m_TileWalk.RenderMode == m_pContext->RenderMode() &&
+         m_TileWalk.Options == m_Input.Options;
 }
 
 void VSceneFrame::DrawTile( const VCameraTile& i_rTile, const QRect& i_rViewport, const QRect& i_rScissor )

@@ -119,6 +119,7 @@ VTileBatch::VView& VTileBatch::FindView( bool& o_rbSame )
 
 bool VTileBatch::Prepare( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, VDraw& o_rDraw )
 {
+  m_Last = m_Collected;
   if ( m_Collected == 0 )
   {
     return false;

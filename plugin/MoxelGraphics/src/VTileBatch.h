@@ -72,12 +72,11 @@ public:
 
   void Collect( const CoreGraphics::VRenderContext& i_rContext, const VSceneOptions& i_rOptions );
   bool IsEmpty() const { return m_Collected == 0; }
-  std::size_t TileCount() const { return m_Collected; }
-  void Forget() { m_Collected = 0; }
+  void Forget() { m_Collected = m_Last = 0; }
   /// What to draw for the tiles since the last call; false for nothing.
   bool Prepare( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, VDraw& o_rDraw );
   /// Once more the tiles of the last `Prepare`.
-  void Again( std::size_t i_TileCount ) { m_Collected = i_TileCount; }
+  void Again() { m_Collected = m_Last; }
   /// The buffers turned out to be gone: the next `Prepare` writes everything anew.
   void Invalidate();
 
@@ -138,6 +137,7 @@ private:
 
   std::vector< VTile > m_Tiles;
   std::size_t m_Collected = 0;
+  std::size_t m_Last = 0; ///< tiles of the last `Prepare`
   std::vector< std::unique_ptr< VView > > m_Views;
   std::vector< std::unique_ptr< VTileSet > > m_Sets;
   std::vector< ZEK::VRenderCameraRef > m_Cameras; ///< by tile, while a view is prepared

@@ -304,6 +304,10 @@ void VTilePictures::DrawSpots( CoreGraphics::VRenderContext& io_rContext, VLook&
 
 void VTilePictures::DrawUnder( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions )
 {
+  if ( m_rScene.TilesAgain() )
+  {
+    m_Tiles.Again();
+  }
   m_pTable = m_Tiles.Prepare( io_rContext, i_rOptions );
   const int Mode = io_rContext.RenderMode();
   if ( !m_pTable || !i_rOptions.CameraMaskGrid )

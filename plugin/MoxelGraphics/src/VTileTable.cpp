@@ -146,6 +146,7 @@ bool VTileTable::Write( CoreGraphics::VRenderContext& io_rContext, VView& io_rVi
 CoreGraphics::VTexelBuffer* VTileTable::Prepare( CoreGraphics::VRenderContext& io_rContext,
                                                  const VSceneOptions& i_rOptions )
 {
+  m_Last = m_Collected;
   if ( m_Collected == 0 || m_pProvider->GetCameras().empty() )
   {
     m_Collected = 0;

@@ -31,7 +31,9 @@ public:
 
   void Collect( const CoreGraphics::VRenderContext& i_rContext, const VSceneOptions& i_rOptions );
   bool IsEmpty() const { return m_Collected == 0; }
-  void Forget() { m_Collected = 0; }
+  void Forget() { m_Collected = m_Last = 0; }
+  /// Once more the tiles of the last `Prepare`.
+  void Again() { m_Collected = m_Last; }
   /// The table of the tiles since the last call; null for none.
   CoreGraphics::VTexelBuffer* Prepare( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions );
 
@@ -70,6 +72,7 @@ private:
   const std::shared_ptr< const ZEK::IRenderCameraProvider > m_pProvider;
   std::vector< VTile > m_Tiles;
   std::size_t m_Collected = 0;
+  std::size_t m_Last = 0; ///< tiles of the last `Prepare`
   std::vector< std::unique_ptr< VView > > m_Views;
   std::vector< float > m_NewRows;
   std::uint64_t m_Clock = 0;

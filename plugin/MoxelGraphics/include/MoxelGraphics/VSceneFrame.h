@@ -129,6 +129,7 @@ private:
   void Highlight();
   void DrawView();
   void DrawAllTiles();
+  bool AreTilesAgain() const;
   /// Where a pick looks: the tile under a point, pixels from the top left; null when there is none.
   const VCameraTile* TileUnderPointer( QPoint i_Point ) const;
   void DrawTile( const VCameraTile& i_rTile, const QRect& i_rViewport, const QRect& i_rScissor );
@@ -138,6 +139,18 @@ private:
   std::shared_ptr< VMoxelScene > m_pScene;
   std::shared_ptr< CoreGraphics::VCameraController > m_pController;
   std::unique_ptr< CoreGraphics::VRenderContext > m_pContext;
+  /// What the last walk through the tiles was about.
+  struct VTileWalk
+  {
+    VCameraTilesRef Tiles;
+    VSceneOptions Options;
+    QSize Size;
+    int RenderMode = -1;
+    std::uint64_t Number = 0; ///< of the scene's walk
+    std::uint64_t Updates = 0;
+    bool bCollected = false; ///< nothing was drawn meanwhile
+  };
+  VTileWalk m_TileWalk;
   std::unique_ptr< QOpenGLFramebufferObject > m_pSelectionTarget;
   std::unique_ptr< QOpenGLFramebufferObject > m_pOutlineTarget;
   VFrameInput m_Input;

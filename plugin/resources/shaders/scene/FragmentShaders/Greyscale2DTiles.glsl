@@ -2,6 +2,7 @@
 uniform highp usamplerBuffer t_Lines; // a line: its first column, its length above bit 16; its first byte
 uniform highp samplerBuffer t_Pixels;
 #else
+precision highp int;
 uniform highp usampler2D t_Lines;
 uniform sampler2D t_Pixels;
 #endif
