@@ -62,7 +62,11 @@ public:
   {
     EXPECT_TRUE( i_rOptions.OverlayCamera.isEmpty() );
     Seen.push_back( { {}, io_rContext.Viewport(), io_rContext.Scissor(), io_rContext.RenderMode() } );
-    for ( const auto& [Rect, Id] : std::exchange( m_Collected, {} ) )
+    if ( !m_rScene.TilesAgain() )
+    {
+      m_Last = std::exchange( m_Collected, {} );
+    }
+    for ( const auto& [Rect, Id] : m_Last )
     {
       const QRect Part = Rect.intersected( io_rContext.Scissor() );
       if ( !Part.isEmpty() )
@@ -102,7 +106,7 @@ public:
 
 private:
   const VMoxelScene& m_rScene;
-  std::vector< std::pair< QRect, std::uint32_t > > m_Collected;
+  std::vector< std::pair< QRect, std::uint32_t > > m_Collected, m_Last;
   int m_Shade = 0;
 };
 
