@@ -29,7 +29,7 @@ VSubject Arm()
   for ( int Index = 0; Index < 4; ++Index )
   {
     CoreMoxelTypes::VMarker Marker;
-    Marker.Name = "M" + std::to_string( Index );
+    Marker.Name = std::string( "M" ).append( std::to_string( Index ) );
     Marker.Segment = Index - 1;
     Marker.Local = { 1.0 * Index, 0, 5 };
     Subject.Markers.push_back( Marker );
