@@ -190,7 +190,7 @@ bool VCentroidBatch::WriteWords( VCentroidSet& io_rSet, const VMoxelScene& i_rSc
 struct VLook
 {
   std::shared_ptr< VShaderProgram > pNormal, pSelection;
-  VUniform Sizes{ "u_Sizes" }, Show{ "u_ShowSelection" }, Table{ "t_Tiles" };
+  VUniform Sizes{ "u_Sizes" }, Dot{ "u_Dot" }, Show{ "u_ShowSelection" }, Table{ "t_Tiles" };
 };
 } // namespace
 
@@ -253,6 +253,11 @@ bool VRenderCameraData2D::VGl::Draw( VRenderContext& io_rContext, VTileBatch::VD
   rLook.Table.Set( *rpProgram, 0 );
   rLook.Sizes.Set( *rpProgram, i_bQuads ? QVector2D( VTileBatch::LargePixels, NoLimit )
                                         : QVector2D( -NoLimit, VTileBatch::LargePixels ) );
+  if ( !i_bQuads )
+  {
+    // In a grid of many cameras most centroids are tiny, and a single pixel is not seen.
+    rLook.Dot.Set( *rpProgram, bVisible ? std::max( 1.0f, io_rContext.PixelRatio() ) * VTileBatch::LargePixels : 1.0f );
+  }
   rLook.Show.Set( *rpProgram, io_rContext.RenderMode() == ERenderModeHighlight ? 1 : 0 );
   const auto Objects = static_cast< int >( End - First );
   i_bQuads ? io_rContext.DrawArraysInstanced( GL_TRIANGLE_STRIP, 4, Objects )

@@ -3,6 +3,8 @@ uniform vec2 u_ViewportSize;
 uniform vec2 u_ViewportOffset;
 uniform vec2 u_Sizes; // of points drawn here, pixels: from the first up to below the second
 
+uniform float u_Dot;  // side of a point, pixels
+
 attribute vec3 a_position;
 attribute vec4 a_colour;
 attribute float a_Tile;
@@ -42,5 +44,5 @@ void main()
                size < u_Sizes.y && a_colour != vec4( 0.0 );
   v_colour = a_colour;
   gl_Position = bSeen ? vec4( clip, 0.0, 1.0 ) : vec4( 0.0, 0.0, 2.0, 1.0 );
-  gl_PointSize = 1.0;
+  gl_PointSize = u_Dot;
 }
