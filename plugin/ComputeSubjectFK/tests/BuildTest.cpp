@@ -56,6 +56,9 @@ TEST( SubjectFKBuild, MakesSegmentsAndAPointTargetForEachMarkerOnOne )
   EXPECT_NEAR( Positions[3][0], 1300, 1e-12 );
   EXPECT_NEAR( Positions[3][1], 3, 1e-12 );
   EXPECT_NEAR( Positions[2][0], 1102, 1e-12 );
+  VSubject Rounded = Arm();
+  Rounded.Segments[2].Pre.R[0] = 1 + 4e-7;
+  EXPECT_NO_THROW( VComputeSubjectFK::Build( Rounded ) ) << "as near to a rotation as single precision brings it";
   EXPECT_EQ( VComputeSubjectFK::Build( VSubject{} )->SegmentCount(), 0u );
 }
 
@@ -109,6 +112,16 @@ TEST( SubjectFKBuild, SaysWhatIsWrongWithASubject )
           o_r.Segments[2].Post.R[0] = 3;
         },
         InvalidValue, "not a rotation" },
+      { []( VSubject& o_r )
+        {
+          o_r.Segments[2].Pre.R[0] = -1;
+        },
+        InvalidValue, "Segment 2" }, // a mirror
+      { []( VSubject& o_r )
+        {
+          o_r.Segments[2].Pre.R[0] = 1 + 2e-6;
+        },
+        InvalidValue, "Segment 2" },
       { []( VSubject& o_r )
         {
           o_r.Markers[3].Segment = 3;
