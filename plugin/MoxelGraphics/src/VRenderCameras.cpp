@@ -81,7 +81,10 @@ bool VRenderCameras::TakeCameras()
   }
   m_pParts->World.PlacesChanged();
   m_Bodies.swap( m_NewBodies );
-  return m_Bodies != m_NewBodies;
+  const bool bOther = m_Bodies != m_NewBodies;
+  // Cameras that departed are not held.
+  m_NewBodies.clear();
+  return bOther;
 }
 
 void VRenderCameras::SetIds( std::uint32_t i_FirstId, std::span< const std::uint8_t > i_Flags )

@@ -75,7 +75,7 @@ public:
   void Render( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions,
                std::uint32_t i_Pass ) override;
   void RenderTiles( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions ) override;
-  /// Of a view with one camera: its centroids.
+  /// Of the camera whose tile the context shows: its centroids.
   void PickInRect( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, const QRect& i_rRect,
                    std::vector< std::uint32_t >& io_rIds ) override;
   /// The lines of the frustums of all cameras that are selected, or of all that are not. Selected ones are white, the
