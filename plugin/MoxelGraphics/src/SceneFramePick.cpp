@@ -204,7 +204,9 @@ int VSceneFrame::PickBand()
       pHelper->Remember( i_bOn );
     }
   };
-  Remember( true );
+  // A lens shows the spheres elsewhere than the matrix that drew them says; pixels find those.
+  const bool bCamera = pTile || !m_Input.Options.OverlayCamera.isEmpty();
+  Remember( !( bCamera && m_Input.Options.Show3DOverlay && m_Input.Options.Distort3D ) );
   const int Layers = PickLayers( Band, pTile );
   Remember( false );
   m_pContext->SetFrameSize( m_Size );
@@ -258,7 +260,10 @@ void VSceneFrame::PickAnalytically( const QRect& i_rBand, const VCameraTile* i_p
   }
   m_Analytic.clear();
   m_pScene->PickInRect( *m_pContext, m_Input.Options, i_rBand, m_Analytic );
-  m_Input.Options.OverlayCamera.clear();
+  if ( i_pTile )
+  {
+    m_Input.Options.OverlayCamera.clear();
+  }
   for ( const std::uint32_t Id : m_Analytic )
   {
     Take( Id & EIdMask );

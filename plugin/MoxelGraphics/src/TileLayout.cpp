@@ -1,5 +1,7 @@
 #include "TileLayout.h"
 
+#include <MoxelGraphics/VCameraDefinition.h>
+
 #include <algorithm>
 #include <cmath>
 
@@ -7,6 +9,8 @@ namespace MoxelGraphics
 {
 namespace
 {
+constexpr double LeastPixelAspect = 0.01, GreatestPixelAspect = 100.0;
+
 int DivideUp( int i_Value, int i_By )
 {
   return ( i_Value + i_By - 1 ) / i_By;
@@ -48,6 +52,23 @@ void FitImage( VCameraTile& io_rTile, double i_CellAspect )
   io_rTile.ScaleY = static_cast< float >( Y );
 }
 } // namespace
+
+VCameraTile MakeImageTile( const VCameraDefinition& i_rCamera )
+{
+  VCameraTile Tile;
+  Tile.DeviceURN = QString::fromStdString( i_rCamera.DeviceURN );
+  Tile.DisplayType = QString::fromStdString( i_rCamera.DisplayType );
+  Tile.UserId = i_rCamera.UserId;
+  Tile.Position = i_rCamera.Position;
+  const double Aspect = i_rCamera.PixelAspect;
+  Tile.PixelAspect = Aspect >= LeastPixelAspect && Aspect <= GreatestPixelAspect ? Aspect : 1.0;
+  Tile.bVideo = i_rCamera.bVideo;
+  Tile.ImageWidth = i_rCamera.ImageWidth;
+  Tile.ImageHeight = i_rCamera.ImageHeight;
+  Tile.Rotation = i_rCamera.Rotation;
+  Tile.SnappedRotation = i_rCamera.SnappedRotation;
+  return Tile;
+}
 
 void MeasureRotated( VCameraTile& io_rTile, bool i_bRotated, bool i_bSnapped )
 {

@@ -6,6 +6,7 @@
 
 namespace MoxelGraphics
 {
+struct VCameraDefinition;
 
 struct VGridShape
 {
@@ -14,6 +15,8 @@ struct VGridShape
   friend bool operator==( const VGridShape&, const VGridShape& ) = default;
 };
 
+/// The camera's image, not measured and without a place. A pixel aspect that no sensor has counts as 1.
+VCameraTile MakeImageTile( const VCameraDefinition& i_rCamera );
 /// The bounding box of the tile's image as it stands on screen.
 void MeasureRotated( VCameraTile& io_rTile, bool i_bRotated, bool i_bSnapped );
 /// The shape in which the tiles' images waste the least of a frame; the one with fewer rows of equal ones.

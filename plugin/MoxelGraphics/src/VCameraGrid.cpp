@@ -154,17 +154,7 @@ void VCameraGrid::Resize( QSize i_Size, float i_PixelRatio )
 
 VCameraTile VCameraGrid::MakeTile( const VCameraDefinition& i_rCamera )
 {
-  VCameraTile Tile;
-  Tile.DeviceURN = QString::fromStdString( i_rCamera.DeviceURN );
-  Tile.DisplayType = QString::fromStdString( i_rCamera.DisplayType );
-  Tile.UserId = i_rCamera.UserId;
-  Tile.Position = i_rCamera.Position;
-  Tile.PixelAspect = i_rCamera.PixelAspect > 0 && std::isfinite( i_rCamera.PixelAspect ) ? i_rCamera.PixelAspect : 1.0;
-  Tile.bVideo = i_rCamera.bVideo;
-  Tile.ImageWidth = i_rCamera.ImageWidth;
-  Tile.ImageHeight = i_rCamera.ImageHeight;
-  Tile.Rotation = i_rCamera.Rotation;
-  Tile.SnappedRotation = i_rCamera.SnappedRotation;
+  VCameraTile Tile = MakeImageTile( i_rCamera );
   VView View = DefaultView();
   if ( const int Former = m_Index.value( Tile.DeviceURN, -1 ); Former >= 0 )
   {

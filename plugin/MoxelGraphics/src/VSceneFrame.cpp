@@ -3,6 +3,7 @@
 #include "HandOver.h"
 #include "HighlightUnit.h"
 #include "Log.h"
+#include "TileLayout.h"
 
 #include <MoxelGraphics/VMoxelScene.h>
 
@@ -178,7 +179,11 @@ void VSceneFrame::Begin()
 {
   m_Clock.start();
   m_pContext->ResetCounters();
-  m_pScene->Resources()->Update();
+  if ( m_pScene->Resources()->Update() )
+  {
+    // What other programs left undrawn may be drawn now: every view goes through its tiles again.
+    m_pScene->BeginTileWalk();
+  }
   if ( m_pScene->IsPending() )
   {
     m_pScene->ProcessPending();
@@ -187,6 +192,10 @@ void VSceneFrame::Begin()
   m_pContext->SetOutlineMask( m_pOutlineTarget.get() );
   m_pContext->SetPreselectColourIndex( m_Input.PreselectColour );
   UpdateCamera();
+  if ( !m_Input.Options.CameraView && !m_Input.Options.OverlayCamera.isEmpty() )
+  {
+    m_pContext->SetView2D( ViewThroughCamera() );
+  }
   m_pContext->SetYUp( m_pScene->YUp() );
   m_pContext->SetGlobalTime( static_cast< float >( QTime::currentTime().msecsSinceStartOfDay() ) * 0.001f );
   m_pContext->SetPixelRatio( m_Input.PixelRatio );
@@ -227,6 +236,33 @@ void VSceneFrame::UpdateCamera()
   }
   m_pController->Step();
   m_pController->Apply( *m_pContext );
+}
+
+const QVector4D& VSceneFrame::ViewThroughCamera()
+{
+  const VSceneOptions& rOptions = m_Input.Options;
+  VThrough& rThrough = m_Through;
+  if ( rThrough.URN == rOptions.OverlayCamera && rThrough.Cameras == m_pScene->CameraGeneration() &&
+       rThrough.Size == m_Size && rThrough.bRotated == rOptions.CameraShowRotated &&
+       rThrough.bSnapped == rOptions.CameraSnap90Degrees )
+  {
+    return rThrough.View2D;
+  }
+  rThrough = { rOptions.OverlayCamera,     m_pScene->CameraGeneration(), m_Size,
+               rOptions.CameraShowRotated, rOptions.CameraSnap90Degrees, QVector4D( 1, 1, 0.5F, 0.5F ) };
+  const std::string URN = rThrough.URN.toStdString();
+  for ( const VCameraDefinition& rCamera : m_pScene->CameraDefinitions() )
+  {
+    if ( rCamera.DeviceURN == URN )
+    {
+      VCameraTiles Tiles{ MakeImageTile( rCamera ) };
+      MeasureRotated( Tiles.front(), rThrough.bRotated, rThrough.bSnapped );
+      PlaceTiles( Tiles, m_Size, {} );
+      rThrough.View2D.setX( Tiles.front().ScaleX );
+      rThrough.View2D.setY( Tiles.front().ScaleY );
+    }
+  }
+  return rThrough.View2D;
 }
 
 void VSceneFrame::DrawAllTiles()

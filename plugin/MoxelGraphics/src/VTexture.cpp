@@ -1,6 +1,7 @@
 #include "VTexture.h"
 
 #include <CoreGraphics/VRenderContext.h>
+#include <CoreGraphics/VVertexBuffer.h>
 
 #include <QtGui/QOpenGLContext>
 
@@ -113,6 +114,8 @@ bool VTexture::Write( CoreGraphics::VRenderContext& io_rContext, ETexel i_Texel,
     }
   }
   rGl.glPixelStorei( GL_UNPACK_ALIGNMENT, 4 );
+  CoreGraphics::VVertexBuffer::CountBytes( Bytes * static_cast< std::size_t >( i_Width ) *
+                                           static_cast< std::size_t >( i_Height ) );
   return true;
 }
 

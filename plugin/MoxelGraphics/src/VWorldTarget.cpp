@@ -4,6 +4,7 @@
 
 #include <CoreGraphics/VResources.h>
 #include <MoxelGraphics/IRenderType.h>
+#include <ZEK/RenderCamera.h>
 
 #include <QtOpenGL/QOpenGLFramebufferObject>
 
@@ -162,6 +163,20 @@ VWorldTarget::VPictures& VWorldTarget::PicturesOf( VRenderContext& io_rContext )
   return *static_cast< VPictures* >( rpHeld.get() );
 }
 
+const std::array< double, 2 >& VWorldTarget::ReachOf( std::size_t i_Camera )
+{
+  if ( i_Camera >= m_Reaches.size() )
+  {
+    m_Reaches.resize( i_Camera + 1 );
+  }
+  VReach& rReach = m_Reaches[i_Camera];
+  if ( rReach.Sensor != m_Sensor )
+  {
+    rReach = { m_Sensor, LensReach( m_Sensor ) };
+  }
+  return rReach.Reach;
+}
+
 bool VWorldTarget::Begin( VRenderContext& io_rContext, const ZEK::IRenderCamera& i_rCamera,
                           const VSceneOptions& i_rOptions, bool i_bLens )
 {
@@ -175,12 +190,12 @@ bool VWorldTarget::Begin( VRenderContext& io_rContext, const ZEK::IRenderCamera&
   QSize Used = m_Viewport.size();
   if ( i_bLens )
   {
-    const auto Reach = LensReach( m_Sensor );
+    const auto& rReach = ReachOf( i_rCamera.GetInfo().Number );
     const auto Larger = []( int i_Size, double i_Reach )
     {
       return i_Size + 2 * static_cast< int >( std::ceil( i_Size * ( i_Reach - 1 ) / 2 ) );
     };
-    Used = { Larger( Used.width(), Reach[0] ), Larger( Used.height(), Reach[1] ) };
+    Used = { Larger( Used.width(), rReach[0] ), Larger( Used.height(), rReach[1] ) };
     m_pPicture = rPictures.ForTile( io_rContext, Used );
   }
   else
@@ -221,6 +236,7 @@ bool VWorldTarget::Begin( VRenderContext& io_rContext, const ZEK::IRenderCamera&
     io_rContext.Clear( true, true );
   }
   io_rContext.SetProjection( ImageProjection( i_rCamera, i_rOptions, m_PictureView2D ) );
+  m_Projection = ImageProjection( i_rCamera, i_rOptions, m_View2D );
   m_DrawsAtBegin = io_rContext.DrawCalls();
   m_bOpen = true;
   return true;
@@ -237,6 +253,7 @@ void VWorldTarget::End( VRenderContext& io_rContext, float i_Opacity )
   }
   io_rContext.SetViewport( m_Viewport );
   io_rContext.SetView2D( m_View2D );
+  io_rContext.SetProjection( m_Projection );
 }
 
 void VWorldTarget::Lay( VRenderContext& io_rContext, float i_Opacity )

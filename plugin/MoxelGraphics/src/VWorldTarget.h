@@ -8,6 +8,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <vector>
 
 namespace CoreGraphics
 {
@@ -47,6 +48,8 @@ private:
   struct VGl;
 
   static VPictures& PicturesOf( CoreGraphics::VRenderContext& io_rContext );
+  /// `LensReach` of `m_Sensor`, worked out where the camera was last seen another way.
+  const std::array< double, 2 >& ReachOf( std::size_t i_Camera );
   void Lay( CoreGraphics::VRenderContext& io_rContext, float i_Opacity );
 
   std::unique_ptr< VGl > m_pGl;
@@ -57,7 +60,14 @@ private:
   QSize m_PictureSize;
   QVector4D m_View2D;        ///< of the tile
   QVector4D m_PictureView2D; ///< the same place in the larger picture
+  QMatrix4x4 m_Projection;   ///< of the world into the tile
   VSensorView m_Sensor;
+  struct VReach
+  {
+    VSensorView Sensor;
+    std::array< double, 2 > Reach{ 1, 1 }; ///< of a view without a lens, as the sensor above is one
+  };
+  std::vector< VReach > m_Reaches; ///< by the cameras' numbers
   std::uint64_t m_DrawsAtBegin = 0;
 };
 

@@ -82,7 +82,10 @@ public:
     std::vector< VCameraDefinition > Definitions;
     for ( const auto& rpCamera : pProvider->List )
     {
-      Definitions.emplace_back().DeviceURN = rpCamera->GetName();
+      VCameraDefinition& rDefinition = Definitions.emplace_back();
+      rDefinition.DeviceURN = rpCamera->GetName();
+      rDefinition.ImageWidth = static_cast< std::int32_t >( rpCamera->GetInfo().SensorWidth );
+      rDefinition.ImageHeight = static_cast< std::int32_t >( rpCamera->GetInfo().SensorHeight );
     }
     SetCameraDefinitions( Definitions );
   }
@@ -205,6 +208,15 @@ protected:
   {
     pFrame->Input().PickMode = EPickHover;
     pFrame->Input().Pointer = i_Point;
+    Draw();
+    pFrame->Input().PickMode = EPickNone;
+    return pFrame->Result().Ids;
+  }
+  VIds Band( const QRect& i_rBand )
+  {
+    pFrame->Input().BandStart = i_rBand.topLeft();
+    pFrame->Input().PickMode = EPickBandDone;
+    pFrame->Input().Pointer = i_rBand.topLeft() + QPoint( i_rBand.width(), i_rBand.height() );
     Draw();
     pFrame->Input().PickMode = EPickNone;
     return pFrame->Result().Ids;

@@ -1,5 +1,7 @@
 #include "BackdropFixture.h"
 
+#include <MoxelGraphics/CameraDistortion.h>
+
 #include <CoreVideoUtils/VideoPlanes.h>
 #include <CoreVideoUtils/VideoTestPattern.h>
 #include <TestSupport/Golden.h>
@@ -225,6 +227,7 @@ TEST_F( VBackdrop, PixelsAreTakenAlongOnceAndGoWithTheirCamera )
   Video( Grey( 120, 64, 48 ) );
   EXPECT_EQ( Middle( Draw() ), 120 );
   EXPECT_EQ( rpBackdrop->BytesUploaded(), 2u * 64 * 48 );
+  EXPECT_EQ( pFrame->Figures().BytesUploaded, 64u * 48 );
   Video( TestSupport::NoiseFrame( EPixelFormat::I420, 32, 16, 1 ) ); // another size in the same textures
   Draw();
   EXPECT_EQ( rpBackdrop->BytesUploaded(), 2u * 64 * 48 + 32 * 16 * 3 / 2 );
@@ -292,6 +295,73 @@ TEST_P( VEveryContext, TheWorldLiesOverTheImageWhereTheLensShowsIt )
       {
         EXPECT_LE( std::hypot( Seen.x() - Straight.x(), Seen.y() - Straight.y() ), 1 );
         EXPECT_EQ( Pick( Straight.toPoint() ).size(), 1u );
+      }
+    }
+  }
+}
+
+TEST_F( VBackdrop, ABandTakesWhatTheLensShowsInIt )
+{
+  Calibrate();
+  Options().Distort3D = true;
+  // A frame of points along the borders of the sensor: without the lens the larger picture would hold them farther in.
+  std::vector< VScenePoint > Points;
+  for ( int Step = 0; Step < 5; ++Step )
+  {
+    for ( const QPointF& rRaw : { QPointF( 20 + 150 * Step, 15 ), QPointF( 20 + 150 * Step, 465 ),
+                                  QPointF( 15, 70 + 80 * Step ), QPointF( 625, 70 + 80 * Step ) } )
+    {
+      Points.push_back( VTestLens::World( VTestLens::Corrected( rRaw ), 3000 ) );
+    }
+  }
+  pScene->Change( Points );
+  EXPECT_EQ( Band( { 0, 0, W, H } ).size(), Points.size() );
+  EXPECT_EQ( Band( { 0, 0, W, 34 } ).size(), 5u );
+  EXPECT_TRUE( Band( { 34, 34, W - 68, H - 68 } ).empty() );
+  Options().Distort3D = false;
+  EXPECT_TRUE( Band( { 60, 60, W - 120, H - 120 } ).empty() );
+}
+
+TEST_F( VBackdrop, AFreeViewThroughACameraShowsAllOfItsImageInTheMiddle )
+{
+  Calibrate();
+  pScene->Tell();
+  Video( Grey( 80, 64, 48 ) );
+  Options().CameraView = false;
+  Options().OverlayCamera = QStringLiteral( "a" );
+  const QPointF Raw( 120, 400 );
+  pScene->Change( { VTestLens::World( VTestLens::Corrected( Raw ), 3000 ) } );
+  for ( const QSize& rSize : { QSize( 900, 480 ), QSize( 640, 700 ) } )
+  {
+    FrameSize = rSize;
+    const double Scale = std::min( rSize.width() / 640.0, rSize.height() / 480.0 );
+    const QPointF Corner( ( rSize.width() - W * Scale ) / 2, ( rSize.height() - H * Scale ) / 2 );
+    const auto Place = [&]( QPointF i_Sensor )
+    {
+      return Corner + ( i_Sensor + QPointF( 0.5, 0.5 ) ) * Scale;
+    };
+    for ( const bool bLens : { true, false } )
+    {
+      SCOPED_TRACE( testing::Message() << rSize.width() << ( bLens ? " with" : " without" ) );
+      Options().Distort3D = bLens;
+      const QPointF Expected = Place( bLens ? Raw : VTestLens::Corrected( Raw ) );
+      for ( int Times = 0; Times < 2; ++Times ) // the second time after a band
+      {
+        const QImage Image = Draw();
+        const QPointF Seen = Found( Image );
+        EXPECT_LE( std::hypot( Seen.x() - Expected.x(), Seen.y() - Expected.y() ), 1 ) << Seen.x() << ", " << Seen.y();
+        const auto IsVideo = [&]( QPointF i_Place )
+        {
+          return qRed( Image.pixel( i_Place.toPoint() ) ) == 80;
+        };
+        // Beside the image there is nothing, be it left or below.
+        EXPECT_TRUE( IsVideo( Place( { 40, 40 } ) ) && IsVideo( Place( { 600, 440 } ) ) );
+        EXPECT_FALSE( IsVideo( { Corner.x() / 2, Corner.y() / 2 } ) );
+        EXPECT_EQ( Pick( Expected.toPoint() ).size(), 1u );
+        EXPECT_EQ( Band( QRect( Expected.toPoint() - QPoint( 9, 9 ), QSize( 18, 18 ) ) ).size(), 1u );
+        // What is drawn or painted over the world finds the projection of the world.
+        CoreGraphics::VRenderContext& rContext = *pFrame->Context();
+        EXPECT_EQ( rContext.Projection(), ImageProjection( *pCamera, Options(), rContext.View2D() ) );
       }
     }
   }

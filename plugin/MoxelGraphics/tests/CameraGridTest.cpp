@@ -145,6 +145,18 @@ TEST_F( VGridTest, FramesThatCannotBePartedEvenlyAndThoseWithoutPixels )
   pGrid->Resize( { 200, 100 }, 1.0f );
   EXPECT_EQ( Tile( 1 ).Rect, QRect( 100, 0, 100, 100 ) );
   EXPECT_EQ( Tile( 1 ).ScaleX, 1.0f );
+  // Pixels of a shape that no sensor has are square.
+  for ( const double Aspect : { 0.0, -2.0, 1e-300, 0.009, 101.0, 1e300, std::nan( "" ) } )
+  {
+    VCameraDefinition Definition = Camera( "a" );
+    Definition.PixelAspect = Aspect;
+    pGrid->SetCameras( { Definition } );
+    EXPECT_EQ( Tile().PixelAspect, 1.0 ) << Aspect;
+  }
+  VCameraDefinition Wide = Camera( "a" );
+  Wide.PixelAspect = 100;
+  pGrid->SetCameras( { Wide } );
+  EXPECT_EQ( Tile().PixelAspect, 100.0 );
 }
 
 TEST_F( VGridTest, OneCameraFillsTheFrameAndGivesItsAspect )

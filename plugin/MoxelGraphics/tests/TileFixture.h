@@ -114,6 +114,7 @@ private:
 class VDotScene final : public VTestScene
 {
 public:
+  using VTestScene::VTestScene;
   void Initialise( CoreGraphics::VRenderContext& io_rContext ) override
   {
     const bool bFirst = m_RenderList.empty();

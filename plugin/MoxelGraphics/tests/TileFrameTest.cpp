@@ -1,6 +1,8 @@
 #include "FrameFixture.h"
 #include "TileFixture.h"
 
+#include <HostServices/VRenderResources.h>
+
 namespace MoxelGraphics
 {
 namespace
@@ -83,6 +85,37 @@ TEST_F( VTileFrame, EveryTileIsDrawnForItselfAndEndedOnce )
   Grid.Resize( { 3, 3 }, 1.0f );
   DrawTiles();
   EXPECT_EQ( pScene->pDots->Seen.size(), 1u ) << "cells without pixels";
+}
+
+TEST_F( VTileFrame, TilesAreGoneThroughAgainOnlyWhereSomethingChanged )
+{
+  const auto pResources = std::make_shared< HostServices::VRenderResources >();
+  Show( std::make_shared< VDotScene >( pResources ) );
+  Dots()["1"] = { { 0.25f, 0.75f, 11 } };
+  Options().CameraView = true;
+  Show3D( false );
+  const auto Walked = [&]
+  {
+    DrawTiles();
+    return pScene->pDots->Seen.size() == 5;
+  };
+  EXPECT_TRUE( Walked() );
+  EXPECT_FALSE( Walked() );
+  // Sources are read again, whichever view of the scene meets that first.
+  VSceneFrame Other( pScene, std::make_shared< CoreGraphics::VCameraController >() );
+  for ( const bool bOther : { false, true } )
+  {
+    pResources->Reload();
+    if ( bOther )
+    {
+      Other.Resize( Size );
+      Offscreen.Draw( Other, Size );
+    }
+    EXPECT_TRUE( Walked() ) << bOther;
+    EXPECT_FALSE( Walked() );
+  }
+  Look( 1, 2.0, 0.5, 0.5 );
+  EXPECT_TRUE( Walked() );
 }
 
 TEST_F( VTileFrame, AClickFindsWhatItsTileShowsThere )

@@ -116,6 +116,8 @@ private:
   double Lap();
   void ReadGl( const QOpenGLFramebufferObject& i_rTarget );
   void UpdateCamera();
+  /// Of a free view that looks through a camera: all of its image, in the middle of the frame.
+  const QVector4D& ViewThroughCamera();
   void CollectPoints( const ZEK::VSelection& i_rSelection );
   void SelectAndHighlight();
   bool IsBand() const;
@@ -151,6 +153,16 @@ private:
     bool bCollected = false; ///< nothing was drawn meanwhile
   };
   VTileWalk m_TileWalk;
+  /// The camera that a free view last looked through, and how.
+  struct VThrough
+  {
+    QString URN;
+    std::uint64_t Cameras = 0; ///< generation of the scene's cameras
+    QSize Size;
+    bool bRotated = false, bSnapped = false;
+    QVector4D View2D;
+  };
+  VThrough m_Through;
   std::unique_ptr< QOpenGLFramebufferObject > m_pSelectionTarget;
   std::unique_ptr< QOpenGLFramebufferObject > m_pOutlineTarget;
   VFrameInput m_Input;
