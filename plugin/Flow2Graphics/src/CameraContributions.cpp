@@ -155,7 +155,7 @@ void FindCameraContributions( std::span< const VContributor > i_Cameras, const V
   }
 }
 
-std::uint32_t ContributionColour( double i_Error )
+std::uint32_t ReprojectionErrorColour( double i_Error )
 {
   struct VStop
   {

@@ -40,7 +40,7 @@ QVariantMap VContributionTileData::AdditionalData( const QString& i_rURN ) const
   if ( m_pContributions->OfCamera( i_rURN.toStdString(), Error ) )
   {
     Data["contributes"] = true;
-    Data["errorColor"] = QString( "#%1" ).arg( ContributionColour( Error ), 6, 16, QLatin1Char( '0' ) );
+    Data["errorColor"] = QString( "#%1" ).arg( ReprojectionErrorColour( Error ), 6, 16, QLatin1Char( '0' ) );
     if ( !std::isnan( Error ) )
     {
       Data["error"] = Error;

@@ -32,12 +32,13 @@ QString ErrorText( const VContributionReport::VRow& i_rRow )
 
 QVariantMap RowOf( const VContributionReport::VRow& i_rRow )
 {
-  QVariantMap Row{ { "urn", QString::fromStdString( i_rRow.Camera ) },
-                   { "reconstruction", i_rRow.Reconstruction },
-                   { "id", i_rRow.Id },
-                   { "label", QString::fromStdString( i_rRow.Label ) },
-                   { "errorText", ErrorText( i_rRow ) },
-                   { "color", QString( "#%1" ).arg( ContributionColour( i_rRow.Error ), 6, 16, QLatin1Char( '0' ) ) } };
+  QVariantMap Row{
+      { "urn", QString::fromStdString( i_rRow.Camera ) },
+      { "reconstruction", i_rRow.Reconstruction },
+      { "id", i_rRow.Id },
+      { "label", QString::fromStdString( i_rRow.Label ) },
+      { "errorText", ErrorText( i_rRow ) },
+      { "color", QString( "#%1" ).arg( ReprojectionErrorColour( i_rRow.Error ), 6, 16, QLatin1Char( '0' ) ) } };
   Row["error"] = i_rRow.State == EContribution::Measured ? QVariant( i_rRow.Error ) : QVariant();
   return Row;
 }
@@ -49,10 +50,15 @@ bool VContributionReport::VRow::operator==( const VRow& i_rOther ) const
          Id == i_rOther.Id && State == i_rOther.State && SameError( Error, i_rOther.Error );
 }
 
+bool VContributionReport::VSeenBy::operator==( const VSeenBy& i_rOther ) const
+{
+  return Camera == i_rOther.Camera && SameError( Error, i_rOther.Error );
+}
+
 bool VContributionReport::operator==( const VContributionReport& i_rOther ) const
 {
   return bOfCameras == i_rOther.bOfCameras && Selected == i_rOther.Selected && Cameras == i_rOther.Cameras &&
-         Total == i_rOther.Total && Rows == i_rOther.Rows && Missing == i_rOther.Missing;
+         SeenBy == i_rOther.SeenBy && Total == i_rOther.Total && Rows == i_rOther.Rows && Missing == i_rOther.Missing;
 }
 
 VContributions::VContributions( std::shared_ptr< ZEK::IPostalService > i_pPostal )
@@ -68,20 +74,13 @@ QString VContributions::Summary() const
   QStringList Lines;
   if ( m_Shown.Selected > 0 && !m_Shown.bOfCameras )
   {
-    std::vector< std::string > Names;
-    for ( const auto& rRow : m_Shown.Rows )
-    {
-      Names.push_back( rRow.Camera );
-    }
-    std::sort( Names.begin(), Names.end() );
-    const auto Count = std::unique( Names.begin(), Names.end() ) - Names.begin();
-    Lines << tr( "Seen by %1 of %2 cameras" ).arg( Count ).arg( m_Shown.Cameras );
+    Lines << tr( "Seen by %1 of %2 cameras" ).arg( m_Shown.SeenBy.size() ).arg( m_Shown.Cameras );
   }
   else if ( m_Shown.Selected > 0 )
   {
     Lines << tr( "Contributes to %1 reconstructions" ).arg( m_Shown.Total );
   }
-  if ( m_Shown.Total > m_Shown.Rows.size() )
+  if ( !m_Shown.Rows.empty() && m_Shown.Total > m_Shown.Rows.size() )
   {
     Lines << tr( "The %1 greatest errors of %2" ).arg( m_Shown.Rows.size() ).arg( m_Shown.Total );
   }
@@ -94,17 +93,13 @@ QString VContributions::Summary() const
 
 bool VContributions::OfCamera( const std::string& i_rURN, double& o_rError ) const
 {
-  bool bFound = false;
-  o_rError = std::nan( "" );
-  for ( const auto& rRow : m_Shown.Rows )
-  {
-    if ( !m_Shown.bOfCameras && rRow.Camera == i_rURN )
-    {
-      bFound = true;
-      o_rError = std::fmax( o_rError, rRow.Error ); // passes over what is no number
-    }
-  }
-  return bFound;
+  const auto It = std::find_if( m_Shown.SeenBy.begin(), m_Shown.SeenBy.end(),
+                                [&]( const VContributionReport::VSeenBy& i_rSeenBy )
+                                {
+                                  return i_rSeenBy.Camera == i_rURN;
+                                } );
+  o_rError = It == m_Shown.SeenBy.end() ? std::nan( "" ) : It->Error;
+  return It != m_Shown.SeenBy.end();
 }
 
 void VContributions::watch()
@@ -118,6 +113,22 @@ void VContributions::watch()
 void VContributions::unwatch()
 {
   m_Watchers.fetch_sub( 1, std::memory_order_relaxed );
+}
+
+void VContributions::watchRows()
+{
+  const bool bFirst = m_RowWatchers.fetch_add( 1, std::memory_order_relaxed ) == 0;
+  watch();
+  if ( bFirst && m_OnWatched )
+  {
+    m_OnWatched();
+  }
+}
+
+void VContributions::unwatchRows()
+{
+  m_RowWatchers.fetch_sub( 1, std::memory_order_relaxed );
+  unwatch();
 }
 
 void VContributions::Offer( const VContributionReport& i_rReport )

@@ -58,6 +58,8 @@ void VFlowContributions::Update( const ZEK::IFlowState& i_rState )
 {
   const bool bWatched = m_pTo->IsWatched();
   bool bChanged = std::exchange( m_bWatched, bWatched ) != bWatched;
+  const bool bRows = m_pTo->AreRowsWatched();
+  bChanged = std::exchange( m_bRowsWatched, bRows ) != bRows || bChanged;
   if ( !bWatched )
   {
     return;
@@ -72,6 +74,8 @@ void VFlowContributions::Update( const ZEK::IFlowState& i_rState )
     return;
   }
   FindSelected();
+  FindContributors();
+  FillSeenBy();
   FillRows();
   m_pTo->Offer( m_Report );
 }
@@ -175,10 +179,9 @@ void VFlowContributions::FindSelected()
   }
 }
 
-void VFlowContributions::FillRows()
+void VFlowContributions::FindContributors()
 {
   m_Found.clear();
-  m_Report.Rows.clear();
   m_Contributors.clear();
   for ( const VTaken& rTaken : m_Taken )
   {
@@ -195,18 +198,46 @@ void VFlowContributions::FillRows()
     {
       FindCameraContributions( m_Contributors, *pSet, Camera, m_Found );
     }
-    const std::size_t Count = std::min( m_Found.size(), MostRows );
-    std::partial_sort( m_Found.begin(), m_Found.begin() + static_cast< std::ptrdiff_t >( Count ), m_Found.end(),
-                       GoesBefore );
-    for ( std::size_t Index = 0; Index < Count; ++Index )
-    {
-      const VContribution& rFound = m_Found[Index];
-      m_Report.Rows.push_back( { m_Taken[rFound.Camera].pCamera->GetName(), LabelOf( rFound.Reconstruction ),
-                                 rFound.Reconstruction, pSet->Items[rFound.Reconstruction].Id, rFound.State,
-                                 rFound.Error } );
-    }
   }
   m_Report.Total = m_Found.size();
+}
+
+/// Of all that was found, however long the list is. Texts keep their memory from frame to frame.
+void VFlowContributions::FillSeenBy()
+{
+  m_Worst.assign( m_Taken.size(), { false, std::nan( "" ) } );
+  std::size_t Count = 0;
+  for ( const VContribution& rFound : m_Found )
+  {
+    auto& [rbSees, rError] = m_Worst[rFound.Camera];
+    Count += !m_Report.bOfCameras && !std::exchange( rbSees, true );
+    rError = std::fmax( rError, rFound.Error ); // passes over what is no number
+  }
+  m_Report.SeenBy.resize( Count );
+  for ( std::size_t Camera = 0, To = 0; To < Count; ++Camera )
+  {
+    if ( m_Worst[Camera].first )
+    {
+      m_Report.SeenBy[To].Camera = m_Taken[Camera].pCamera->GetName();
+      m_Report.SeenBy[To++].Error = m_Worst[Camera].second;
+    }
+  }
+}
+
+void VFlowContributions::FillRows()
+{
+  m_Report.Rows.clear();
+  const auto* const pSet = ZEK::FlowPayload< VReconstructionSet >( m_Set.Get() );
+  const std::size_t Count = m_bRowsWatched && pSet ? std::min( m_Found.size(), MostRows ) : 0;
+  std::partial_sort( m_Found.begin(), m_Found.begin() + static_cast< std::ptrdiff_t >( Count ), m_Found.end(),
+                     GoesBefore );
+  for ( std::size_t Index = 0; Index < Count; ++Index )
+  {
+    const VContribution& rFound = m_Found[Index];
+    m_Report.Rows.push_back( { m_Taken[rFound.Camera].pCamera->GetName(), LabelOf( rFound.Reconstruction ),
+                               rFound.Reconstruction, pSet->Items[rFound.Reconstruction].Id, rFound.State,
+                               rFound.Error } );
+  }
 }
 
 std::string VFlowContributions::LabelOf( std::uint32_t i_Reconstruction ) const

@@ -51,7 +51,7 @@ QVariantMap VFlowScene::SceneReport()
   if ( !m_bReported )
   {
     m_bReported = true;
-    m_pContributions->watch();
+    m_pContributions->watchRows();
   }
   m_pContributions->Flush();
   return { { "contributions", m_pContributions->Rows() } };
@@ -86,8 +86,14 @@ void VFlowScene::CreateRenderTypes()
   m_PostList = { std::make_shared< MoxelGraphics::VRenderOutlines >( *this ) };
   m_pBackdrop = pBackdrop;
   m_RenderList = { pFloor,     pPlates, pReconstructions, pAssignments, pBackdrop,
-                   m_pCameras, pData3D, pData2D,          pVolume,      pAxis };
-  m_FlowRenderTypes = { pFloor, pPlates, pReconstructions, pVolume, m_pCameraProvider, pAssignments, m_pCameras,
+                   m_pCameras, pData2D, pData3D,          pVolume,      pAxis };
+  m_FlowRenderTypes = { pFloor,
+                        pPlates,
+                        pReconstructions,
+                        pVolume,
+                        m_pCameraProvider,
+                        pAssignments,
+                        m_pCameras,
                         std::make_shared< VFlowContributions >( *this, m_pCameraProvider, m_pContributions ) };
 }
 

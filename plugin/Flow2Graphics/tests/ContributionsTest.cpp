@@ -220,7 +220,7 @@ TEST( Contributions, ErrorsHaveTheSameColoursEverywhere )
       { 2, 0xE88430 }, { 3, 0xE03830 },  { 1e30, 0xE03830 }, { std::nan( "" ), 0x808489 } };
   for ( const auto& [Error, Colour] : Known )
   {
-    EXPECT_EQ( ContributionColour( Error ), Colour ) << Error;
+    EXPECT_EQ( ReprojectionErrorColour( Error ), Colour ) << Error;
   }
 }
 
@@ -326,6 +326,10 @@ TEST_F( ContributionFeed, TheSelectionTellsWhoSeesIt )
   EXPECT_EQ( Shown().Selected, 0u ) << "nobody watches";
   m_Scene.Contributions()->watch();
   m_Scene.ProcessPending();
+  EXPECT_EQ( m_Scene.Contributions()->Summary(), "Seen by 3 of 3 cameras" );
+  EXPECT_TRUE( Shown().Rows.empty() ) << "nobody watches the rows";
+  m_Scene.Contributions()->watchRows();
+  m_Scene.ProcessPending();
   EXPECT_THAT( Cameras(), testing::ElementsAre( "b", "a", "c" ) );
   EXPECT_NEAR( Shown().Rows[0].Error, 5, 1e-3 );
   EXPECT_NEAR( Shown().Rows[1].Error, 0, 1e-3 );
@@ -411,4 +415,31 @@ TEST_F( ContributionFeed, TilesAreMarkedBesideWhatElseIsKnown )
   EXPECT_NEAR( B["error"].toDouble(), 5, 1e-3 );
   EXPECT_EQ( B["errorColor"], "#e03830" );
   EXPECT_EQ( C, ( QVariantMap{ { "name", "c" } } ) );
+}
+
+TEST_F( ContributionFeed, CamerasCountBeyondTheRowsThatFit )
+{
+  VCentroidSet Far;
+  Far.Centroids.assign( 600, { 0, 0, 4, 0, 0, 0, 0 } );
+  m_Items[1] = m_Maker.Device< FlowCentroidSet >( Far, "a" );
+  m_Items[2] = m_Maker.Device< FlowCentroidAssignmentSet >( { std::vector< i32 >( 600, 0 ) }, "a" );
+  ShowAgain();
+  VContributions& rContributions = *m_Scene.Contributions();
+  rContributions.watchRows();
+  Select( { Point } );
+  EXPECT_EQ( Shown().Rows.size(), 500u );
+  EXPECT_EQ( Shown().Rows.back().Camera, "a" ) << "the others have no row";
+  EXPECT_EQ( rContributions.Summary(), "Seen by 3 of 3 cameras\nThe 500 greatest errors of 602" );
+  double Error = 0;
+  EXPECT_TRUE( rContributions.OfCamera( "b", Error ) );
+  EXPECT_NEAR( Error, 5, 1e-3 );
+  EXPECT_TRUE( rContributions.OfCamera( "c", Error ) );
+  EXPECT_TRUE( std::isnan( Error ) );
+  // The list is closed, and the marks of the tiles stay.
+  rContributions.watch();
+  rContributions.unwatchRows();
+  Select( { Point, Marker } );
+  EXPECT_TRUE( Shown().Rows.empty() );
+  EXPECT_TRUE( rContributions.OfCamera( "b", Error ) );
+  EXPECT_EQ( rContributions.Summary(), "Seen by 3 of 3 cameras" );
 }

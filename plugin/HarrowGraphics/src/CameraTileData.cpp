@@ -1,6 +1,7 @@
 #include "CameraTileData.h"
 
 #include <CoreMoxelTypes/Camera.h>
+#include <Flow2Graphics/CameraContributions.h>
 #include <HarrowPluginInterface/IHarrowServices.h>
 
 #include <algorithm>
@@ -39,34 +40,6 @@ T Setting( const CoreMoxelTypes::VCameraSettings* i_pSettings, const char* i_pKe
   return i_Default;
 }
 
-/// On a scale of pixels that is the same for all cameras at all times: calm up to a quarter, alarming from one on.
-QColor ErrorColour( double i_Pixels )
-{
-  struct VStop
-  {
-    double Pixels;
-    std::array< double, 3 > Colour;
-  };
-  constexpr std::array< VStop, 4 > Stops{ { { 0.0, { 0.50, 0.82, 0.78 } },
-                                            { 0.25, { 0.50, 0.82, 0.78 } },
-                                            { 0.5, { 0.93, 0.90, 0.55 } },
-                                            { 1.0, { 0.93, 0.36, 0.27 } } } };
-  const double Pixels = std::clamp( i_Pixels, Stops.front().Pixels, Stops.back().Pixels );
-  std::size_t Upper = 1;
-  while ( Upper + 1 < Stops.size() && Stops[Upper].Pixels < Pixels )
-  {
-    ++Upper;
-  }
-  const VStop& rLow = Stops[Upper - 1];
-  const VStop& rHigh = Stops[Upper];
-  const double Share = ( Pixels - rLow.Pixels ) / ( rHigh.Pixels - rLow.Pixels );
-  const auto Part = [&]( std::size_t i_Index )
-  {
-    return static_cast< float >( std::lerp( rLow.Colour[i_Index], rHigh.Colour[i_Index], Share ) );
-  };
-  return QColor::fromRgbF( Part( 0 ), Part( 1 ), Part( 2 ) );
-}
-
 void AddTemperatures( const VCameraHealthItems& i_rItems, QVariantMap& io_rData )
 {
   const auto* const pDetails = i_rItems.pDetails;
@@ -91,7 +64,8 @@ void AddHealth( const CoreMoxelTypes::VCameraCalibrationHealth& i_rHealth, QVari
   if ( std::isfinite( i_rHealth.AvgReprojectionError ) )
   {
     io_rData["avgReprojectionError"] = i_rHealth.AvgReprojectionError;
-    io_rData["avgReprojectionErrorColor"] = ErrorColour( i_rHealth.AvgReprojectionError );
+    io_rData["avgReprojectionErrorColor"] =
+        QColor( Flow2Graphics::ReprojectionErrorColour( i_rHealth.AvgReprojectionError ) );
   }
   io_rData["avgReprojectionErrorScore"] = i_rHealth.Score;
   io_rData["avgReprojectionErrorScoreConfidence"] = i_rHealth.ScoreConfidence;

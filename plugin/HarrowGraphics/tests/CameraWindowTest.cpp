@@ -361,18 +361,17 @@ TEST( CameraTileData, TellsWhatItemsSayAndNothingElse )
   {
     EXPECT_EQ( Data[pKey], rValue ) << pKey;
   }
-  // The colour depends on the error alone, and warns more the greater it is.
-  const auto Red = []( double i_Error )
+  // The colour depends on the error alone, and is that of an error anywhere else.
+  const auto Colour = []( double i_Error )
   {
     VCameraCalibrationHealth One;
     One.AvgReprojectionError = i_Error;
     return HarrowGraphics::CameraTileData( { nullptr, nullptr, &One }, nullptr )["avgReprojectionErrorColor"]
         .value< QColor >();
   };
-  EXPECT_EQ( Red( 0 ), Red( 0.2 ) );
-  EXPECT_GT( Red( 0.5 ).red(), Red( 0.2 ).red() );
-  EXPECT_LT( Red( 1 ).green(), Red( 0.5 ).green() );
-  EXPECT_EQ( Red( 1 ), Red( 1e9 ) );
-  EXPECT_FALSE( Red( std::nan( "" ) ).isValid() );
+  EXPECT_EQ( Colour( 0 ), QColor( 0x40, 0xC0, 0x48 ) );
+  EXPECT_EQ( Colour( 1 ), QColor( 0xF0, 0xD0, 0x30 ) );
+  EXPECT_EQ( Colour( 1e9 ), QColor( 0xE0, 0x38, 0x30 ) );
+  EXPECT_FALSE( Colour( std::nan( "" ) ).isValid() );
   EXPECT_FALSE( HarrowGraphics::CameraTileData( {}, nullptr ).contains( "currentTemperature" ) );
 }

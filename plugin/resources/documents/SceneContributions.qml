@@ -12,6 +12,9 @@ Rectangle {
     readonly property bool known: contributions !== null && contributions.selected > 0
     readonly property int margin: 8
     property bool raysAreOurs: false
+    // Which contributions count this list among those who watch, and whether for the rows too.
+    property var watched: null
+    property bool rowsWatched: false
 
     // The camera that was clicked in the list.
     signal cameraClicked(string urn)
@@ -32,6 +35,18 @@ Rectangle {
         }
     }
 
+    function watch(what, rows) {
+        const before = watched, beforeRows = rowsWatched
+        if (before === what && beforeRows === rows)
+            return
+        watched = what
+        rowsWatched = rows
+        if (what)
+            rows ? what.watchRows() : what.watch()
+        if (before)
+            beforeRows ? before.unwatchRows() : before.unwatch()
+    }
+
     visible: known
     width: 230
     height: Math.min(mostHeight, column.height + 2 * margin)
@@ -41,13 +56,15 @@ Rectangle {
     clip: true
 
     // Without a selection that type would show the rays of everything.
-    onOpenChanged: showRays(open && known)
+    onOpenChanged: {
+        showRays(open && known)
+        watch(contributions, open)
+    }
     onKnownChanged: showRays(open && known)
-    onContributionsChanged: if (contributions) contributions.watch()
+    onContributionsChanged: watch(contributions, open)
     Component.onDestruction: {
         showRays(false)
-        if (contributions)
-            contributions.unwatch()
+        watch(null, false)
     }
 
     Column {

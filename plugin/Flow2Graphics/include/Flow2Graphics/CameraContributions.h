@@ -71,8 +71,8 @@ void FindCameraContributions( std::span< const VContributor > i_Cameras,
                               const CoreMoxelTypes::VReconstructionSet& i_rSet, std::uint32_t i_Camera,
                               std::vector< VContribution >& io_rFound );
 
-/// 0xRRGGBB on a scale that is the same everywhere: green at 0 px, yellow at 1 px, red from 3 px on, mixed in between;
-/// grey for what is no number.
-std::uint32_t ContributionColour( double i_Error );
+/// Of an error in px, 0xRRGGBB, on a scale that is the same everywhere: green at 0 px, yellow at 1 px, red from 3 px
+/// on, mixed in between; grey for what is no number.
+std::uint32_t ReprojectionErrorColour( double i_Error );
 
 } // namespace Flow2Graphics

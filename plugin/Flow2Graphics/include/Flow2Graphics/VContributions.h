@@ -31,11 +31,19 @@ struct VContributionReport
 
     bool operator==( const VRow& i_rOther ) const;
   };
+  struct VSeenBy
+  {
+    std::string Camera; ///< URN
+    double Error = 0;   ///< the greatest that is known, px; no number where none is
+
+    bool operator==( const VSeenBy& i_rOther ) const;
+  };
   bool bOfCameras = false;            ///< cameras are selected, and no reconstruction
   std::size_t Selected = 0;           ///< reconstructions or cameras
   std::size_t Cameras = 0;            ///< all there are
+  std::vector< VSeenBy > SeenBy;      ///< the cameras that see a selected reconstruction, all of them
   std::size_t Total = 0;              ///< rows that there would be without a limit
-  std::vector< VRow > Rows;           ///< the greatest errors first
+  std::vector< VRow > Rows;           ///< the greatest errors first; empty while nobody watches them
   std::vector< std::string > Missing; ///< what is selected but not in the frame, as sentences
 
   bool operator==( const VContributionReport& i_rOther ) const;
@@ -44,7 +52,7 @@ struct VContributionReport
 /// The answer to "Which cameras see this?" for documents and reports. Follows selection and frames while somebody
 /// watches, at most ten times a second.
 ///
-/// Thread: GUI, but for `Offer` and `IsWatched`. Held by shared pointer.
+/// Thread: GUI, but for `Offer`, `IsWatched` and `AreRowsWatched`. Held by shared pointer.
 class VContributions : public QObject, public std::enable_shared_from_this< VContributions >
 {
   Q_OBJECT
@@ -67,15 +75,19 @@ public:
   /// The greatest error of a camera that sees the selection, px; false for one that does not.
   bool OfCamera( const std::string& i_rURN, double& o_rError ) const;
 
-  /// Whoever shows the list counts himself in and out.
+  /// Whoever shows which cameras see the selection counts himself in and out.
   Q_INVOKABLE void watch();
   Q_INVOKABLE void unwatch();
+  /// And whoever shows the rows too, in these instead.
+  Q_INVOKABLE void watchRows();
+  Q_INVOKABLE void unwatchRows();
   /// Takes at once what waits for its turn.
   void Flush();
-  /// Is called when the first one begins to watch.
+  /// Is called when the first one begins to watch, and when the first one begins to watch rows.
   void SetOnWatched( std::function< void() > i_OnWatched ) { m_OnWatched = std::move( i_OnWatched ); }
 
   bool IsWatched() const { return m_Watchers.load( std::memory_order_relaxed ) > 0; }
+  bool AreRowsWatched() const { return m_RowWatchers.load( std::memory_order_relaxed ) > 0; }
   /// Thread: any. Does nothing with what was offered before.
   void Offer( const VContributionReport& i_rReport );
 
@@ -87,7 +99,7 @@ private:
   void Take();
 
   std::shared_ptr< ZEK::IPostalService > m_pPostal;
-  std::atomic< int > m_Watchers{ 0 };
+  std::atomic< int > m_Watchers{ 0 }, m_RowWatchers{ 0 };
   std::function< void() > m_OnWatched;
   QTimer m_Rest; ///< runs while it is too early to take another report
   std::mutex m_Guard;

@@ -7,6 +7,7 @@
 #include <MoxelGraphics/VMoxelScene.h>
 
 #include <memory>
+#include <utility>
 #include <vector>
 
 namespace Flow2Graphics
@@ -33,6 +34,8 @@ private:
   };
   bool TakeCameras();
   void FindSelected();
+  void FindContributors();
+  void FillSeenBy();
   void FillRows();
   std::string LabelOf( std::uint32_t i_Reconstruction ) const;
 
@@ -44,9 +47,10 @@ private:
   std::vector< VContributor > m_Contributors;
   std::vector< std::uint32_t > m_Reconstructions, m_Cameras; ///< selected ones
   std::vector< VContribution > m_Found;
+  std::vector< std::pair< bool, double > > m_Worst; ///< by camera: whether it sees the selection, and its error
   VContributionReport m_Report;
   std::uint64_t m_MarksGeneration = 0;
-  bool m_bWatched = false;
+  bool m_bWatched = false, m_bRowsWatched = false;
 };
 
 } // namespace Flow2Graphics
