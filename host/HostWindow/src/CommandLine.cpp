@@ -174,8 +174,10 @@ void AddActions( CLI::App& io_rApp, VRenderOptions& o_rRender )
 
 void AddRender( CLI::App& io_rApp, VRenderOptions& o_rRender )
 {
-  io_rApp.add_option( "--window", o_rRender.Window, "The kind of window, such as 3d" )->capture_default_str();
-  io_rApp.add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC, a folder of cameras)" )
+  io_rApp.add_option( "--window", o_rRender.Window, "The kind of window, such as 3d or cameras" )
+      ->capture_default_str();
+  io_rApp
+      .add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC, BVH, a folder of cameras)" )
       ->expected( 1, -1 )
       ->capture_default_str()
       ->type_name( "simulated|FILE" );
@@ -238,7 +240,8 @@ std::string CheckTogether( const VCommandLine& i_rLine )
 VParseResult ParseCommandLine( int i_Count, const char* const* i_ppArguments, VCommandLine& o_rLine )
 {
   CLI::App App(
-      "harrow shows motion-capture data: a simulated capture, or recordings (C3D, TRC, folders of what cameras saw).\n"
+      "harrow shows motion-capture data: a simulated capture, or recordings (C3D, TRC, BVH, folders of what cameras "
+      "saw).\n"
       "Without a subcommand it opens a window with a 3D view of the simulated capture.",
       "harrow" );
   App.set_version_flag( "--version", "harrow 1.0.0" );

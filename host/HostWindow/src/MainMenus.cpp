@@ -41,7 +41,7 @@ void VMainWindow::MakeFileMenu()
   pMenu->setToolTipsVisible( true );
   QAction* pOpen = pMenu->addAction( tr( "&Open…" ), this, &VMainWindow::AskForFiles );
   pOpen->setShortcut( QKeySequence::Open );
-  pOpen->setToolTip( tr( "Open recordings in C3D and TRC files" ) );
+  pOpen->setToolTip( tr( "Open recordings in C3D, TRC and BVH files" ) );
   QAction* pFolder = pMenu->addAction( tr( "Open &Folder…" ), this, &VMainWindow::AskForFolder );
   pFolder->setShortcut( QKeySequence( Qt::CTRL | Qt::SHIFT | Qt::Key_O ) );
   pFolder->setToolTip( tr( "Open a folder of what cameras saw" ) );
@@ -273,8 +273,8 @@ void VMainWindow::FillPluginMenus()
 void VMainWindow::ShowAbout()
 {
   QMessageBox::about( this, tr( "About Harrow" ),
-                      tr( "<b>Harrow %1</b><p>Shows motion-capture data: a simulated capture, and recordings in C3D "
-                          "and TRC files.</p><p>Qt %2</p>" )
+                      tr( "<b>Harrow %1</b><p>Shows motion-capture data: a simulated capture, and recordings in C3D, "
+                          "TRC and BVH files and folders of what cameras saw.</p><p>Qt %2</p>" )
                           .arg( QApplication::applicationVersion(), qVersion() ) );
 }
 

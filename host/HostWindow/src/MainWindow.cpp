@@ -27,7 +27,7 @@ QStringList DroppedFiles( const QMimeData* i_pData )
   {
     const QString Path = rUrl.toLocalFile();
     const QString Suffix = QFileInfo( Path ).suffix().toLower();
-    if ( Suffix == "c3d" || Suffix == "trc" || QFileInfo( Path ).isDir() )
+    if ( Suffix == "c3d" || Suffix == "trc" || Suffix == "bvh" || QFileInfo( Path ).isDir() )
     {
       Paths << Path;
     }
@@ -233,7 +233,7 @@ void VMainWindow::AskForFiles()
   const auto Recent = m_rSession.Host().Preferences().RecentFiles();
   const QString Folder = Recent.isEmpty() ? QString() : QFileInfo( Recent.front() ).absolutePath();
   OpenFiles( QFileDialog::getOpenFileNames( this, tr( "Open Recordings" ), Folder,
-                                            tr( "Recordings (*.c3d *.C3D *.trc *.TRC);;All files (*)" ) ) );
+                                            tr( "Recordings (*.c3d *.C3D *.trc *.TRC *.bvh *.BVH);;All files (*)" ) ) );
 }
 
 void VMainWindow::AskForFolder()

@@ -196,7 +196,8 @@ QJsonObject DescribeView( VSession& i_rSession, const VRenderOptions& i_rRender,
   Report["selection"] = DescribeSelection( rSelection, ZEK::ISelectionService::EPrimary );
   Report["preselection"] = DescribeSelection( rSelection, ZEK::ISelectionService::ESecondary );
   const QVariantMap Frame = i_rView.FrameReport();
-  for ( const char* pMember : { "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "notice", "contributions" } )
+  for ( const char* pMember :
+        { "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "notice", "contributions" } )
   {
     Report[pMember] = ToJson( Frame.value( pMember ) );
   }

@@ -397,6 +397,12 @@ TEST_F( MainWindow, RecordingsCanBeDroppedAndOtherFilesCannot )
       {
         return m_pSession->HasRecording();
       } ) );
+  EXPECT_TRUE( Drop( "/missing.BVH" ) );
+  EXPECT_TRUE( SpinUntil(
+      [&]
+      {
+        return m_pWindow->Messages().Text().contains( "missing.BVH" );
+      } ) );
 }
 
 TEST( Session, ShowsTheFrameNearestToATimeAndTakesTheUpAxisGiven )

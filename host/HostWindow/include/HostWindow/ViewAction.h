@@ -89,9 +89,9 @@ struct VViewAction
 /// The names of the view types, by their index.
 const QStringList& ViewTypeNames();
 
-/// Reads the value of one of the options "--click", "--double-click", "--band", "--hover", "--drag", "--wheel", "--key", "--view",
-/// "--set", "--select", "--tracking" and "--command". An empty text means success, anything else says what is wrong
-/// with the value.
+/// Reads the value of one of the options "--click", "--double-click", "--band", "--hover", "--drag", "--wheel",
+/// "--key", "--view", "--set", "--select", "--tracking" and "--command". An empty text means success, anything else
+/// says what is wrong with the value.
 std::string ParseViewAction( const std::string& i_rOption, const std::string& i_rText, VViewAction& o_rAction );
 
 /// Reads a list such as "shift,ctrl"; "none" is the empty set. An empty text means success.
