@@ -13,6 +13,7 @@ extern "C"
 #include <libswscale/swscale.h>
 }
 
+#include <atomic>
 #include <filesystem>
 #include <memory>
 #include <string>
@@ -34,7 +35,9 @@ using VFFmpegPtr = std::unique_ptr< T, VFFmpegFree >;
 std::string FFmpegError( int i_Error );
 
 /// Opens a file, and only that: no other file or address that its content may name. The best video stream is in
-/// `o_rStream`, and packets of all others are left out. Less than 0 is an error of FFmpeg's.
-int OpenVideo( const std::filesystem::path& i_rPath, VFFmpegPtr< AVFormatContext >& o_rInput, int& o_rStream );
+/// `o_rStream`, and packets of all others are left out. Less than 0 is an error of FFmpeg's. `i_pStop` lives as long as
+/// what was opened and ends its waiting and reading when it is set.
+int OpenVideo( const std::filesystem::path& i_rPath, VFFmpegPtr< AVFormatContext >& o_rInput, int& o_rStream,
+               const std::atomic< bool >* i_pStop = nullptr );
 
 } // namespace HostVideo

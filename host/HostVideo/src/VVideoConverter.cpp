@@ -182,18 +182,19 @@ bool VVideoConverter::PrepareScaler( const VScaled& i_rFor )
     m_pScaler.reset();
     return false;
   }
-  const int* const pRules = sws_getCoefficients( i_rFor.Height < HighDefinition ? SWS_CS_ITU601 : SWS_CS_ITU709 );
+  const int* const pRules = sws_getCoefficients( i_rFor.bHighDefinition ? SWS_CS_ITU709 : SWS_CS_ITU601 );
   constexpr int One = 1 << 16;
   (void)sws_setColorspaceDetails( pScaler, pRules, i_rFor.bFullRange ? 1 : 0, pRules, 0, 0, One, One );
   m_ScalerFor = i_rFor;
   return true;
 }
 
-bool VVideoConverter::Scale( const AVFrame& i_rPicture, VVideoFrame& o_rFrame )
+bool VVideoConverter::Scale( const AVFrame& i_rPicture, int i_QuarterTurns, VVideoFrame& o_rFrame )
 {
   const auto From = PlainForm( static_cast< AVPixelFormat >( i_rPicture.format ) );
   const int Width = i_rPicture.width, Height = i_rPicture.height;
-  if ( !PrepareScaler( { Width, Height, From, IsFullRange( i_rPicture ) } ) )
+  const bool bHighDefinition = ( i_QuarterTurns % 2 != 0 ? Width : Height ) >= HighDefinition; // as shown
+  if ( !PrepareScaler( { Width, Height, From, IsFullRange( i_rPicture ), bHighDefinition } ) )
   {
     return false;
   }
@@ -220,7 +221,7 @@ bool VVideoConverter::Convert( const AVFrame& i_rPicture, int i_QuarterTurns, VV
   const VForm* const pForm = FormOf( i_rPicture );
   if ( !pForm || ( i_QuarterTurns != 0 && pForm->To != EPixelFormat::I420 ) )
   {
-    if ( !Scale( i_rPicture, o_rFrame ) )
+    if ( !Scale( i_rPicture, i_QuarterTurns, o_rFrame ) )
     {
       return false;
     }

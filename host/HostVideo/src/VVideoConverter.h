@@ -27,12 +27,12 @@ private:
   {
     int Width = 0, Height = 0;
     AVPixelFormat From = AV_PIX_FMT_NONE;
-    bool bFullRange = false;
+    bool bFullRange = false, bHighDefinition = false;
 
     friend bool operator==( const VScaled&, const VScaled& ) = default;
   };
   bool PrepareScaler( const VScaled& i_rFor );
-  bool Scale( const AVFrame& i_rPicture, CoreMoxelTypes::VVideoFrame& o_rFrame );
+  bool Scale( const AVFrame& i_rPicture, int i_QuarterTurns, CoreMoxelTypes::VVideoFrame& o_rFrame );
 
   VVideoBuffers m_Buffers;
   VFFmpegPtr< SwsContext > m_pScaler;

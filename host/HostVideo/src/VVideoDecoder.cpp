@@ -1,6 +1,7 @@
 #include "VVideoDecoder.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace HostVideo
 {
@@ -18,9 +19,11 @@ bool VVideoDecoder::Open( int i_Threads, std::string& o_rMessage )
   m_pPicture.reset( av_frame_alloc() );
   m_pCodec.reset();
   m_bDrained = m_bPending = false;
+  m_bLanded = true;
+  m_ReadError = 0;
   m_Last = -1;
   m_Floor = m_Counted = 0;
-  int Result = OpenVideo( m_pClip->Path, m_pInput, m_Stream );
+  int Result = OpenVideo( m_pClip->Path, m_pInput, m_Stream, &m_rStop );
   if ( Result >= 0 )
   {
     const AVCodecParameters& rParameters = *m_pInput->streams[m_Stream]->codecpar;
@@ -52,7 +55,7 @@ bool VVideoDecoder::Receive()
   {
     return false;
   }
-  while ( true )
+  while ( !m_rStop )
   {
     av_frame_unref( m_pPicture.get() );
     const int Received = avcodec_receive_frame( m_pCodec.get(), m_pPicture.get() );
@@ -70,14 +73,22 @@ bool VVideoDecoder::Receive()
       av_packet_unref( m_pPacket.get() );
       Read = m_bDrained ? AVERROR_EOF : av_read_frame( m_pInput.get(), m_pPacket.get() );
     } while ( Read >= 0 && m_pPacket->stream_index != m_Stream );
-    if ( Read < 0 )
+    if ( Read < 0 && !m_bDrained )
     {
+      // A file that was cut off ends as well; only what the system failed to read is told apart.
+      const AVIOContext* const pFile = m_pInput->pb;
+      m_ReadError = pFile && pFile->error < 0 && pFile->error != AVERROR_EOF ? pFile->error : 0;
       m_bDrained = true;
+    }
+    if ( Read >= 0 && !std::exchange( m_bLanded, true ) )
+    {
+      m_bMissed = ( m_pPacket->flags & AV_PKT_FLAG_KEY ) == 0 || m_pPacket->pts > m_SoughtStamp;
     }
     // What is wrong with a packet shows as a frame that does not come.
     (void)avcodec_send_packet( m_pCodec.get(), Read < 0 ? nullptr : m_pPacket.get() );
     av_packet_unref( m_pPacket.get() );
   }
+  return false;
 }
 
 std::int64_t VVideoDecoder::NumberOf( const AVFrame& i_rPicture )
@@ -144,19 +155,15 @@ bool VVideoDecoder::SeekToKey( std::size_t i_Key )
     return false;
   }
   avcodec_flush_buffers( m_pCodec.get() );
-  m_bDrained = m_bPending = false;
+  m_bDrained = m_bPending = m_bLanded = m_bMissed = false;
+  m_ReadError = 0;
+  m_SoughtStamp = rKey.Stamp;
   m_Last = -1;
   m_Floor = rKey.Frame;
   return true;
 }
 
-bool VVideoDecoder::Rewind()
-{
-  std::string Message;
-  return Open( m_Threads, Message );
-}
-
-bool VVideoDecoder::Seek( std::int64_t i_Frame )
+bool VVideoDecoder::Seek( std::int64_t i_Frame, std::string& o_rMessage )
 {
   // Some forms of files find a key by the time of its decoding and then land behind the frame: the keys before it are
   // tried, and in the end the file is begun anew.
@@ -164,10 +171,12 @@ bool VVideoDecoder::Seek( std::int64_t i_Frame )
   const bool bKeys = m_bSeekable && !m_pClip->Stamps.empty() && !m_pClip->Keys.empty();
   const std::size_t Key = bKeys ? KeyAt( i_Frame ) : 0;
   m_Sought = bKeys ? m_pClip->Keys[Key].Frame : -1;
+  bool bMissed = false;
   for ( std::size_t Try = 0; Try < Tries && Try < Key; ++Try )
   {
     if ( !SeekToKey( Key - Try ) )
     {
+      bMissed = !m_rStop;
       break;
     }
     const std::int64_t First = Next();
@@ -176,9 +185,11 @@ bool VVideoDecoder::Seek( std::int64_t i_Frame )
       m_bPending = true;
       return true;
     }
+    // A seek that found its key and still came out behind the frame met damage, which is no fault of the seeking.
+    bMissed = bMissed || ( First >= 0 && m_bMissed );
   }
-  m_bSeekable = m_bSeekable && Key == 0;
-  return Rewind();
+  m_bSeekable = m_bSeekable && !bMissed;
+  return Open( m_Threads, o_rMessage );
 }
 
 } // namespace HostVideo

@@ -6,10 +6,13 @@
 #include <ZEK/Log.h>
 
 #include <algorithm>
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <exception>
 #include <mutex>
 #include <new>
+#include <string>
 #include <thread>
 #include <utility>
 
@@ -31,11 +34,9 @@ const ZEK::VLogCategory& Category()
   return rCategory;
 }
 
-std::size_t RingFor( const VVideoClip& i_rClip, std::size_t i_MostBytes )
+std::size_t RingFor( std::size_t i_FrameBytes, std::size_t i_MostBytes )
 {
-  const std::size_t Bytes =
-      std::max< std::size_t >( std::size_t{ i_rClip.Width } * i_rClip.Height * MostPixelBytes, 1 );
-  return std::clamp( i_MostBytes / Bytes, LeastRing, MostRing );
+  return std::clamp( i_MostBytes / std::max< std::size_t >( i_FrameBytes, 1 ), LeastRing, MostRing );
 }
 
 } // namespace
@@ -51,16 +52,15 @@ struct VVideoStream::VImpl
   VImpl( std::shared_ptr< const VVideoClip > i_pClip, const VVideoStreamOptions& i_rOptions )
     : pClip( std::move( i_pClip ) )
     , Options( i_rOptions )
-    , Capacity( RingFor( *pClip, i_rOptions.MostBytes ) )
-    , Behind( static_cast< std::int64_t >( Capacity / 4 ) )
-    , Ahead( static_cast< std::int64_t >( Capacity ) - 1 - Behind )
-    , Decoder( pClip )
+    , Decoder( pClip, bQuit )
     , Converter( SpareBuffers )
     , Missing( pClip->Times.size(), false )
   {
+    SetCapacity( RingFor( std::size_t{ pClip->Width } * pClip->Height * MostPixelBytes, Options.MostBytes ) );
     Ring.reserve( Capacity + 1 );
   }
 
+  void SetCapacity( std::size_t i_Frames );
   std::int64_t Clamped( std::int64_t i_Index ) const;
   std::int64_t Resolved( std::int64_t i_Index ) const;
   const VHeld* Find( std::int64_t i_Index ) const;
@@ -71,14 +71,16 @@ struct VVideoStream::VImpl
   void Run();
   void Decode( std::int64_t i_Need );
   bool Position( std::int64_t i_Need );
-  void MarkMissing( std::int64_t i_From, std::int64_t i_To );
+  bool Next( std::int64_t i_Need, VClock::time_point& o_rNow, std::int64_t& o_rIndex );
+  bool MarkMissing( std::int64_t i_From, std::int64_t i_To );
+  void TellMissing() const;
+  void Fail( const std::string& i_rWhy );
   void TellReady( std::unique_lock< std::mutex >& io_rLock );
   VVideoPicture Given( std::int64_t i_Index );
 
   const std::shared_ptr< const VVideoClip > pClip;
   const VVideoStreamOptions Options;
-  const std::size_t Capacity;
-  const std::int64_t Behind, Ahead; ///< frames kept before and after the one that is wanted
+  std::atomic< bool > bQuit = false; ///< what is done for the stream ends as soon as can be
 
   // Of the stream's thread alone.
   VVideoDecoder Decoder;
@@ -91,14 +93,23 @@ struct VVideoStream::VImpl
   std::thread Thread;
   std::function< void() > OnReady;
   bool bStop = false, bFailed = false;
-  bool bTelling = false;     ///< `OnReady` runs
-  bool bOwed = false;        ///< the wanted frame could not be given when it was asked for
-  std::int64_t Wanted = -1;  ///< -1: nothing was asked for yet
-  std::vector< VHeld > Ring; ///< in no order
+  bool bTelling = false;              ///< `OnReady` runs
+  bool bOwed = false;                 ///< the wanted frame could not be given when it was asked for
+  std::int64_t Wanted = -1;           ///< -1: nothing was asked for yet
+  std::size_t Capacity = LeastRing;   ///< in frames; less once they prove to be larger than was thought
+  std::int64_t Behind = 0, Ahead = 1; ///< frames kept before and after the one that is wanted
+  std::vector< VHeld > Ring;          ///< in no order
   std::vector< bool > Missing;
   VHeld Last; ///< that was given
   VVideoStreamCounts Counts;
 };
+
+void VVideoStream::VImpl::SetCapacity( std::size_t i_Frames )
+{
+  Capacity = i_Frames;
+  Behind = static_cast< std::int64_t >( Capacity / 4 );
+  Ahead = static_cast< std::int64_t >( Capacity ) - 1 - Behind;
+}
 
 std::int64_t VVideoStream::VImpl::Clamped( std::int64_t i_Index ) const
 {
@@ -108,6 +119,10 @@ std::int64_t VVideoStream::VImpl::Clamped( std::int64_t i_Index ) const
 /// The frame that stands for one that may be missing; -1 where none does.
 std::int64_t VVideoStream::VImpl::Resolved( std::int64_t i_Index ) const
 {
+  if ( Missing.empty() )
+  {
+    return -1;
+  }
   while ( i_Index >= 0 && Missing[static_cast< std::size_t >( i_Index )] )
   {
     --i_Index;
@@ -183,6 +198,8 @@ void VVideoStream::VImpl::Keep( std::int64_t i_Index, VVideoFrame i_Frame )
 {
   if ( !Find( i_Index ) )
   {
+    // Frames may be larger than the file says at its beginning.
+    SetCapacity( std::min( Capacity, RingFor( i_Frame.Data->size(), Options.MostBytes ) ) );
     Ring.push_back( { i_Index, std::move( i_Frame ) } );
     Trim();
   }
@@ -196,8 +213,10 @@ void VVideoStream::VImpl::Keep( std::int64_t i_Index, VVideoFrame i_Frame )
   Counts.MostHeldFrames = std::max( Counts.MostHeldFrames, Counts.HeldFrames );
 }
 
-void VVideoStream::VImpl::MarkMissing( std::int64_t i_From, std::int64_t i_To )
+/// True when these are the first that are missing.
+bool VVideoStream::VImpl::MarkMissing( std::int64_t i_From, std::int64_t i_To )
 {
+  const std::size_t Before = Counts.Missing;
   for ( std::int64_t Index = i_From; Index < i_To; ++Index )
   {
     if ( !Find( Index ) )
@@ -206,6 +225,25 @@ void VVideoStream::VImpl::MarkMissing( std::int64_t i_From, std::int64_t i_To )
       Missing[static_cast< std::size_t >( Index )] = true;
     }
   }
+  return Before == 0 && Counts.Missing > 0;
+}
+
+void VVideoStream::VImpl::TellMissing() const
+{
+  ZEK::Log( Category(), ZEK::ELogWarning, "Frames of the video \"%1%\" cannot be decoded; the last good one is shown",
+            pClip->Path.string() );
+}
+
+/// Outside of the lock. No frame comes any more; that somebody wanted it so is no failure.
+void VVideoStream::VImpl::Fail( const std::string& i_rWhy )
+{
+  if ( !bQuit )
+  {
+    ZEK::Log( Category(), ZEK::ELogWarning, "The video \"%1%\" can no longer be read: %2%", pClip->Path.string(),
+              i_rWhy );
+  }
+  const std::lock_guard Lock( Guard );
+  bFailed = true;
 }
 
 /// Tells those who wait when the wanted frame, or what stands for it, is there.
@@ -217,7 +255,7 @@ void VVideoStream::VImpl::TellReady( std::unique_lock< std::mutex >& io_rLock )
     return;
   }
   Ready.notify_all();
-  if ( std::exchange( bOwed, false ) && OnReady )
+  if ( std::exchange( bOwed, false ) && OnReady && !bQuit )
   {
     bTelling = true;
     io_rLock.unlock();
@@ -228,7 +266,7 @@ void VVideoStream::VImpl::TellReady( std::unique_lock< std::mutex >& io_rLock )
   }
 }
 
-/// Outside of the lock. False when the file can no longer be read.
+/// Outside of the lock. False when the file can no longer be read, which was told then.
 bool VVideoStream::VImpl::Position( std::int64_t i_Need )
 {
   std::string Message;
@@ -237,8 +275,7 @@ bool VVideoStream::VImpl::Position( std::int64_t i_Need )
     bOpen = Decoder.Open( Options.DecoderThreads, Message );
     if ( !bOpen )
     {
-      ZEK::Log( Category(), ZEK::ELogWarning, "The video \"%1%\" can no longer be read: %2%", pClip->Path.string(),
-                Message );
+      Fail( Message );
       return false;
     }
   }
@@ -248,34 +285,45 @@ bool VVideoStream::VImpl::Position( std::int64_t i_Need )
       const std::lock_guard Lock( Guard );
       ++Counts.Seeks;
     }
-    if ( !Decoder.Seek( i_Need ) )
+    if ( !Decoder.Seek( i_Need, Message ) )
     {
-      ZEK::Log( Category(), ZEK::ELogWarning, "The video \"%1%\" can no longer be read", pClip->Path.string() );
+      Fail( Message );
       return false;
     }
   }
   return true;
 }
 
+/// The next frame there is; false when nobody wants it.
+bool VVideoStream::VImpl::Next( std::int64_t i_Need, VClock::time_point& o_rNow, std::int64_t& o_rIndex )
+{
+  o_rIndex = Decoder.Next();
+  o_rNow = VClock::now();
+  if ( o_rIndex < 0 && ( bQuit || Decoder.ReadError() != 0 ) )
+  {
+    Fail( FFmpegError( Decoder.ReadError() ) );
+    return false;
+  }
+  bool bCopy = false, bFirstMissing = false;
+  {
+    const std::lock_guard Lock( Guard );
+    Counts.Decoded += o_rIndex >= 0;
+    bFirstMissing = MarkMissing( i_Need, o_rIndex < 0 ? pClip->FrameCount() : std::max( o_rIndex, i_Need ) );
+    bCopy = o_rIndex >= 0 && IsWanted( o_rIndex, o_rNow ) && !Find( o_rIndex );
+  }
+  if ( bFirstMissing )
+  {
+    TellMissing();
+  }
+  return bCopy;
+}
+
 /// One frame, on the way to the one that is needed.
 void VVideoStream::VImpl::Decode( std::int64_t i_Need )
 {
-  if ( !Position( i_Need ) )
-  {
-    const std::lock_guard Lock( Guard );
-    bFailed = true;
-    return;
-  }
-  const std::int64_t Index = Decoder.Next();
-  const auto Now = VClock::now();
-  bool bCopy = false;
-  {
-    const std::lock_guard Lock( Guard );
-    Counts.Decoded += Index >= 0;
-    MarkMissing( i_Need, Index < 0 ? pClip->FrameCount() : std::max( Index, i_Need ) );
-    bCopy = Index >= 0 && IsWanted( Index, Now ) && !Find( Index );
-  }
-  if ( !bCopy )
+  VClock::time_point Now;
+  std::int64_t Index = -1;
+  if ( !Position( i_Need ) || !Next( i_Need, Now, Index ) )
   {
     return;
   }
@@ -283,15 +331,16 @@ void VVideoStream::VImpl::Decode( std::int64_t i_Need )
   const bool bGood = Converter.Convert( Decoder.Picture(), pClip->QuarterTurns, Frame );
   Frame.PresentationTime = pClip->Times[static_cast< std::size_t >( Index )];
   LastLate = Index < i_Need ? Now : LastLate;
-  const std::lock_guard Lock( Guard );
+  std::unique_lock Lock( Guard );
   if ( bGood )
   {
     ++Counts.Copied;
     Keep( Index, std::move( Frame ) );
   }
-  else
+  else if ( MarkMissing( Index, Index + 1 ) )
   {
-    MarkMissing( Index, Index + 1 );
+    Lock.unlock();
+    TellMissing();
   }
 }
 
@@ -322,6 +371,11 @@ void VVideoStream::VImpl::Run()
       Lock.lock();
       bFailed = true;
     }
+    catch ( const std::exception& rException )
+    {
+      Fail( rException.what() );
+      Lock.lock();
+    }
     TellReady( Lock );
   }
 }
@@ -329,7 +383,7 @@ void VVideoStream::VImpl::Run()
 /// Under the lock.
 VVideoPicture VVideoStream::VImpl::Given( std::int64_t i_Index )
 {
-  const std::int64_t Shown = Missing.empty() ? -1 : Resolved( i_Index );
+  const std::int64_t Shown = Resolved( i_Index );
   if ( const VHeld* const pHeld = Shown >= 0 ? Find( Shown ) : nullptr )
   {
     Last = *pHeld;
@@ -357,6 +411,7 @@ VVideoStream::VVideoStream( std::shared_ptr< const VVideoClip > i_pClip, const V
 
 VVideoStream::~VVideoStream()
 {
+  m_pImpl->bQuit = true;
   {
     const std::lock_guard Lock( m_pImpl->Guard );
     m_pImpl->bStop = true;

@@ -12,6 +12,7 @@ namespace
 {
 
 constexpr int MostPixelsAcross = 16384;
+constexpr std::size_t MostFrames = std::size_t{ 1 } << 24;
 /// Of the mean distance: by so much may one of them differ.
 constexpr double UnevenPart = 0.25;
 /// A file is cut off where so much of its length is not there: s, and part of the length.
@@ -48,9 +49,11 @@ private:
   void TakeRate();
   void Smooth();
   void TellLoss();
-  double Seconds( std::int64_t i_Ticks ) const
+  /// After the first frame; the distance of two stamps may be too large for a signed number.
+  double SecondsOf( std::int64_t i_Stamp ) const
   {
-    return static_cast< double >( i_Ticks ) * av_q2d( Stream().time_base );
+    const auto First = static_cast< std::uint64_t >( m_rClip.Stamps.front() );
+    return static_cast< double >( static_cast< std::uint64_t >( i_Stamp ) - First ) * av_q2d( Stream().time_base );
   }
   const AVStream& Stream() const { return *m_pInput->streams[m_Stream]; }
   void Note( std::string i_Text ) { m_rClip.Notes.push_back( std::move( i_Text ) ); }
@@ -70,7 +73,7 @@ private:
 
 ZEK::IResult VScan::Fail( ZEK::IResult i_Result, const std::string& i_rWhat )
 {
-  m_rMessage = m_rPath.string() + ": " + i_rWhat;
+  m_rMessage = m_rPath.string().append( ": " ).append( i_rWhat );
   return i_Result;
 }
 
@@ -95,9 +98,10 @@ ZEK::IResult VScan::Open()
   {
     return Fail( ZEK::IResult::InvalidFormat, "expected a video file, found a file without a video in it" );
   }
-  return Opened < 0 ? Fail( ZEK::IResult::InvalidFormat,
-                            "expected a video file that is whole up to its index: " + FFmpegError( Opened ) )
-                    : ZEK::IResult::Ok;
+  return Opened < 0
+             ? Fail( ZEK::IResult::InvalidFormat, std::string( "expected a video file that is whole up to its index: " )
+                                                      .append( FFmpegError( Opened ) ) )
+             : ZEK::IResult::Ok;
 }
 
 /// Of the orientation that the file asks for; a turn that is none by quarters is left out.
@@ -113,8 +117,9 @@ void VScan::TakeTurn()
   const double Quarters = std::round( Degrees / 90 );
   if ( std::abs( Degrees - Quarters * 90 ) > 1 )
   {
-    Note( "The file asks for a turn by " + std::to_string( static_cast< int >( Degrees ) ) +
-          " degrees, which is not made." );
+    Note( std::string( "The file asks for a turn by " )
+              .append( std::to_string( static_cast< int >( Degrees ) ) )
+              .append( " degrees, which is not made." ) );
     return;
   }
   m_rClip.QuarterTurns = ( static_cast< int >( Quarters ) % 4 + 4 ) % 4;
@@ -133,20 +138,25 @@ ZEK::IResult VScan::Describe()
   m_rClip.PixelFormat = pFormat ? pFormat : "unknown";
   if ( rCodec.width <= 0 || rCodec.height <= 0 )
   {
-    return Fail( ZEK::IResult::InvalidFormat,
-                 "expected a video of known size, found " + m_rClip.Codec + " data that do not tell" );
+    return Fail( ZEK::IResult::InvalidFormat, std::string( "expected a video of known size, found " )
+                                                  .append( m_rClip.Codec )
+                                                  .append( " data that do not tell" ) );
   }
   if ( rCodec.width > MostPixelsAcross || rCodec.height > MostPixelsAcross )
   {
-    return Fail( ZEK::IResult::NotSupported, "expected frames of at most " + std::to_string( MostPixelsAcross ) +
-                                                 " pixels each way, found " + std::to_string( rCodec.width ) + " x " +
-                                                 std::to_string( rCodec.height ) );
+    return Fail( ZEK::IResult::NotSupported, std::string( "expected frames of at most " )
+                                                 .append( std::to_string( MostPixelsAcross ) )
+                                                 .append( " pixels each way, found " )
+                                                 .append( std::to_string( rCodec.width ) )
+                                                 .append( " x " )
+                                                 .append( std::to_string( rCodec.height ) ) );
   }
   m_rClip.Width = static_cast< std::uint32_t >( rCodec.width );
   m_rClip.Height = static_cast< std::uint32_t >( rCodec.height );
   if ( !avcodec_find_decoder( rCodec.codec_id ) )
   {
-    return Fail( ZEK::IResult::NotSupported, "there is no decoder for " + m_rClip.Codec + " video here" );
+    return Fail( ZEK::IResult::NotSupported,
+                 std::string( "there is no decoder for " ).append( m_rClip.Codec ).append( " video here" ) );
   }
   TakeTurn();
   return ZEK::IResult::Ok;
@@ -158,6 +168,7 @@ ZEK::IResult VScan::ReadPackets()
   std::error_code Ignored;
   const auto Size = static_cast< double >( std::filesystem::file_size( m_rPath, Ignored ) );
   int Result = 0;
+  std::uint64_t Read = 0; // of sound too
   for ( unsigned Index = 0; Index < m_pInput->nb_streams; ++Index )
   {
     m_pInput->streams[Index]->discard = AVDISCARD_DEFAULT; // sound tells as well how much is there
@@ -167,7 +178,9 @@ ZEK::IResult VScan::ReadPackets()
     if ( pPacket->pts != AV_NOPTS_VALUE )
     {
       const AVRational& rTick = m_pInput->streams[pPacket->stream_index]->time_base;
-      m_End = std::max( m_End, static_cast< double >( pPacket->pts + pPacket->duration ) * av_q2d( rTick ) );
+      // Their sum may be too large for a whole number.
+      const double Ticks = static_cast< double >( pPacket->pts ) + static_cast< double >( pPacket->duration );
+      m_End = std::max( m_End, Ticks * av_q2d( rTick ) );
     }
     const bool bStream = pPacket->stream_index == m_Stream;
     const bool bOurs = bStream && ( pPacket->flags & AV_PKT_FLAG_DISCARD ) == 0;
@@ -182,7 +195,12 @@ ZEK::IResult VScan::ReadPackets()
     }
     const double At = pPacket->pos > 0 && Size > 0 ? static_cast< double >( pPacket->pos ) / Size : 0;
     av_packet_unref( pPacket.get() );
-    if ( m_rProgress && m_Packets.size() % 64 == 1 && !m_rProgress( std::min( At, 1.0 ) ) )
+    if ( m_Packets.size() > MostFrames )
+    {
+      return Fail( ZEK::IResult::NotSupported,
+                   std::string( "expected at most " ).append( std::to_string( MostFrames ) ).append( " frames" ) );
+    }
+    if ( m_rProgress && Read++ % 64 == 0 && !m_rProgress( std::min( At, 1.0 ) ) )
     {
       return Fail( ZEK::IResult::Canceled, "the reading was stopped" );
     }
@@ -220,7 +238,7 @@ void VScan::NumberFrames()
     }
     const auto Frame = static_cast< std::int64_t >( m_rClip.Stamps.size() );
     m_rClip.Stamps.push_back( rPacket.Shown );
-    m_rClip.Times.push_back( Seconds( rPacket.Shown - m_rClip.Stamps.front() ) );
+    m_rClip.Times.push_back( SecondsOf( rPacket.Shown ) );
     if ( rPacket.bKey )
     {
       m_rClip.Keys.push_back( { Frame, rPacket.Shown } );
@@ -233,8 +251,8 @@ void VScan::CountFrames()
   AVRational Rate = Stream().avg_frame_rate;
   Rate = Rate.num > 0 && Rate.den > 0 ? Rate : Stream().r_frame_rate;
   const bool bRate = Rate.num > 0 && Rate.den > 0;
-  Note( std::string( "The file does not give each frame a time of its own; frames are counted" ) +
-        ( bRate ? "." : ", and 25 of them were taken for a second." ) );
+  Note( std::string( "The file does not give each frame a time of its own; frames are counted" )
+            .append( bRate ? "." : ", and 25 of them were taken for a second." ) );
   const double Step = bRate ? 1 / av_q2d( Rate ) : 0.04;
   m_rClip.Stamps.clear();
   m_rClip.Keys = { { 0, 0 } };
@@ -295,8 +313,12 @@ void VScan::TellLoss()
   const bool bShort = Length - ( m_End - Start ) > std::max( LeastLoss, LossPart * Length );
   if ( m_Cut > 0 || m_bReadFailed || Promised > There || bShort )
   {
-    Note( "The file is cut off or damaged: " + std::to_string( There ) +
-          ( Promised > There ? " of " + std::to_string( Promised ) : std::string() ) + " frames are there." );
+    std::string Text = std::string( "The file is cut off or damaged: " ).append( std::to_string( There ) );
+    if ( Promised > There )
+    {
+      Text.append( " of " ).append( std::to_string( Promised ) );
+    }
+    Note( std::move( Text.append( " frames are there." ) ) );
   }
 }
 
@@ -345,7 +367,7 @@ ZEK::IResult ScanVideo( const std::filesystem::path& i_rPath, VVideoClip& o_rCli
   }
   catch ( const std::bad_alloc& )
   {
-    o_rMessage = i_rPath.string() + ": too little memory for the frames of the video";
+    o_rMessage = i_rPath.string().append( ": too little memory for the frames of the video" );
     Result = ZEK::IResult::AllocationFailure;
   }
   if ( Result.IsError() )

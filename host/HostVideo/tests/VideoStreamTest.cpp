@@ -1,3 +1,4 @@
+#include "VVideoDecoder.h"
 #include "VideoWriter.h"
 
 #include <HostVideo/VVideoStream.h>
@@ -8,6 +9,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <atomic>
 #include <condition_variable>
 #include <fstream>
 #include <mutex>
@@ -163,7 +166,10 @@ TEST_F( VideoFiles, PlayingDecodesEachFrameOnceAndHoldsFew )
 
 TEST_F( VideoFiles, AFrameThatIsNotThereYetIsToldOfWhenItIs )
 {
-  const auto pClip = Scan( Write( "a.mp4", Coded( "mpeg4", 2 ) ) );
+  VWrittenVideo Video = Coded( "mpeg4", 2 );
+  Video.Width = 640; // large enough to be late
+  Video.Height = 480;
+  const auto pClip = Scan( Write( "a.mp4", Video ) );
   VVideoStream Stream( pClip );
   std::mutex Guard;
   std::condition_variable Told;
@@ -232,6 +238,7 @@ TEST_F( VideoFiles, DamageCostsTheFramesThatItHits )
 {
   const std::string Whole = Bytes( Write( "a.mkv", Coded( "ffv1", 0 ) ) );
   std::mt19937 Random( 3 );
+  std::size_t Told = 0;
   for ( int Round = 0; Round < 12; ++Round )
   {
     std::string Damaged = Whole;
@@ -252,7 +259,55 @@ TEST_F( VideoFiles, DamageCostsTheFramesThatItHits )
       EXPECT_TRUE( Picture.bExact );
       EXPECT_LE( Picture.Index, Index );
     }
+    Told += Stream.Counts().Missing > 0;
   }
+  EXPECT_GT( Told, 0u );
+  const auto Lines = TestSupport::LogTexts( "Video", ZEK::ELogWarning );
+  EXPECT_EQ( Lines.size(), Told ) << "once a stream";
+  EXPECT_THAT( Lines, testing::Each( HasSubstr( "damaged.mkv\" cannot be decoded; the last good one is shown" ) ) );
+}
+
+TEST_F( VideoFiles, ADecoderThatIsStoppedFindsNothingMore )
+{
+  std::atomic< bool > bStop = false;
+  VVideoDecoder Decoder( Scan( Write( "a.mkv", Coded( "ffv1", 0 ) ) ), bStop );
+  std::string Message;
+  ASSERT_TRUE( Decoder.Open( 1, Message ) ) << Message;
+  EXPECT_EQ( Decoder.Next(), 0 );
+  bStop = true;
+  EXPECT_EQ( Decoder.Next(), -1 );
+  EXPECT_FALSE( Decoder.Seek( 40, Message ) );
+}
+
+TEST_F( VideoFiles, OneDamagedStretchDoesNotEndSeeking )
+{
+  const auto Path = Write( "a.mov", Coded( "mpeg4", 0 ) );
+  const auto pClip = Scan( Path );
+  ASSERT_GT( pClip->Keys.size(), 4u );
+  ASSERT_EQ( pClip->Keys[1].Frame, 12 );
+  std::string Damaged = Bytes( Path );
+  VFFmpegPtr< AVFormatContext > pInput;
+  int Stream = -1;
+  ASSERT_EQ( OpenVideo( Path, pInput, Stream ), 0 );
+  const VFFmpegPtr< AVPacket > pPacket( av_packet_alloc() );
+  for ( int Frame = 0; Frame < 24 && av_read_frame( pInput.get(), pPacket.get() ) >= 0; ++Frame )
+  {
+    if ( Frame >= 12 )
+    {
+      std::fill_n( Damaged.begin() + pPacket->pos, pPacket->size, '\0' );
+    }
+    av_packet_unref( pPacket.get() );
+  }
+  Save( "a.mov", Damaged );
+  const std::atomic< bool > bStop = false;
+  VVideoDecoder Decoder( pClip, bStop );
+  std::string Message;
+  ASSERT_TRUE( Decoder.Open( 1, Message ) ) << Message;
+  // From the beginning, as no key before the damage has one before itself.
+  ASSERT_TRUE( Decoder.Seek( 14, Message ) );
+  EXPECT_EQ( Decoder.Next(), 0 );
+  ASSERT_TRUE( Decoder.Seek( 50, Message ) );
+  EXPECT_GT( Decoder.Next(), 24 );
 }
 
 TEST_F( VideoFiles, WhatIsNoVideoIsRefusedWithAReason )
@@ -267,7 +322,11 @@ TEST_F( VideoFiles, WhatIsNoVideoIsRefusedWithAReason )
                 { Save( "empty.mp4", "" ), ZEK::IResult::InvalidFormat, "expected a video file" },
                 { Save( "text.mkv", std::string( 5000, 'x' ) ), ZEK::IResult::InvalidFormat, "expected a video file" },
                 { Save( "concat:a.avi", "ffconcat version 1.0\nfile /etc/hostname\n" ), ZEK::IResult::InvalidFormat,
+                  "expected a video file" },
+                { Save( "list.avi", "ffconcat version 1.0\nfile beside.avi\n" ), ZEK::IResult::InvalidFormat,
                   "expected a video file" } };
+  // The list must be refused for being one, and not for naming nothing.
+  Scan( Write( "beside.avi", Coded( "mjpeg", 0, "yuvj420p" ) ), ZEK::IResult::Ok );
   for ( const auto& rCase : Cases )
   {
     SCOPED_TRACE( rCase.Path );
@@ -301,6 +360,8 @@ TEST_F( VideoFiles, AFileThatVanishedGivesNothingAndSaysSoOnce )
     EXPECT_FALSE( Picture.Frame.Data );
   }
   EXPECT_EQ( TestSupport::LogTexts( "Video", ZEK::ELogWarning ).size(), 1u );
+  VVideoStream Empty( std::make_shared< VVideoClip >() );
+  EXPECT_TRUE( Empty.GetExact( 3 ).bExact );
 }
 
 TEST_F( VideoFiles, PicturesComeInFormsThatViewsKnow )
@@ -366,6 +427,35 @@ TEST_F( VideoFiles, AFrameIsTurnedAsItsFileAsks )
     EXPECT_NEAR( Frame.Data->at( ( Turns == 2 ? Y : 127 - Y ) * Frame.Stride[0] + ( Turns == 2 ? 127 - X : X ) ), 40,
                  12 );
   }
+}
+
+TEST_F( VideoFiles, ColoursFollowTheHeightThatIsShown )
+{
+  VWrittenVideo Video = Coded( "ffv1", 0, "bgr0" );
+  Video.Width = 720;
+  Video.Frames = 2;
+  for ( const auto& [Turns, Luma] : { std::pair{ 0, 60 }, { 1, 47 } } )
+  {
+    SCOPED_TRACE( Turns );
+    Video.QuarterTurns = Turns;
+    VVideoStream Stream( Scan( Write( "wide.mov", Video ) ) );
+    const auto Frame = Stream.GetExact( 0 ).Frame;
+    ASSERT_EQ( Frame.Height, Turns == 0 ? 48u : 720u );
+    EXPECT_NEAR( Frame.Data->at( Frame.Offset[0] ), Luma, 3 );
+  }
+}
+
+TEST_F( VideoFiles, FramesThatAreLargerThanTheirPixelsStayWithinTheirBytes )
+{
+  VWrittenVideo Video = Coded( "ffv1", 0, "yuv422p" );
+  Video.Width = 8; // rows are filled up to 32 bytes
+  VVideoStream Stream( Scan( Write( "narrow.mkv", Video ) ), { 10000, 1 } );
+  for ( std::int64_t Index = 0; Index < 60; ++Index )
+  {
+    ASSERT_EQ( Stream.GetExact( Index ).Index, Index );
+  }
+  EXPECT_LE( Stream.Counts().MostHeldBytes, 10000u );
+  EXPECT_EQ( Stream.Counts().Decoded, 60u );
 }
 
 TEST_F( VideoFiles, UnevenFramesAreFoundByTime )

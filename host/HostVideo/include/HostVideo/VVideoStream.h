@@ -16,7 +16,7 @@ struct VVideoStreamOptions
 {
   /// Of decoded frames that are kept around the one that is wanted; two frames are kept however large they are.
   std::size_t MostBytes = std::size_t{ 48 } << 20;
-  int DecoderThreads = 1; ///< beside the stream's own
+  int DecoderThreads = 1; ///< of the decoder; 1: the stream's own does it
 };
 
 /// A frame of a stream.
@@ -38,8 +38,8 @@ struct VVideoStreamCounts
 /// Decodes the frames of one video on a thread of its own, a little ahead of the one that is wanted.
 ///
 /// The thread begins with the first frame that is asked for and ends with the stream. In place of a frame that cannot
-/// be decoded stands the last good one before it. A file that can no longer be read gives no frame; that is logged
-/// once. Thread: `Want` and the `Get` functions from one thread at a time.
+/// be decoded stands the last good one before it. A file that can no longer be read gives no frame. Each of both is
+/// logged once. Thread: `Want` and the `Get` functions from one thread at a time.
 class VVideoStream
 {
 public:
