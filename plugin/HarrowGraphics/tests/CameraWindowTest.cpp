@@ -7,6 +7,7 @@
 #include <HarrowGraphics/VSceneWindowContentFactory.h>
 
 #include <CoreMoxelTypes/FlowTypes.h>
+#include <Flow2Graphics/VContributions.h>
 #include <HostServices/VHost.h>
 #include <HostServices/VStateJson.h>
 #include <TestSupport/Calls.h>
@@ -14,6 +15,7 @@
 
 #include <QtCore/QCoreApplication>
 #include <QtCore/QElapsedTimer>
+#include <QtQml/QQmlComponent>
 #include <QtQml/QQmlEngine>
 #include <QtQuick/QQuickItem>
 #include <QtWidgets/QHBoxLayout>
@@ -374,4 +376,32 @@ TEST( CameraTileData, TellsWhatItemsSayAndNothingElse )
   EXPECT_EQ( Colour( 1e9 ), QColor( 0xE0, 0x38, 0x30 ) );
   EXPECT_FALSE( Colour( std::nan( "" ) ).isValid() );
   EXPECT_FALSE( HarrowGraphics::CameraTileData( {}, nullptr ).contains( "currentTemperature" ) );
+}
+
+TEST( SceneContributions, RowsAreWatchedWhileTheListIsOpenAndNothingOnceItIsGone )
+{
+  Flow2Graphics::VContributions First( nullptr ), Second( nullptr );
+  const auto Watched = []( const Flow2Graphics::VContributions& i_rOf )
+  {
+    return std::pair( i_rOf.IsWatched(), i_rOf.AreRowsWatched() );
+  };
+  QQmlEngine Engine;
+  QQmlComponent Component( &Engine, QUrl( "qrc:/SceneContributions.qml" ) );
+  std::unique_ptr< QObject > pList( Component.create() );
+  ASSERT_TRUE( pList ) << Component.errorString().toStdString();
+  for ( int Round = 0; Round < 2; ++Round )
+  {
+    pList->setProperty( "contributions", QVariant::fromValue< QObject* >( &First ) );
+    EXPECT_EQ( Watched( First ), std::pair( true, false ) );
+    pList->setProperty( "open", true );
+    EXPECT_EQ( Watched( First ), std::pair( true, true ) );
+    pList->setProperty( "contributions", QVariant::fromValue< QObject* >( &Second ) );
+    EXPECT_EQ( Watched( First ), std::pair( false, false ) );
+    EXPECT_EQ( Watched( Second ), std::pair( true, true ) );
+    pList->setProperty( "open", false );
+    EXPECT_EQ( Watched( Second ), std::pair( true, false ) );
+  }
+  pList->setProperty( "open", true );
+  pList.reset();
+  EXPECT_EQ( Watched( Second ), std::pair( false, false ) );
 }
