@@ -67,6 +67,7 @@ struct VRenderCameraData3D::VGl
   }
   bool Write( VRenderContext& io_rContext, const VKey& i_rKey );
   bool WriteWords( bool i_bHighlight );
+  bool MakeWords( bool i_bHighlight );
   bool Draw( VRenderContext& io_rContext, const VKey& i_rKey );
   void Gather( const ZEK::IRenderCamera& i_rCamera, const VKey& i_rKey );
 
@@ -75,12 +76,21 @@ struct VRenderCameraData3D::VGl
   std::shared_ptr< VShaderProgram > pProgram;
   VUniform Table{ "t_Tiles" };
   VRenderState State;
-  VDynamicBuffer VertexBuffer, WordBuffer, TileBuffer;
+  /// The selection words as one mode draws them.
+  struct VModeWords
+  {
+    VDynamicBuffer Buffer;
+    std::uint64_t MadeOf = 0; ///< number of the vertices' writing; 0: to be made anew
+    bool bAny = false;
+  };
+  std::array< VModeWords, 2 > ModeWords; ///< of picking and of highlighting
+  VDynamicBuffer VertexBuffer, TileBuffer;
   VTexelBuffer Rows{ ETexelFloats };
   VKey Key;
+  std::uint64_t Written = 0; ///< how often the vertices were
   bool bMade = false;
   std::vector< VCentroidVertex > Vertices;
-  std::vector< std::uint32_t > Words, Written;
+  std::vector< std::uint32_t > Words, Shown;
   std::vector< std::uint16_t > Tiles;
   std::vector< float > Matrices;
   ZEK::VCameraLists3D Lists;
@@ -122,7 +132,7 @@ bool VRenderCameraData3D::VGl::Write( VRenderContext& io_rContext, const VKey& i
   Words.clear();
   Tiles.clear();
   Matrices.clear();
-  Written.clear();
+  ++Written;
   for ( const ZEK::VRenderCameraRef& rpCamera : pCameras->GetCameras() )
   {
     if ( rpCamera->GetInfo().bCalibrated && Matrices.size() / RowFloats < MostCameras )
@@ -147,20 +157,37 @@ bool VRenderCameraData3D::VGl::Write( VRenderContext& io_rContext, const VKey& i
 
 bool VRenderCameraData3D::VGl::WriteWords( bool i_bHighlight )
 {
+  VModeWords& rMode = ModeWords[i_bHighlight ? 1 : 0];
+  // What a band found draws no more, one layer after another.
+  const bool bIgnoring = !i_bHighlight && !rScene.IgnoredIds().empty();
+  if ( !bIgnoring && rMode.MadeOf == Written && ( !rMode.bAny || rMode.Buffer.Bind() ) )
+  {
+    return rMode.bAny;
+  }
+  rMode.MadeOf = 0;
+  rMode.bAny = MakeWords( i_bHighlight );
+  if ( rMode.bAny && !rMode.Buffer.Write( std::span( std::as_const( Shown ) ) ) )
+  {
+    return false;
+  }
+  rMode.MadeOf = bIgnoring ? 0 : Written;
+  return rMode.bAny;
+}
+
+bool VRenderCameraData3D::VGl::MakeWords( bool i_bHighlight )
+{
   const auto Word = [&]( std::uint32_t i_Word )
   {
     const bool bShown = i_bHighlight ? ( i_Word & Marked ) != 0 : !rScene.IsIgnored( i_Word );
     return bShown ? i_Word : 0;
   };
-  std::vector< std::uint32_t >& rNew = Written;
-  rNew.resize( Words.size() );
-  std::transform( Words.begin(), Words.end(), rNew.begin(), Word );
-  const bool bAny = std::any_of( rNew.begin(), rNew.end(),
-                                 []( std::uint32_t i_Word )
-                                 {
-                                   return i_Word != 0;
-                                 } );
-  return bAny && WordBuffer.Write( std::span( std::as_const( rNew ) ) );
+  Shown.resize( Words.size() );
+  std::transform( Words.begin(), Words.end(), Shown.begin(), Word );
+  return std::any_of( Shown.begin(), Shown.end(),
+                      []( std::uint32_t i_Word )
+                      {
+                        return i_Word != 0;
+                      } );
 }
 
 bool VRenderCameraData3D::VGl::Draw( VRenderContext& io_rContext, const VKey& i_rKey )
@@ -172,9 +199,10 @@ bool VRenderCameraData3D::VGl::Draw( VRenderContext& io_rContext, const VKey& i_
   {
     return true;
   }
+  VDynamicBuffer& rWordBuffer = ModeWords[Mode == ERenderModeHighlight ? 1 : 0].Buffer;
   const std::array< VVertexStream, 3 > Streams{
       VVertexStream{ &VertexBuffer, bVisible ? &ColouredLayout : &BareLayout, 0 },
-      VVertexStream{ &TileBuffer, &TileLayout, 0 }, VVertexStream{ &WordBuffer, &WordLayout, 0 } };
+      VVertexStream{ &TileBuffer, &TileLayout, 0 }, VVertexStream{ &rWordBuffer, &WordLayout, 0 } };
   if ( !Rows.Bind( io_rContext, 0 ) || !io_rContext.SetVertexStreams( std::span( Streams ).first( bVisible ? 2 : 3 ) ) )
   {
     return false;
