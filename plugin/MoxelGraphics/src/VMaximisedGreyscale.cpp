@@ -1,5 +1,6 @@
 #include "VMaximisedGreyscale.h"
 
+#include "Log.h"
 #include "VGreyscaleBatch.h"
 
 #include <MoxelGraphics/VMoxelScene.h>
@@ -66,9 +67,15 @@ VMaximisedGreyscale::VMap::~VMap()
   }
 }
 
-void VMaximisedGreyscale::VMap::Write( VRenderContext& io_rContext, int i_Unit, const std::vector< float >& i_rPlaces )
+bool VMaximisedGreyscale::VMap::Write( VRenderContext& io_rContext, int i_Unit, const std::vector< float >& i_rPlaces )
 {
   QOpenGLExtraFunctions& rGl = *io_rContext.Functions();
+  GLint Longest = 0;
+  rGl.glGetIntegerv( GL_MAX_TEXTURE_SIZE, &Longest );
+  if ( i_rPlaces.size() > static_cast< std::size_t >( Longest ) )
+  {
+    return false;
+  }
   if ( !m_pGroup || m_pGroup != io_rContext.Context()->shareGroup() )
   {
     m_pGroup = io_rContext.Context()->shareGroup();
@@ -85,6 +92,7 @@ void VMaximisedGreyscale::VMap::Write( VRenderContext& io_rContext, int i_Unit, 
   }
   rGl.glTexImage2D( GL_TEXTURE_2D, 0, GL_R32F, GLsizei( i_rPlaces.size() ), 1, 0, GL_RED, GL_FLOAT, i_rPlaces.data() );
   VVertexBuffer::CountBytes( i_rPlaces.size() * sizeof( float ) );
+  return true;
 }
 
 bool VMaximisedGreyscale::VMap::Bind( VRenderContext& io_rContext, int i_Unit ) const
@@ -113,7 +121,14 @@ VMaximisedGreyscale::~VMaximisedGreyscale() = default;
 void VMaximisedGreyscale::Collect( const VRenderContext& i_rContext, const VSceneOptions& i_rOptions )
 {
   m_Tiles.resize( std::max( m_Tiles.size(), m_Collected + 1 ) );
-  m_Tiles[m_Collected++] = { i_rOptions.OverlayCamera.toStdString(), i_rContext.View2D(), i_rContext.Viewport() };
+  VTile& rTile = m_Tiles[m_Collected++];
+  if ( !SameText( rTile.Text, i_rOptions.OverlayCamera ) )
+  {
+    rTile.Text = i_rOptions.OverlayCamera;
+    rTile.Camera = rTile.Text.toStdString();
+  }
+  rTile.View2D = i_rContext.View2D();
+  rTile.Rect = i_rContext.Viewport();
 }
 
 void VMaximisedGreyscale::DropGone()
@@ -167,14 +182,20 @@ bool VMaximisedGreyscale::Take( VRenderContext& io_rContext, const VSceneOptions
   }
   const int History = i_rOptions.CameraMaximiseGreyscaleHistory;
   const double Factor = i_rOptions.CameraMaximiseGreyscaleFactor;
-  if ( bNew || History != io_rCamera.History || Factor != io_rCamera.Factor ||
-       !io_rCamera.Columns.Bind( io_rContext, MapXUnit ) || !io_rCamera.Rows.Bind( io_rContext, MapYUnit ) )
+  const bool bOther = bNew || History != io_rCamera.History || Factor != io_rCamera.Factor;
+  if ( !bOther && io_rCamera.bRefused )
+  {
+    return false;
+  }
+  if ( bOther || !io_rCamera.Columns.Bind( io_rContext, MapXUnit ) || !io_rCamera.Rows.Bind( io_rContext, MapYUnit ) )
   {
     io_rCamera.History = History;
     io_rCamera.Factor = Factor;
     io_rCamera.Stretch.Place( History, Factor );
-    io_rCamera.Columns.Write( io_rContext, MapXUnit, io_rCamera.Stretch.Columns().Places );
-    io_rCamera.Rows.Write( io_rContext, MapYUnit, io_rCamera.Stretch.Rows().Places );
+    if ( !WriteMaps( io_rContext, io_rCamera, i_rCamera.GetName() ) )
+    {
+      return false;
+    }
   }
   const float Scale = std::max( io_rCamera.Stretch.Columns().Stretch, io_rCamera.Stretch.Rows().Stretch );
   if ( io_rCamera.Drawn != i_rLists.Generation || io_rCamera.Scale != Scale ||
@@ -184,6 +205,21 @@ bool VMaximisedGreyscale::Take( VRenderContext& io_rContext, const VSceneOptions
     io_rCamera.Drawn = WritePoints( io_rCamera, rData ) ? i_rLists.Generation : 0;
   }
   return io_rCamera.Drawn != 0 && io_rCamera.Count > 0;
+}
+
+bool VMaximisedGreyscale::WriteMaps( VRenderContext& io_rContext, VCamera& io_rCamera, const std::string& i_rName )
+{
+  const std::size_t Width = io_rCamera.Stretch.Columns().Places.size();
+  const std::size_t Height = io_rCamera.Stretch.Rows().Places.size();
+  const bool bGood = io_rCamera.Columns.Write( io_rContext, MapXUnit, io_rCamera.Stretch.Columns().Places ) &&
+                     io_rCamera.Rows.Write( io_rContext, MapYUnit, io_rCamera.Stretch.Rows().Places );
+  if ( !std::exchange( io_rCamera.bRefused, !bGood ) && !bGood )
+  {
+    ZEK::Log( LogCategory(), ZEK::ELogWarning,
+              "The grey of \"%1%\" cannot be maximised: a sensor of %2% x %3% pixels is more than the device takes",
+              i_rName, Width, Height );
+  }
+  return bGood;
 }
 
 bool VMaximisedGreyscale::WritePoints( VCamera& io_rCamera, const ZEK::VGreyscaleData& i_rData )
@@ -216,6 +252,13 @@ bool VMaximisedGreyscale::WritePoints( VCamera& io_rCamera, const ZEK::VGreyscal
 bool VMaximisedGreyscale::WriteWords( VCamera& io_rCamera, const ZEK::IRenderCamera& i_rCamera,
                                       const ZEK::VGreyscaleData& i_rData )
 {
+  const std::uint64_t Provider = m_rScene.IgnoredIds().empty() ? m_pProvider->GetGeneration() : 0;
+  if ( Provider != 0 && io_rCamera.WordsProvider == Provider && io_rCamera.WordsDrawn == io_rCamera.Drawn &&
+       io_rCamera.Words.Bind() )
+  {
+    return true;
+  }
+  io_rCamera.WordsProvider = 0;
   MakeBlobWords( i_rCamera, i_rData, m_rScene, m_Words );
   auto* pWord = static_cast< std::uint32_t* >(
       io_rCamera.Words.Map( static_cast< std::size_t >( io_rCamera.Count ) * sizeof( std::uint32_t ) ) );
@@ -228,7 +271,13 @@ bool VMaximisedGreyscale::WriteWords( VCamera& io_rCamera, const ZEK::IRenderCam
                {
                  pWord = std::fill_n( pWord, i_rLine.Length, m_Words[i_Record] );
                } );
-  return io_rCamera.Words.Unmap();
+  if ( !io_rCamera.Words.Unmap() )
+  {
+    return false;
+  }
+  io_rCamera.WordsProvider = Provider;
+  io_rCamera.WordsDrawn = io_rCamera.Drawn;
+  return true;
 }
 
 void VMaximisedGreyscale::DrawTile( VRenderContext& io_rContext, const VSceneOptions& i_rOptions, const VTile& i_rTile )

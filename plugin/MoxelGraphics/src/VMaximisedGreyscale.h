@@ -45,11 +45,12 @@ public:
 private:
   struct VTile
   {
+    QString Text; ///< the name as the view has it, and as the provider does
     std::string Camera;
     QVector4D View2D;
     QRect Rect;
   };
-  /// One row of floats as a texture.
+  /// One row of floats as a texture. False for more than the device takes.
   class VMap
   {
   public:
@@ -57,7 +58,7 @@ private:
     ~VMap();
     VMap( const VMap& ) = delete;
     VMap& operator=( const VMap& ) = delete;
-    void Write( CoreGraphics::VRenderContext& io_rContext, int i_Unit, const std::vector< float >& i_rPlaces );
+    bool Write( CoreGraphics::VRenderContext& io_rContext, int i_Unit, const std::vector< float >& i_rPlaces );
     bool Bind( CoreGraphics::VRenderContext& io_rContext, int i_Unit ) const;
 
   private:
@@ -74,6 +75,9 @@ private:
     std::uint64_t Drawn = 0; ///< generation of the lists that the points are of
     int History = 0;         ///< as the maps were made
     double Factor = 0;
+    bool bRefused = false; ///< the device does not take the maps
+    /// Of the provider, and of the lists: what the words are of; 0: to be written anew.
+    std::uint64_t WordsProvider = 0, WordsDrawn = 0;
     float Scale = 1; ///< how much larger than a pixel of the image a point is
     int Count = 0;
   };
@@ -81,6 +85,7 @@ private:
   void DrawTile( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, const VTile& i_rTile );
   bool Take( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, VCamera& io_rCamera,
              const ZEK::IRenderCamera& i_rCamera, const ZEK::VCameraLists2D& i_rLists );
+  bool WriteMaps( CoreGraphics::VRenderContext& io_rContext, VCamera& io_rCamera, const std::string& i_rName );
   static bool WritePoints( VCamera& io_rCamera, const ZEK::VGreyscaleData& i_rData );
   bool WriteWords( VCamera& io_rCamera, const ZEK::IRenderCamera& i_rCamera, const ZEK::VGreyscaleData& i_rData );
   void DropGone();

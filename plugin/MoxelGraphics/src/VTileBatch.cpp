@@ -15,11 +15,6 @@ namespace
 /// A row that places everything out of sight.
 constexpr std::array< float, 8 > Nowhere{ 0, 0, 0, 0, 0, 0, 8, 8 };
 
-bool SameText( const QString& i_rA, const QString& i_rB )
-{
-  return ( i_rA.constData() == i_rB.constData() && i_rA.size() == i_rB.size() ) || i_rA == i_rB;
-}
-
 float Single( double i_Value )
 {
   return static_cast< float >( i_Value );
@@ -235,9 +230,11 @@ bool VTileBatch::FindSet( VView& io_rView )
   return false;
 }
 
-bool VTileBatch::WriteSet( CoreGraphics::VRenderContext& io_rContext, VView& io_rView )
+VTileSet& VTileBatch::SetToWrite( VView& io_rView )
 {
-  if ( io_rView.Set < 0 )
+  // A view that drew from a larger one's set leaves it to that one: what the larger one writes next is then like what
+  // it wrote last, and parts of it stay.
+  if ( io_rView.Set < 0 || m_Sets[static_cast< std::size_t >( io_rView.Set )]->SlotCount > io_rView.Tiles.size() )
   {
     if ( m_Sets.size() < MostSets )
     {
@@ -250,7 +247,12 @@ bool VTileBatch::WriteSet( CoreGraphics::VRenderContext& io_rContext, VView& io_
                                           } );
     io_rView.Set = static_cast< int >( Oldest - m_Sets.begin() );
   }
-  VTileSet& rSet = *m_Sets[static_cast< std::size_t >( io_rView.Set )];
+  return *m_Sets[static_cast< std::size_t >( io_rView.Set )];
+}
+
+bool VTileBatch::WriteSet( CoreGraphics::VRenderContext& io_rContext, VView& io_rView )
+{
+  VTileSet& rSet = SetToWrite( io_rView );
   std::size_t Count = 0;
   for ( std::size_t Index = 0; Index < io_rView.Tiles.size(); ++Index )
   {
@@ -400,6 +402,11 @@ CoreGraphics::VVertexStream VUnitSquare::Stream()
   using namespace CoreGraphics;
   static const VVertexLayout Layout( 8, 0, { { EAttributeUV, 2, GL_FLOAT, false, 0 } } );
   return { &m_Corners, &Layout, 0 };
+}
+
+bool SameText( const QString& i_rA, const QString& i_rB )
+{
+  return ( i_rA.constData() == i_rB.constData() && i_rA.size() == i_rB.size() ) || i_rA == i_rB;
 }
 
 bool HasMarks( VMoxelScene& i_rScene, std::uint32_t i_Kind )

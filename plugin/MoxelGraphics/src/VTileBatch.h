@@ -131,6 +131,7 @@ private:
   bool FindLists( VView& io_rView, const VSceneOptions& i_rOptions );
   bool FindSet( VView& io_rView );
   bool Matches( VView& io_rView, const VTileSet& i_rSet ) const;
+  VTileSet& SetToWrite( VView& io_rView );
   bool WriteSet( CoreGraphics::VRenderContext& io_rContext, VView& io_rView );
   bool WriteTable( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, VView& io_rView );
   void Place( VView& io_rView, const VTileSet& i_rSet, std::size_t i_Tile, const VSceneOptions& i_rOptions );
@@ -158,6 +159,9 @@ public:
 private:
   CoreGraphics::VStaticBuffer m_Corners;
 };
+
+/// Seldom looks at the letters of texts that are the same.
+bool SameText( const QString& i_rA, const QString& i_rB );
 
 /// Whether something of that kind is selected or lies under the pointer.
 bool HasMarks( VMoxelScene& i_rScene, std::uint32_t i_Kind );
