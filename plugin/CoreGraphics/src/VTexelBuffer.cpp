@@ -4,6 +4,7 @@
 
 #include <QtGui/QOpenGLContext>
 
+#include <algorithm>
 #include <array>
 
 namespace CoreGraphics
@@ -57,6 +58,13 @@ bool VTexelBuffer::Fits( const VRenderContext& i_rContext, ETexelFormat i_Format
          static_cast< std::size_t >( i_rContext.MaximumBufferTexels() );
 }
 
+std::size_t VTexelBuffer::MostTextureBytes( VRenderContext& io_rContext, ETexelFormat i_Format )
+{
+  GLint Most = 0;
+  io_rContext.Functions()->glGetIntegerv( GL_MAX_TEXTURE_SIZE, &Most );
+  return static_cast< std::size_t >( std::max( Most, 0 ) ) * Width * FormatOf( i_Format ).Bytes;
+}
+
 int VTexelBuffer::First() const
 {
   return m_bBuffer ? static_cast< int >( m_Buffer.Offset() / FormatOf( m_Format ).Bytes ) : 0;
@@ -75,13 +83,11 @@ void* VTexelBuffer::Map( VRenderContext& io_rContext, std::size_t i_Bytes, bool 
     return m_Buffer.Map( i_Bytes );
   }
   const VFormat& rFormat = FormatOf( m_Format );
-  m_Rows = ( i_Bytes / rFormat.Bytes + Width - 1 ) / Width;
-  GLint Most = 0;
-  io_rContext.Functions()->glGetIntegerv( GL_MAX_TEXTURE_SIZE, &Most );
-  if ( m_Rows == 0 || m_Rows > static_cast< std::size_t >( Most ) )
+  if ( i_Bytes == 0 || i_Bytes > MostTextureBytes( io_rContext, m_Format ) )
   {
     return nullptr;
   }
+  m_Rows = ( i_Bytes / rFormat.Bytes + Width - 1 ) / Width;
   m_Texels.resize( m_Rows * Width * rFormat.Bytes );
   return m_Texels.data();
 }

@@ -1,5 +1,7 @@
 #include "VGreyscaleBatch.h"
 
+#include "Log.h"
+
 #include <MoxelGraphics/VMoxelScene.h>
 
 #include <CoreGraphics/VRenderContext.h>
@@ -34,6 +36,22 @@ bool IsUsable( const std::array< float, 4 >& i_rImage )
                       } ) &&
          i_rImage[2] != 0 && i_rImage[3] != 0;
 }
+
+/// How large the tables of a set are, in bytes.
+struct VTables
+{
+  std::size_t Lines = 0, Pixels = 0;
+
+  VTables With( const VGreyscaleData& i_rData ) const
+  {
+    return { Lines + i_rData.Lines.size() * sizeof( VGreyscaleSpan ), Pixels + i_rData.Pixels.size() };
+  }
+  bool AreBuffers( const CoreGraphics::VRenderContext& i_rContext ) const
+  {
+    using namespace CoreGraphics;
+    return VTexelBuffer::Fits( i_rContext, ETexelWords, Lines ) && VTexelBuffer::Fits( i_rContext, ETexelByte, Pixels );
+  }
+};
 } // namespace
 
 const CoreGraphics::VVertexLayout& VGreyscaleBatch::RecordLayout()
@@ -46,23 +64,47 @@ const CoreGraphics::VVertexLayout& VGreyscaleBatch::RecordLayout()
   return Layout;
 }
 
+void VGreyscaleBatch::Count( CoreGraphics::VRenderContext& io_rContext, VGreyscaleSet& io_rSet,
+                             std::span< const ZEK::VCameraLists2D > i_Lists )
+{
+  using namespace CoreGraphics;
+  const std::size_t MostLineBytes = VTexelBuffer::MostTextureBytes( io_rContext, ETexelWords );
+  const std::size_t MostPixels = VTexelBuffer::MostTextureBytes( io_rContext, ETexelByte );
+  io_rSet.Total = 0;
+  VTables Tables;
+  for ( std::size_t Slot = 0; Slot < i_Lists.size(); ++Slot )
+  {
+    const VGreyscaleData& rData = *i_Lists[Slot].pGreyscale;
+    VTileSlot& rSlot = io_rSet.Slots[Slot];
+    rSlot.First = static_cast< std::uint32_t >( io_rSet.Total );
+    rSlot.Count = 0;
+    rSlot.Image = rData.OffsetScale;
+    if ( rData.Records.empty() || !IsUsable( rData.OffsetScale ) )
+    {
+      continue;
+    }
+    const VTables Larger = Tables.With( rData );
+    const bool bTextures = Larger.Lines <= MostLineBytes && Larger.Pixels <= MostPixels;
+    if ( Larger.Lines > MostLines * sizeof( VGreyscaleSpan ) || !( bTextures || Larger.AreBuffers( io_rContext ) ) )
+    {
+      if ( !std::exchange( m_bSaid, true ) )
+      {
+        ZEK::Log( LogCategory(), ZEK::ELogWarning,
+                  "The grey of \"%1%\" is not shown: with it there is more than the device holds", rSlot.Name );
+      }
+      continue;
+    }
+    Tables = Larger;
+    rSlot.Count = static_cast< std::uint32_t >( rData.Records.size() );
+    io_rSet.Total += rSlot.Count;
+  }
+}
+
 bool VGreyscaleBatch::Write( CoreGraphics::VRenderContext& io_rContext, VTileSet& io_rSet,
                              std::span< const ZEK::VCameraLists2D > i_Lists )
 {
   VGreyscaleSet& rSet = static_cast< VGreyscaleSet& >( io_rSet );
-  rSet.Total = 0;
-  std::size_t Lines = 0;
-  for ( std::size_t Slot = 0; Slot < i_Lists.size(); ++Slot )
-  {
-    const VGreyscaleData& rData = *i_Lists[Slot].pGreyscale;
-    VTileSlot& rSlot = rSet.Slots[Slot];
-    const bool bUsed = IsUsable( rData.OffsetScale ) && Lines + rData.Lines.size() <= MostLines;
-    rSlot.First = static_cast< std::uint32_t >( rSet.Total );
-    rSlot.Count = bUsed ? static_cast< std::uint32_t >( rData.Records.size() ) : 0;
-    rSlot.Image = rData.OffsetScale;
-    rSet.Total += rSlot.Count;
-    Lines += rSlot.Count > 0 ? rData.Lines.size() : 0;
-  }
+  Count( io_rContext, rSet, i_Lists );
   if ( rSet.Total == 0 )
   {
     return true;
@@ -99,19 +141,17 @@ bool VGreyscaleBatch::WriteTables( CoreGraphics::VRenderContext& io_rContext, VG
                                    std::span< const ZEK::VCameraLists2D > i_Lists )
 {
   using namespace CoreGraphics;
-  std::size_t LineBytes = 0, PixelBytes = 0;
+  VTables Tables;
   for ( std::size_t Slot = 0; Slot < i_Lists.size(); ++Slot )
   {
     if ( io_rSet.Slots[Slot].Count > 0 )
     {
-      LineBytes += i_Lists[Slot].pGreyscale->Lines.size() * sizeof( VGreyscaleSpan );
-      PixelBytes += i_Lists[Slot].pGreyscale->Pixels.size();
+      Tables = Tables.With( *i_Lists[Slot].pGreyscale );
     }
   }
-  const bool bBuffers = VTexelBuffer::Fits( io_rContext, ETexelWords, LineBytes ) &&
-                        VTexelBuffer::Fits( io_rContext, ETexelByte, PixelBytes );
-  auto* pLine = static_cast< VGreyscaleSpan* >( io_rSet.Lines.Map( io_rContext, LineBytes, bBuffers ) );
-  auto* const pPixels = static_cast< std::uint8_t* >( io_rSet.Pixels.Map( io_rContext, PixelBytes, bBuffers ) );
+  const bool bBuffers = Tables.AreBuffers( io_rContext );
+  auto* pLine = static_cast< VGreyscaleSpan* >( io_rSet.Lines.Map( io_rContext, Tables.Lines, bBuffers ) );
+  auto* const pPixels = static_cast< std::uint8_t* >( io_rSet.Pixels.Map( io_rContext, Tables.Pixels, bBuffers ) );
   std::uint32_t FirstPixel = 0;
   for ( std::size_t Slot = 0; pLine && pPixels && Slot < i_Lists.size(); ++Slot )
   {

@@ -34,10 +34,14 @@ protected:
               std::span< const ZEK::VCameraLists2D > i_Lists ) override;
 
 private:
+  /// Gives each slot its records: as many cameras' as the device holds.
+  void Count( CoreGraphics::VRenderContext& io_rContext, VGreyscaleSet& io_rSet,
+              std::span< const ZEK::VCameraLists2D > i_Lists );
   static bool WriteTables( CoreGraphics::VRenderContext& io_rContext, VGreyscaleSet& io_rSet,
                            std::span< const ZEK::VCameraLists2D > i_Lists );
 
   std::vector< std::uint32_t > m_Words;
+  bool m_bSaid = false; ///< that there was more than the device holds
 };
 
 /// The selection words of a camera's blobs, one a record.

@@ -47,6 +47,8 @@ public:
 
   /// Whether a table of that size can be a texture buffer.
   static bool Fits( const VRenderContext& i_rContext, ETexelFormat i_Format, std::size_t i_Bytes );
+  /// The bytes of the largest table that can be a 2D texture.
+  static std::size_t MostTextureBytes( VRenderContext& io_rContext, ETexelFormat i_Format );
   bool IsBuffer() const { return m_bBuffer; }
   /// The index of the table's first texel.
   int First() const;
