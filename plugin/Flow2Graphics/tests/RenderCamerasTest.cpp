@@ -145,7 +145,10 @@ TEST_F( VRenderCameras, WhoeverNeedsACameraFindsItByItsItemAndItsNumberStandsWhe
   EXPECT_FALSE( pScene->GetSelectionPose( { Device( 7 ) }, Pose ) );
   EXPECT_EQ( pScene->SelectionItemsToIds( { Device( 0 ) } ), std::vector{ pScene->Cameras()->FirstId() } );
   // Cameras go, and come back in another place of the list.
+  const std::weak_ptr Gone = pScene->CameraProvider()->GetCamera( Name( 1 ) );
+  ASSERT_FALSE( Gone.expired() );
   pScene->Show( Maker.State( 2, { Items.begin(), Items.begin() + 3 } ) );
+  EXPECT_TRUE( Gone.expired() ) << "nobody holds it";
   EXPECT_EQ( pScene->Cameras()->Bodies().size(), 1u );
   EXPECT_TRUE( pScene->GetSelectionPositions( { Device( 1 ) } ).empty() );
   pScene->Show( Maker.State( 3, { Items.begin() + 3, Items.end() } ) );
