@@ -1,6 +1,7 @@
 set( HostSourcesReaderSources
   src/BvhSkeleton.cpp src/C3dLayout.cpp src/C3dNumbers.cpp src/C3dParameters.cpp src/ForcePlates.cpp src/Labels.cpp
-  src/ReaderSupport.cpp src/ReadRecording.cpp src/RecordingInfo.cpp src/RecordingSkeletons.cpp
+  src/ReaderSupport.cpp src/ReadRecording.cpp src/RecordingInfo.cpp src/RecordingInfoSkeletons.cpp
+  src/RecordingSkeletons.cpp
   src/RecordingSubjects.cpp src/UpAxis.cpp src/VBvhReader.cpp src/VByteSource.cpp src/VC3dReader.cpp
   src/VRecordingSource.cpp src/VTrcReader.cpp )
 set( HostSourcesReaderTests

@@ -1,7 +1,4 @@
-#include <HostSources/RecordingInfo.h>
-
-#include <rapidjson/prettywriter.h>
-#include <rapidjson/stringbuffer.h>
+#include "RecordingInfoParts.h"
 
 #include <algorithm>
 #include <array>
@@ -11,11 +8,10 @@
 
 namespace HostSources
 {
-namespace
+namespace InfoParts
 {
-using VWriter = rapidjson::PrettyWriter< rapidjson::StringBuffer >;
 
-__attribute__( ( format( printf, 1, 2 ) ) ) std::string Format( const char* i_pFormat, ... )
+std::string Format( const char* i_pFormat, ... )
 {
   va_list Arguments;
   va_start( Arguments, i_pFormat );
@@ -24,6 +20,43 @@ __attribute__( ( format( printf, 1, 2 ) ) ) std::string Format( const char* i_pF
   va_end( Arguments );
   return { Text.data(), std::min( static_cast< std::size_t >( std::max( Size, 0 ) ), Text.size() - 1 ) };
 }
+
+std::string Shown( const std::string& i_rLabel )
+{
+  return i_rLabel.empty() ? "(unnamed)" : i_rLabel;
+}
+
+void Number( VWriter& io_rWriter, const char* i_pKey, double i_Value )
+{
+  io_rWriter.Key( i_pKey );
+  std::isfinite( i_Value ) ? io_rWriter.Double( i_Value ) : io_rWriter.Null();
+}
+void Integer( VWriter& io_rWriter, const char* i_pKey, std::int64_t i_Value )
+{
+  io_rWriter.Key( i_pKey );
+  io_rWriter.Int64( i_Value );
+}
+void Text( VWriter& io_rWriter, const char* i_pKey, const std::string& i_rValue )
+{
+  io_rWriter.Key( i_pKey );
+  io_rWriter.String( i_rValue.c_str(), static_cast< rapidjson::SizeType >( i_rValue.size() ) );
+}
+void Texts( VWriter& io_rWriter, const char* i_pKey, const std::vector< std::string >& i_rValues )
+{
+  io_rWriter.Key( i_pKey );
+  io_rWriter.StartArray();
+  for ( const std::string& rValue : i_rValues )
+  {
+    io_rWriter.String( rValue.c_str(), static_cast< rapidjson::SizeType >( rValue.size() ) );
+  }
+  io_rWriter.EndArray();
+}
+} // namespace InfoParts
+
+using namespace InfoParts;
+
+namespace
+{
 
 VRecordingInfo::VPlate DescribePlate( const VForcePlate& i_rPlate, std::uint32_t i_PerFrame )
 {
@@ -67,41 +100,11 @@ void CountGaps( const VRecording& i_rRecording, VRecordingInfo& io_rInfo )
   }
 }
 
-std::string Shown( const std::string& i_rLabel )
-{
-  return i_rLabel.empty() ? "(unnamed)" : i_rLabel;
-}
-
 std::string Position( double i_X, double i_Y, double i_Z )
 {
   return std::isfinite( i_X ) ? Format( "(%.2f, %.2f, %.2f)", i_X, i_Y, i_Z ) : std::string( "none" );
 }
 
-void Number( VWriter& io_rWriter, const char* i_pKey, double i_Value )
-{
-  io_rWriter.Key( i_pKey );
-  std::isfinite( i_Value ) ? io_rWriter.Double( i_Value ) : io_rWriter.Null();
-}
-void Integer( VWriter& io_rWriter, const char* i_pKey, std::int64_t i_Value )
-{
-  io_rWriter.Key( i_pKey );
-  io_rWriter.Int64( i_Value );
-}
-void Text( VWriter& io_rWriter, const char* i_pKey, const std::string& i_rValue )
-{
-  io_rWriter.Key( i_pKey );
-  io_rWriter.String( i_rValue.c_str(), static_cast< rapidjson::SizeType >( i_rValue.size() ) );
-}
-void Texts( VWriter& io_rWriter, const char* i_pKey, const std::vector< std::string >& i_rValues )
-{
-  io_rWriter.Key( i_pKey );
-  io_rWriter.StartArray();
-  for ( const std::string& rValue : i_rValues )
-  {
-    io_rWriter.String( rValue.c_str(), static_cast< rapidjson::SizeType >( rValue.size() ) );
-  }
-  io_rWriter.EndArray();
-}
 template < typename T >
 void Vector( VWriter& io_rWriter, const T& i_rX, const T& i_rY, const T& i_rZ )
 {
@@ -264,48 +267,6 @@ void WriteAnalogAndEvents( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
     Text( io_rWriter, "context", rEvent.Context );
     Number( io_rWriter, "fileSeconds", rEvent.FileSeconds );
     Number( io_rWriter, "seconds", rEvent.Seconds );
-    io_rWriter.EndObject();
-  }
-  io_rWriter.EndArray();
-}
-
-VRecordingInfo::VSkeleton DescribeSkeleton( const VRecordingSkeleton& i_rS )
-{
-  VRecordingInfo::VSkeleton Skeleton{ i_rS.Subject.Name, {}, i_rS.EndSiteCount, i_rS.ChannelCount, i_rS.StateSize };
-  for ( const CoreMoxelTypes::VSegment& rSegment : i_rS.Subject.Segments )
-  {
-    Skeleton.Segments.push_back( rSegment.Name );
-  }
-  return Skeleton;
-}
-
-std::string SkeletonText( const VRecordingInfo::VSkeleton& i_rSkeleton )
-{
-  std::string Lines =
-      "Skeleton:  " + Shown( i_rSkeleton.Name ) +
-      Format( ", %zu joints, %llu end sites, %llu channels, %llu degrees of freedom\n", i_rSkeleton.Segments.size(),
-              static_cast< unsigned long long >( i_rSkeleton.EndSiteCount ),
-              static_cast< unsigned long long >( i_rSkeleton.ChannelCount ),
-              static_cast< unsigned long long >( i_rSkeleton.StateSize ) );
-  for ( const std::string& rName : i_rSkeleton.Segments )
-  {
-    Lines += "  joint    " + Shown( rName ) + "\n";
-  }
-  return Lines;
-}
-
-void WriteSkeletons( VWriter& io_rWriter, const VRecordingInfo& i_rInfo )
-{
-  io_rWriter.Key( "skeletons" );
-  io_rWriter.StartArray();
-  for ( const VRecordingInfo::VSkeleton& rSkeleton : i_rInfo.Skeletons )
-  {
-    io_rWriter.StartObject();
-    Text( io_rWriter, "name", rSkeleton.Name );
-    Texts( io_rWriter, "segments", rSkeleton.Segments );
-    Integer( io_rWriter, "endSites", static_cast< std::int64_t >( rSkeleton.EndSiteCount ) );
-    Integer( io_rWriter, "channels", static_cast< std::int64_t >( rSkeleton.ChannelCount ) );
-    Integer( io_rWriter, "degreesOfFreedom", static_cast< std::int64_t >( rSkeleton.StateSize ) );
     io_rWriter.EndObject();
   }
   io_rWriter.EndArray();
