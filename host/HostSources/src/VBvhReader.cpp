@@ -22,6 +22,8 @@ constexpr std::string_view Spaces = " \t\r\n\f\v";
 constexpr double Centimetre = 10; // mm
 constexpr double Farthest = 1e9;  // mm
 constexpr std::size_t MostJoints = 4096;
+/// Memory for the poses: times the size of the file, and what any file may have beside that.
+constexpr double Mebibyte = 1024.0 * 1024.0, MostPerByte = 16, LeastMost = 64 * Mebibyte;
 
 std::string_view AsText( std::span< const std::byte > i_Bytes )
 {
@@ -35,7 +37,8 @@ std::string_view AsText( std::span< const std::byte > i_Bytes )
 
 std::string Quote( std::string_view i_Text )
 {
-  return i_Text.empty() ? "the end of the file" : '"' + ToUtf8( i_Text.substr( 0, 40 ) ) + '"';
+  return i_Text.empty() ? std::string( "the end of the file" )
+                        : std::string( "\"" ).append( ToUtf8( i_Text.substr( 0, 40 ) ) ).append( "\"" );
 }
 
 /// Steps through words, whatever stands between them.
@@ -364,6 +367,16 @@ ZEK::IResult VReader::ReadRows()
                                     } );
     m_Skeleton.StateSize += rJoint.Channels.empty() ? 0 : bFree ? 6 : 3;
   }
+  // Files of short numbers, or of joints that say little of themselves, take far more room in memory than on disk.
+  const double Needed =
+      static_cast< double >( Rows ) * static_cast< double >( m_Skeleton.StateSize ) * sizeof( double );
+  if ( Needed > MostPerByte * static_cast< double >( m_Size ) + LeastMost )
+  {
+    m_rMessage = std::string( "expected poses in proportion to the file, found some that need " )
+                     .append( std::to_string( static_cast< std::uint64_t >( Needed / Mebibyte ) ) )
+                     .append( " MiB of memory" );
+    return ZEK::IResult::NotSupported;
+  }
   m_Skeleton.States.reserve( Rows * m_Skeleton.StateSize );
   while ( m_rRecording.FrameCount < m_Promised && !m_Words.IsAtEnd() )
   {
@@ -441,6 +454,7 @@ ZEK::IResult VReader::Finish()
   rR.UnitScale = Centimetre;
   rR.UpAxis = EUpAxis::Y;
   rR.UpAxisReason = "y is up: BVH files have it so.";
+  rR.Notes.emplace_back( "Bones are not drawn yet; the recording can be played and inspected." );
   rR.Notes.emplace_back( "The format states no unit of length; centimetres were taken." );
   TakeRate( rR.RateHz, rR );
   m_Skeleton.Subject = SubjectOf( m_Joints );
@@ -453,14 +467,15 @@ ZEK::IResult VReader::Finish()
   if ( Missing > 0 )
   {
     (void)Expected( std::to_string( m_Promised ) + " rows", {} );
-    m_rMessage += "; the " + std::to_string( rR.FrameCount ) + " whole rows before it were read";
-    rR.Notes.push_back( "The file is cut off: " + m_rMessage + "." );
+    m_rMessage.append( "; whole rows before it that were read: " ).append( std::to_string( rR.FrameCount ) );
+    rR.Notes.push_back( std::string( "The file is cut off: " ).append( m_rMessage ).append( "." ) );
     return ZEK::IResult::OkButPartial;
   }
   if ( !m_Words.IsAtEnd() )
   {
-    rR.Notes.push_back( "The header promises " + std::to_string( m_Promised ) +
-                        " frames; what stands behind them was left out." );
+    rR.Notes.push_back( std::string( "The header promises " )
+                            .append( std::to_string( m_Promised ) )
+                            .append( " frames; what stands behind them was left out." ) );
   }
   return {};
 }

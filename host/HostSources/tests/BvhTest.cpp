@@ -187,7 +187,15 @@ TEST( Bvh, DamagedFilesGiveTheirWholeRowsOrAReason )
   {
     Deep += Joint == 0 ? "ROOT a{\n" : "JOINT a\n{\n";
   }
+  std::string Zeros( std::size_t{ 12 } << 20, '0' );
+  for ( std::size_t At = 1; At < Zeros.size(); At += 2 )
+  {
+    Zeros[At] = ' ';
+  }
+  const std::string OneChannel =
+      "HIERARCHY ROOT a { OFFSET 0 0 0 CHANNELS 1 Xposition } MOTION Frames: 900000000 Frame Time: 1\n";
   const VCase Cases[] = {
+      { OneChannel + Zeros, NotSupported, "expected poses in proportion to the file, found some that need 2" },
       { "", EndOfData, "HIERARCHY" },
       { "HIERARCHY", EndOfData, "expected ROOT, found the end of the file" },
       { "hierarchy", InvalidFormat, "\"HIERARCHY\", the mark of a BVH file, found \"hierarchy\"" },
@@ -207,10 +215,10 @@ TEST( Bvh, DamagedFilesGiveTheirWholeRowsOrAReason )
       { With( "90 90 0 0 90", "90 90 zero 0 90" ), InvalidFormat, "a number for a channel, found \"zero\"" },
       { With( "90 90 0 0 90", "1e300 90 0 0 90" ), InvalidFormat, "positions of at most 1e8" },
       { With( "Frames: 3", "Frames: 0" ), EndOfData, "rows of frames" },
-      { With( "Frames: 3", "Frames: 900000000000000" ), OkButPartial, "the 3 whole rows before it were read" },
-      { With( "90 90\n0 0 90\n", "90 90\n" ), OkButPartial, "the 2 whole rows" },
+      { With( "Frames: 3", "Frames: 900000000000000" ), OkButPartial, "whole rows before it that were read: 3" },
+      { With( "90 90\n0 0 90\n", "90 90\n" ), OkButPartial, "were read: 2" },
       { With( "90 90\n0 0 90\n", "90 90\n0 0 9" ), Ok, "" },
-      { With( "90 90 0 0 90\n90 90\n0 0 90\n", "90 90 0 0 9" ), OkButPartial, "the 1 whole rows" },
+      { With( "90 90 0 0 90\n90 90\n0 0 90\n", "90 90 0 0 9" ), OkButPartial, "were read: 1" },
       { With( "0.033333", "0" ), Ok, "" },
       { Small + "1 2 3 4 5\n", Ok, "" },
       { "HIERARCHY ROOT a { OFFSET 0 0 0 CHANNELS 0 } MOTION Frames: 5 Frame Time: 1", InvalidFormat,
