@@ -231,15 +231,23 @@ void VSourcePump::VImpl::Start( bool i_bLive, std::int64_t i_First )
   const std::lock_guard Control( ControlGuard );
   Stop();
   Follow( true );
-  const std::lock_guard Lock( Guard );
-  First = std::max< std::int64_t >( i_First, 0 );
-  bStop = false;
-  bLive = i_bLive;
-  bFailing = false;
-  bAgain = false;
-  Shown = -1;
-  Thread = std::thread( i_bLive ? &VImpl::RunLive : &VImpl::RunFollow, this );
-  bRunning = true; // only now: nobody may wait for a thread that could not be made
+  try
+  {
+    const std::lock_guard Lock( Guard );
+    First = std::max< std::int64_t >( i_First, 0 );
+    bStop = false;
+    bLive = i_bLive;
+    bFailing = false;
+    bAgain = false;
+    Shown = -1;
+    Thread = std::thread( i_bLive ? &VImpl::RunLive : &VImpl::RunFollow, this );
+    bRunning = true; // only now: nobody may wait for a thread that could not be made
+  }
+  catch ( ... )
+  {
+    Follow( false );
+    throw;
+  }
 }
 
 void VSourcePump::VImpl::Stop()
