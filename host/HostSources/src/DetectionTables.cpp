@@ -350,8 +350,9 @@ void VReader::TakeRate()
     }
   }
   m_rRecording.FrameCount = m_rDetections.Count;
-  HostSources::TakeRate( First < Last ? ( Last - First ) / ( End.Sum / End.Count - Begin.Sum / Begin.Count ) : 0,
-                         m_rRecording );
+  const double Rate = First < Last ? ( Last - First ) / ( End.Sum / End.Count - Begin.Sum / Begin.Count ) : 0;
+  m_rDetections.bRateKnown = IsUsableRate( Rate );
+  m_rRecording.RateHz = m_rDetections.bRateKnown ? Rate : m_rRecording.RateHz;
 }
 
 ZEK::IResult VReader::Read( const VTableFiles& i_rFiles )

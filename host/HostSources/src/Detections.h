@@ -27,6 +27,7 @@ struct VDetections
   std::vector< VCamera > Cameras;
   std::vector< std::string > Points; ///< the names of what can be seen
   bool bPersons = false;             ///< whether several persons can be seen, without knowing who is who
+  bool bRateKnown = false;           ///< whether the files told the recording's rate
   std::vector< std::string > Losses; ///< what could not be used, as sentences
 };
 

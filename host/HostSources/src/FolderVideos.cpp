@@ -40,20 +40,48 @@ std::string Rounded( double i_Value )
 
 std::string SizeText( std::uint32_t i_Width, std::uint32_t i_Height )
 {
-  return std::to_string( i_Width ) + " x " + std::to_string( i_Height );
+  return std::to_string( i_Width ).append( " x " ).append( std::to_string( i_Height ) );
+}
+
+/// Whether a word of a name ends before a place in it: at a sign, at a capital letter and between letters and digits.
+bool IsBorder( const std::string& i_rName, std::size_t i_At )
+{
+  if ( i_At == 0 || i_At >= i_rName.size() )
+  {
+    return true;
+  }
+  const auto Before = static_cast< unsigned char >( i_rName[i_At - 1] ),
+             After = static_cast< unsigned char >( i_rName[i_At] );
+  return !std::isalnum( Before ) || !std::isalnum( After ) || ( std::islower( Before ) && std::isupper( After ) ) ||
+         std::isdigit( Before ) != std::isdigit( After );
+}
+
+/// Whether the last words of a name, or where it is wanted the first ones, are these letters and digits.
+bool HasWords( const std::string& i_rName, const std::string& i_rPlain, bool i_bFirstToo )
+{
+  for ( std::size_t At = 0; At <= i_rName.size(); ++At )
+  {
+    if ( IsBorder( i_rName, At ) && ( PlainName( i_rName.substr( At ) ) == i_rPlain ||
+                                      ( i_bFirstToo && PlainName( i_rName.substr( 0, At ) ) == i_rPlain ) ) )
+    {
+      return true;
+    }
+  }
+  return false;
 }
 
 /// How surely a name is that of a camera: 0 not at all.
-int Likeness( const std::string& i_rPlain, const VCalibratedCamera& i_rCamera )
+int Likeness( const std::string& i_rName, const VCalibratedCamera& i_rCamera )
 {
   constexpr int Same = 4, Number = 3, End = 2, Word = 1;
+  const std::string Plain = PlainName( i_rName );
   const std::string Camera = PlainName( i_rCamera.Name );
-  const VNumbered File( i_rPlain ), Wanted( Camera );
-  if ( i_rPlain.empty() || Camera.empty() )
+  const VNumbered File( Plain ), Wanted( Camera );
+  if ( Plain.empty() || Camera.empty() )
   {
     return 0;
   }
-  if ( i_rPlain == Camera )
+  if ( Plain == Camera )
   {
     return Same;
   }
@@ -61,13 +89,14 @@ int Likeness( const std::string& i_rPlain, const VCalibratedCamera& i_rCamera )
   const std::string& rNumber = Wanted.Number.empty() ? UserId : Wanted.Number;
   if ( File.Number.empty() || File.Number != rNumber )
   {
-    return i_rPlain.find( Camera ) != std::string::npos && Wanted.Number.empty() ? Word : 0;
+    return Wanted.Number.empty() && HasWords( i_rName, Camera, true ) ? Word : 0;
   }
   if ( File.Word == Wanted.Word )
   {
     return Number;
   }
-  if ( !Wanted.Word.empty() && File.Word.ends_with( Wanted.Word ) )
+  const std::string Unnumbered = i_rName.substr( 0, i_rName.find_last_not_of( "0123456789" ) + 1 );
+  if ( !Wanted.Word.empty() && HasWords( Unnumbered, Wanted.Word, false ) )
   {
     return End;
   }
@@ -104,7 +133,7 @@ void VFolderVideos::List( const VFolderFiles& i_rFiles )
     {
       if ( HostVideo::IsVideoSuffix( SuffixOf( rPath ) ) )
       {
-        m_Files.push_back( { rPath, PlainName( rPath.stem().string() ), PlainName( i_rFolder ) } );
+        m_Files.push_back( { rPath, rPath.stem().string(), i_rFolder } );
       }
     }
   };
@@ -120,22 +149,45 @@ void VFolderVideos::List( const VFolderFiles& i_rFiles )
   }
 }
 
-/// A folder that is named like the camera says less than the file's own name.
-VFolderVideos::VFile* VFolderVideos::BestFor( const VCalibratedCamera& i_rCamera )
+/// The surest pairs first, so that no camera takes a file that is more surely another's. A folder that is named like
+/// the camera says less than the file's own name. The file of each camera, or null.
+std::vector< VFolderVideos::VFile* > VFolderVideos::Assign()
 {
-  VFile* pBest = nullptr;
-  int Best = 0;
-  for ( VFile& rFile : m_Files )
+  struct VPair
   {
-    const int Alike = 2 * Likeness( rFile.Stem, i_rCamera ), Inside = Likeness( rFile.Folder, i_rCamera );
-    const int This = std::max( Alike, Inside );
-    if ( !rFile.bTaken && This > Best )
+    int Alike = 0;
+    std::size_t Camera = 0;
+    VFile* pFile = nullptr;
+  };
+  const auto& rCameras = m_pRecording->Cameras;
+  std::vector< VPair > Pairs;
+  for ( std::size_t Camera = 0; Camera < rCameras.size(); ++Camera )
+  {
+    for ( VFile& rFile : m_Files )
     {
-      pBest = &rFile;
-      Best = This;
+      const int Alike = std::max( 2 * Likeness( rFile.Stem, rCameras[Camera].Camera ),
+                                  Likeness( rFile.Folder, rCameras[Camera].Camera ) );
+      if ( Alike > 0 )
+      {
+        Pairs.push_back( { Alike, Camera, &rFile } );
+      }
     }
   }
-  return pBest;
+  std::stable_sort( Pairs.begin(), Pairs.end(),
+                    []( const VPair& i_rA, const VPair& i_rB )
+                    {
+                      return i_rA.Alike > i_rB.Alike;
+                    } );
+  std::vector< VFile* > Files( rCameras.size() );
+  for ( const VPair& rPair : Pairs )
+  {
+    if ( !Files[rPair.Camera] && !rPair.pFile->bTaken )
+    {
+      Files[rPair.Camera] = rPair.pFile;
+      rPair.pFile->bTaken = true;
+    }
+  }
+  return Files;
 }
 
 /// False when it was stopped.
@@ -150,13 +202,17 @@ bool VFolderVideos::Scan( const VFile& i_rFile, VRecordingCamera& io_rCamera, co
   }
   if ( Scanned.IsError() )
   {
-    Note( "The video of the camera \"" + io_rCamera.Camera.Name + "\" cannot be shown: " + ToUtf8( Message ) + "." );
+    Note( std::string( "The video of the camera \"" )
+              .append( io_rCamera.Camera.Name )
+              .append( "\" cannot be shown: " )
+              .append( ToUtf8( Message ) )
+              .append( "." ) );
     return true;
   }
   pClip->Name = ToUtf8( pClip->Name );
   for ( const std::string& rNote : pClip->Notes )
   {
-    Note( "The video " + pClip->Name + ": " + rNote );
+    Note( std::string( "The video " ).append( pClip->Name ).append( ": " ).append( rNote ) );
   }
   auto& rHardware = io_rCamera.Camera.Hardware;
   rHardware.Video = true;
@@ -168,9 +224,15 @@ bool VFolderVideos::Scan( const VFile& i_rFile, VRecordingCamera& io_rCamera, co
   }
   if ( rHardware.SensorWidth != pClip->Width || rHardware.SensorHeight != pClip->Height )
   {
-    Note( "The video " + pClip->Name + " is " + SizeText( pClip->Width, pClip->Height ) + ", the sensor of \"" +
-          io_rCamera.Camera.Name + "\" " + SizeText( rHardware.SensorWidth, rHardware.SensorHeight ) +
-          "; it is stretched to the whole sensor." );
+    Note( std::string( "The video " )
+              .append( pClip->Name )
+              .append( " is " )
+              .append( SizeText( pClip->Width, pClip->Height ) )
+              .append( ", the sensor of \"" )
+              .append( io_rCamera.Camera.Name )
+              .append( "\" " )
+              .append( SizeText( rHardware.SensorWidth, rHardware.SensorHeight ) )
+              .append( "; it is stretched to the whole sensor." ) );
   }
   io_rCamera.Video.pClip = pClip;
   return true;
@@ -189,14 +251,15 @@ void VFolderVideos::TellRest()
   }
   if ( !Without.empty() )
   {
-    Note( "Cameras without a video: " + Without + "." );
+    Note( std::string( "Cameras without a video: " ).append( Without ).append( "." ) );
   }
   for ( const VFile& rFile : m_Files )
   {
     if ( !rFile.bTaken )
     {
-      Note( "The video " + ToUtf8( rFile.Path.filename().string() ) +
-            " is not shown: by its name it is of no camera, or of one that has another." );
+      Note( std::string( "The video " )
+                .append( ToUtf8( rFile.Path.filename().string() ) )
+                .append( " is not shown: by its name it is of no camera, or of one that has another." ) );
     }
   }
 }
@@ -210,22 +273,17 @@ bool VFolderVideos::Find( const VFolderFiles& i_rFiles, VRecording& io_rRecordin
     return true;
   }
   const auto Count = static_cast< double >( std::max< std::size_t >( io_rRecording.Cameras.size(), 1 ) );
-  double Done = 0;
-  for ( VRecordingCamera& rCamera : io_rRecording.Cameras )
+  const std::vector< VFile* > Files = Assign();
+  for ( std::size_t Camera = 0; Camera < Files.size(); ++Camera )
   {
-    if ( VFile* const pFile = BestFor( rCamera.Camera ) )
+    const auto Part = [&]( double i_Fraction )
     {
-      pFile->bTaken = true;
-      const auto Part = [&]( double i_Fraction )
-      {
-        return !i_rProgress || i_rProgress( ( Done + i_Fraction ) / Count );
-      };
-      if ( !Scan( *pFile, rCamera, Part ) )
-      {
-        return false;
-      }
+      return !i_rProgress || i_rProgress( ( static_cast< double >( Camera ) + i_Fraction ) / Count );
+    };
+    if ( Files[Camera] && !Scan( *Files[Camera], io_rRecording.Cameras[Camera], Part ) )
+    {
+      return false;
     }
-    ++Done;
   }
   TellRest();
   return true;
@@ -257,22 +315,33 @@ void VFolderVideos::Match( std::int64_t i_First, std::int64_t i_Count, VRecordin
     const std::int64_t More = rClip.FrameCount() - Count;
     const bool bSameRate = std::abs( rClip.RateHz - io_rRecording.RateHz ) <= SameRate * io_rRecording.RateHz;
     const bool bAlike = std::abs( More ) <= FewFrames;
-    // Numbers of detections that begin later are those of the video's frames, if it has as many.
-    rVideo.FirstFrame = !bAlike && i_First > 0 && rClip.FrameCount() >= i_First + Count - FewFrames ? i_First : 0;
+    // Numbers of detections that begin later are those of the video's frames, if it has as many; those that begin
+    // with 1 merely count from it.
+    rVideo.FirstFrame = !bAlike && i_First > 1 && rClip.FrameCount() - Count + FewFrames >= i_First ? i_First : 0;
     rVideo.bByNumber = bAlike || rVideo.FirstFrame > 0 || ( bSameRate && rClip.bEven );
     if ( !bSameRate && rClip.RateHz > 0 )
     {
-      io_rRecording.Notes.push_back( "The video " + rClip.Name + " has " + Rounded( rClip.RateHz ) +
-                                     " frames a second, the recording " + Rounded( io_rRecording.RateHz ) +
-                                     ( rVideo.bByNumber ? "; they are shown frame by frame, as there are as many."
-                                                        : "; the frame nearest in time is shown." ) );
+      io_rRecording.Notes.push_back( std::string( "The video " )
+                                         .append( rClip.Name )
+                                         .append( " has " )
+                                         .append( Rounded( rClip.RateHz ) )
+                                         .append( " frames a second, the recording " )
+                                         .append( Rounded( io_rRecording.RateHz ) )
+                                         .append( rVideo.bByNumber
+                                                      ? "; they are shown frame by frame, as there are as many."
+                                                      : "; the frame nearest in time is shown." ) );
     }
     if ( rVideo.bByNumber && rVideo.FirstFrame == 0 && More != 0 )
     {
       const bool bEndsEarly = rClip.FrameCount() < io_rRecording.FrameCount;
-      io_rRecording.Notes.push_back( "The video " + rClip.Name + " has " + std::to_string( rClip.FrameCount() ) +
-                                     " frames, the camera's detections " + std::to_string( Count ) +
-                                     ( bEndsEarly ? "; its last one stays until the end." : "." ) );
+      io_rRecording.Notes.push_back( std::string( "The video " )
+                                         .append( rClip.Name )
+                                         .append( " has " )
+                                         .append( std::to_string( rClip.FrameCount() ) )
+                                         .append( " frames, the " )
+                                         .append( i_Count > 0 ? "camera's detections " : "recording " )
+                                         .append( std::to_string( Count ) )
+                                         .append( bEndsEarly ? "; its last one stays until the end." : "." ) );
     }
   }
 }

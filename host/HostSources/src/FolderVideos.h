@@ -16,7 +16,8 @@ class VFolderVideos
 {
 public:
   /// A file is a camera's by its name, or that of its folder: "cam01", "Trial_cam_01" and "Cam 1" are all the camera
-  /// "cam_01". Each is read through once; one that cannot be used stands in the notes. False when it was stopped.
+  /// "cam_01". A file goes to the camera that it is most surely of. Each is read through once; one that cannot be used
+  /// stands in the notes. False when it was stopped.
   bool Find( const VFolderFiles& i_rFiles, VRecording& io_rRecording, const VProgress& i_rProgress );
   /// The rate of the first video that has one; 0 without any.
   static double RateHz( const VRecording& i_rRecording );
@@ -28,11 +29,11 @@ private:
   struct VFile
   {
     std::filesystem::path Path;
-    std::string Stem, Folder; ///< letters and digits in lower case; no folder for one that lies beside the rest
+    std::string Stem, Folder; ///< no folder for one that lies beside the rest
     bool bTaken = false;
   };
   void List( const VFolderFiles& i_rFiles );
-  VFile* BestFor( const VCalibratedCamera& i_rCamera );
+  std::vector< VFile* > Assign();
   bool Scan( const VFile& i_rFile, VRecordingCamera& io_rCamera, const VProgress& i_rProgress );
   void TellRest();
   void Note( std::string i_Text ) { m_pRecording->Notes.push_back( std::move( i_Text ) ); }

@@ -66,7 +66,7 @@ ZEK::IResult VJoin::ReadDetections()
 {
   const auto First = [&]( double i_Fraction )
   {
-    return !m_rProgress || m_rProgress( i_Fraction * 0.8 );
+    return !m_rProgress || m_rProgress( i_Fraction * 0.4 );
   };
   ZEK::IResult Result = ReadDetectionTables( m_Files, m_Detections, m_rRecording, m_rMessage, First );
   if ( Result.IsOk() && m_Detections.Form.empty() )
@@ -92,7 +92,7 @@ ZEK::IResult VJoin::ReadPoints()
   VRecording Points;
   const auto Second = [&]( double i_Fraction )
   {
-    return !m_rProgress || m_rProgress( 0.8 + i_Fraction * 0.2 );
+    return !m_rProgress || m_rProgress( 0.4 + i_Fraction * 0.1 );
   };
   std::string Message;
   const ZEK::IResult Result = ReadRecording( *It, Points, Message, Second );
@@ -274,7 +274,7 @@ bool VJoin::FindVideos()
 {
   const auto Last = [&]( double i_Fraction )
   {
-    return !m_rProgress || m_rProgress( std::min( i_Fraction, 1.0 ) );
+    return !m_rProgress || m_rProgress( 0.5 + std::min( i_Fraction, 1.0 ) * 0.5 );
   };
   if ( !VFolderVideos().Find( m_Files, m_rRecording, Last ) )
   {
@@ -283,8 +283,8 @@ bool VJoin::FindVideos()
   }
   if ( !m_bPointFile )
   {
-    const double FromVideo = m_Detections.bPersons ? VFolderVideos::RateHz( m_rRecording ) : 0;
-    TakeRate( m_Detections.bPersons ? FromVideo : m_rRecording.RateHz, m_rRecording );
+    const double FromVideo = m_Detections.bRateKnown ? 0 : VFolderVideos::RateHz( m_rRecording );
+    TakeRate( m_Detections.bRateKnown ? m_rRecording.RateHz : FromVideo, m_rRecording );
     if ( FromVideo > 0 && m_rRecording.RateHz == FromVideo )
     {
       Note( "The frame rate is that of the videos." );

@@ -7,6 +7,7 @@
 #include <HostSources/VRecordingSource.h>
 #include <HostSources/VSourcePump.h>
 
+#include <chrono>
 #include <fstream>
 #include <map>
 #include <thread>
@@ -75,7 +76,15 @@ protected:
   {
     auto pRecording = std::make_shared< VRecording >();
     std::string Message;
-    EXPECT_EQ( ReadFolder( i_rPath, *pRecording, Message ), ZEK::IResult( ZEK::IResult::Ok ) ) << Message;
+    double Done = 0;
+    const auto Progress = [&]( double i_Fraction )
+    {
+      EXPECT_LE( Done, i_Fraction );
+      Done = i_Fraction;
+      return true;
+    };
+    EXPECT_EQ( ReadFolder( i_rPath, *pRecording, Message, Progress ), ZEK::IResult( ZEK::IResult::Ok ) ) << Message;
+    EXPECT_LE( Done, 1 );
     m_Notes.clear();
     for ( const std::string& rNote : pRecording->Notes )
     {
@@ -189,13 +198,20 @@ TEST_F( FolderVideo, PlaybackGoesOnAndCatchesUp )
     Pump.WaitShown();
     // The frame of the recording is there at once, that of the video as soon as it is decoded, with nobody asking.
     ASSERT_EQ( Newest()->GetKey().Frame, Index * pSource->TicksPerFrame() );
-    while ( HostVideo::ShownNumber( FrameOf( VideosOf( Newest() ), "cam" ) ) != Index || VideosOf( Newest() ).empty() )
+    const auto IsThere = [&]
+    {
+      const VVideoItems Items = VideosOf( Newest() );
+      return !Items.empty() && HostVideo::ShownNumber( FrameOf( Items, "cam" ) ) == Index;
+    };
+    const auto End = std::chrono::steady_clock::now() + std::chrono::seconds( 30 );
+    while ( !IsThere() && std::chrono::steady_clock::now() < End )
     {
       std::this_thread::yield();
     }
+    ASSERT_TRUE( IsThere() );
     EXPECT_EQ( Pump.ShownIndex(), Index );
   }
-  // A run without pauses shows every frame of the recording, whatever the video does.
+  // A run without pauses ends with the frame that was asked for last, whatever the video does.
   for ( std::int64_t Index = 41; Index < 120; ++Index )
   {
     Pump.Show( Index );
@@ -212,11 +228,47 @@ TEST_F( FolderVideo, PlaybackGoesOnAndCatchesUp )
 
 TEST_F( FolderVideo, NumbersOfDetectionsThatBeginLaterAreThoseOfTheVideo )
 {
-  SaveDetections( "cam01", 20, 35 );
-  SaveVideo( "cam01/whole.mp4", 80, 60 );
-  VRecordingSource Source( Read( m_Folder.Path() ) );
-  EXPECT_EQ( HostVideo::ShownNumber( FrameOf( Videos( Source, 0 ), "cam01" ) ), 35 );
-  EXPECT_EQ( HostVideo::ShownNumber( FrameOf( Videos( Source, 19 ), "cam01" ) ), 54 );
+  // Numbers from 1 on merely count.
+  for ( const auto& [First, Shown] : { std::pair{ 35, 35 }, { 1, 0 }, { 0, 0 } } )
+  {
+    SCOPED_TRACE( First );
+    const std::string Folder = std::to_string( First ).append( "/" );
+    SaveDetections( Folder + "cam01", 20, First );
+    SaveVideo( Folder + "cam01/whole.mp4", 80, 60 );
+    VRecordingSource Source( Read( m_Folder.Path() / Folder ) );
+    EXPECT_EQ( HostVideo::ShownNumber( FrameOf( Videos( Source, 0 ), "cam01" ) ), Shown );
+    EXPECT_EQ( HostVideo::ShownNumber( FrameOf( Videos( Source, 19 ), "cam01" ) ), Shown + 19 );
+  }
+}
+
+TEST_F( FolderVideo, TablesWithoutTimesTakeTheRateOfTheVideos )
+{
+  std::string Rows = "sync_index,cam_id,object_id,keypoint_id,img_loc_x,img_loc_y\n";
+  for ( int Frame = 0; Frame < 20; ++Frame )
+  {
+    Rows.append( std::to_string( Frame ) ).append( ",0,0,0,10,20\n" );
+  }
+  Save( "points2d.csv", Rows );
+  EXPECT_EQ( Read( m_Folder.Path() )->RateHz, 100 );
+  EXPECT_THAT( m_Notes, HasSubstr( "100 Hz was taken" ) );
+  SaveVideo( "cam_0.mp4", 20, 50 );
+  EXPECT_EQ( Read( m_Folder.Path() )->RateHz, 50 );
+  EXPECT_THAT( m_Notes, HasSubstr( "The frame rate is that of the videos." ) );
+  EXPECT_THAT( m_Notes, Not( HasSubstr( "100 Hz" ) ) );
+  Save( "times.csv", "sync_index,cam_id,frame_time\n0,0,0\n19,0,0.76\n" );
+  EXPECT_NEAR( Read( m_Folder.Path() )->RateHz, 25, 1e-9 );
+}
+
+TEST_F( FolderVideo, AFileGoesToTheCameraThatItIsMostSurelyOf )
+{
+  SaveDetections( "left", 5 );
+  SaveDetections( "left_rear", 5 );
+  SaveVideo( "videos/left_rear.mp4", 5, 60 );
+  const auto pR = Read( m_Folder.Path() );
+  ASSERT_EQ( pR->Cameras.size(), 2u );
+  EXPECT_FALSE( pR->Cameras[0].Video.pClip );
+  EXPECT_TRUE( pR->Cameras[1].Video.pClip );
+  EXPECT_THAT( m_Notes, HasSubstr( "Cameras without a video: \"left\"." ) );
 }
 
 TEST_F( FolderVideo, AFileIsThatOfTheCameraItIsNamedAfter )
@@ -230,7 +282,10 @@ TEST_F( FolderVideo, AFileIsThatOfTheCameraItIsNamedAfter )
                 { "cam_01", "v/camera 1.mov", true }, { "cam_01", "v/1.mp4", true },
                 { "cam_01", "v/trial1.mp4", false },  { "left", "v/Trial 3 left.mp4", true },
                 { "left", "v/right.mp4", false },     { "cam_10", "v/cam_1.mp4", false },
-                { "cam_01", "v/cam_01.txt", false } };
+                { "cam_01", "v/cam_01.txt", false },  { "a", "v/Gait_b.mp4", false },
+                { "a", "v/Gait_a.mp4", true },        { "a", "v/A take 2.mp4", true },
+                { "left", "v/GaitLeft.mp4", true },   { "a1", "v/gamma1.mp4", false },
+                { "left", "v/leftover.mp4", false },  { "cam_01", "v/StaticCam01.mp4", true } };
   int Number = 0;
   for ( const auto& rCase : Cases )
   {
