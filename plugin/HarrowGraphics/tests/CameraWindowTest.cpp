@@ -1,4 +1,4 @@
-#include "../src/CameraTileData.h"
+#include "CameraTileData.h"
 
 #include <HarrowGraphics/VCameraModelStateCacheDataSource.h>
 #include <HarrowGraphics/VHarrowScene.h>
