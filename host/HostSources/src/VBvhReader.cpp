@@ -1,6 +1,7 @@
 #include <HostSources/VBvhReader.h>
 
 #include "BvhSkeleton.h"
+#include "BvhWords.h"
 #include "ReaderSupport.h"
 #include "TrcText.h"
 #include "UpAxis.h"
@@ -18,7 +19,6 @@ namespace
 {
 constexpr std::string_view Mark = "HIERARCHY";
 constexpr std::string_view ByteOrderMark = "\xEF\xBB\xBF";
-constexpr std::string_view Spaces = " \t\r\n\f\v";
 constexpr double Centimetre = 10; // mm
 constexpr double Farthest = 1e9;  // mm
 constexpr std::size_t MostJoints = 4096;
@@ -40,56 +40,6 @@ std::string Quote( std::string_view i_Text )
   return i_Text.empty() ? std::string( "the end of the file" )
                         : std::string( "\"" ).append( ToUtf8( i_Text.substr( 0, 40 ) ) ).append( "\"" );
 }
-
-/// Steps through words, whatever stands between them.
-class VWords
-{
-public:
-  explicit VWords( std::string_view i_Text )
-    : m_Text( i_Text )
-  {
-  }
-
-  /// Empty at the end of the text.
-  std::string_view Next()
-  {
-    Skip( Spaces );
-    const std::size_t End = std::min( m_Text.find_first_of( Spaces, m_At ), m_Text.size() );
-    const std::string_view Word = m_Text.substr( m_At, End - m_At );
-    m_At = End;
-    return Word;
-  }
-  /// What is left of the line before a brace, without the spaces about it.
-  std::string_view NextName()
-  {
-    Skip( " \t\r" );
-    const std::size_t End = std::min( m_Text.find_first_of( "\n{", m_At ), m_Text.size() );
-    std::string_view Name = m_Text.substr( m_At, End - m_At );
-    m_At = End;
-    return Name.substr( 0, Name.find_last_not_of( Spaces ) + 1 );
-  }
-  bool IsAtEnd()
-  {
-    Skip( Spaces );
-    return m_At == m_Text.size();
-  }
-  std::uint64_t Line() const { return m_Line; }
-  std::size_t Position() const { return m_At; }
-  std::size_t Left() const { return m_Text.size() - m_At; }
-
-private:
-  void Skip( std::string_view i_What )
-  {
-    while ( m_At < m_Text.size() && i_What.find( m_Text[m_At] ) != std::string_view::npos )
-    {
-      m_Line += m_Text[m_At++] == '\n' ? 1u : 0u;
-    }
-  }
-
-  std::string_view m_Text;
-  std::size_t m_At = 0;
-  std::uint64_t m_Line = 1;
-};
 
 class VReader
 {
@@ -130,6 +80,7 @@ private:
   ZEK::IResult ReadChannels();
   ZEK::IResult ReadNumberOf( const char* i_pWhat, double& o_rValue );
   ZEK::IResult ReadMotionHeader();
+  bool HasRoom( std::size_t i_Rows );
   ZEK::IResult ReadRows();
   ZEK::IResult TakeRow( std::vector< double >& io_rRow );
   ZEK::IResult Finish();
@@ -352,6 +303,21 @@ ZEK::IResult VReader::TakeRow( std::vector< double >& io_rRow )
   return {};
 }
 
+/// Files of short numbers, or of joints that say little of themselves, take far more room in memory than on disk.
+bool VReader::HasRoom( std::size_t i_Rows )
+{
+  const double Needed =
+      static_cast< double >( i_Rows ) * static_cast< double >( m_Skeleton.StateSize ) * sizeof( double );
+  if ( Needed <= MostPerByte * static_cast< double >( m_Size ) + LeastMost )
+  {
+    return true;
+  }
+  m_rMessage = std::string( "expected poses in proportion to the file, found some that need " )
+                   .append( std::to_string( static_cast< std::uint64_t >( Needed / Mebibyte ) ) )
+                   .append( " MiB of memory" );
+  return false;
+}
+
 ZEK::IResult VReader::ReadRows()
 {
   const auto Channels = static_cast< std::size_t >( m_Skeleton.ChannelCount );
@@ -367,14 +333,8 @@ ZEK::IResult VReader::ReadRows()
                                     } );
     m_Skeleton.StateSize += rJoint.Channels.empty() ? 0 : bFree ? 6 : 3;
   }
-  // Files of short numbers, or of joints that say little of themselves, take far more room in memory than on disk.
-  const double Needed =
-      static_cast< double >( Rows ) * static_cast< double >( m_Skeleton.StateSize ) * sizeof( double );
-  if ( Needed > MostPerByte * static_cast< double >( m_Size ) + LeastMost )
+  if ( !HasRoom( Rows ) )
   {
-    m_rMessage = std::string( "expected poses in proportion to the file, found some that need " )
-                     .append( std::to_string( static_cast< std::uint64_t >( Needed / Mebibyte ) ) )
-                     .append( " MiB of memory" );
     return ZEK::IResult::NotSupported;
   }
   m_Skeleton.States.reserve( Rows * m_Skeleton.StateSize );
