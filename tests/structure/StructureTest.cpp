@@ -115,11 +115,10 @@ TEST( Structure, ARoomIncludesOnlyRoomsBelowItAndOnlyTheirPublicHeaders )
         ++Seen;
         EXPECT_TRUE( fs::exists( TestSupport::SourceDir() / Rooms[Other] / "include" / rInclude.Header ) )
             << rFile << " includes " << rInclude.Header << ", which is not public";
-        const bool bHostAndPlugin = Rooms[Room].starts_with( "host/" ) && Rooms[Other].starts_with( "plugin/" ) &&
-                                    ModuleOf( Rooms[Other] ) != "UtilsFileSystem" &&
-                                    ModuleOf( Rooms[Other] ) != "ComputeCameraModel" &&
-                                    ModuleOf( Rooms[Other] ) != "ComputeSubjectFK" &&
-                                    ModuleOf( Rooms[Other] ) != "Store";
+        const bool bHostAndPlugin =
+            Rooms[Room].starts_with( "host/" ) && Rooms[Other].starts_with( "plugin/" ) &&
+            ModuleOf( Rooms[Other] ) != "UtilsFileSystem" && ModuleOf( Rooms[Other] ) != "ComputeCameraModel" &&
+            ModuleOf( Rooms[Other] ) != "ComputeSubjectFK" && ModuleOf( Rooms[Other] ) != "Store";
         EXPECT_TRUE( IsTest( rFile ) || ( Other < Room && !bHostAndPlugin ) )
             << rFile << " includes " << rInclude.Header << ", which lies above it or on the other side";
       }

@@ -125,11 +125,10 @@ void* VDynamicBuffer::Map( std::size_t i_Bytes )
   }
   // A pending draw keeps what it reads: the driver gives the buffer other memory where there is one.
   const bool bLarge = RoundUp( i_Bytes ) >= LargeWrite;
-  void* pMemory =
-      m_Buffer.mapRange( int( m_Head ), int( i_Bytes ),
-                         bLarge ? QOpenGLBuffer::RangeWrite | QOpenGLBuffer::RangeInvalidateBuffer
-                                : QOpenGLBuffer::RangeWrite | QOpenGLBuffer::RangeInvalidate |
-                                      QOpenGLBuffer::RangeUnsynchronized );
+  void* pMemory = m_Buffer.mapRange( int( m_Head ), int( i_Bytes ),
+                                     bLarge ? QOpenGLBuffer::RangeWrite | QOpenGLBuffer::RangeInvalidateBuffer
+                                            : QOpenGLBuffer::RangeWrite | QOpenGLBuffer::RangeInvalidate |
+                                                  QOpenGLBuffer::RangeUnsynchronized );
   if ( !pMemory )
   {
     m_Capacity = 0; // the storage itself may be missing: ask for it anew next time

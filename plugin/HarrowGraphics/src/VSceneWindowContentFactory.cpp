@@ -34,8 +34,8 @@ void VSceneWindowContentFactory::Create(
   Arguments.pCameraData = Scene.pCameraData;
   if ( Scene.pScene && m_Kind == EWindowKindCameras )
   {
-    Arguments.pCameraData = std::make_shared< Flow2Graphics::VContributionTileData >( Scene.pCameraData,
-                                                                                      Scene.pScene->Contributions() );
+    Arguments.pCameraData =
+        std::make_shared< Flow2Graphics::VContributionTileData >( Scene.pCameraData, Scene.pScene->Contributions() );
   }
   Arguments.pQuickHost = m_rWorkspace.QuickHost();
   Arguments.pSelection = m_rApplication.Selection();
