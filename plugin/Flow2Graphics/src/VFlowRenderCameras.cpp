@@ -34,11 +34,14 @@ std::uint32_t CellsOf( const VFlowRenderCamera& i_rCamera )
   return pMask ? MoxelGraphics::CellCount( *pMask ) : 0;
 }
 
-/// Whether the camera or a cell of its mask is selected.
-bool IsEdited( const VCameraMarks& i_rMarks )
+bool IsSelected( const VCameraMarks& i_rMarks )
 {
-  return ( i_rMarks.Device & MoxelGraphics::EIdSelected ) != 0 ||
-         std::any_of( i_rMarks.MaskCells.begin(), i_rMarks.MaskCells.end(),
+  return ( i_rMarks.Device & MoxelGraphics::EIdSelected ) != 0;
+}
+
+bool HasSelectedCells( const VCameraMarks& i_rMarks )
+{
+  return std::any_of( i_rMarks.MaskCells.begin(), i_rMarks.MaskCells.end(),
                       []( const VCameraMarks::VMember& i_rCell )
                       {
                         return ( i_rCell.Flags & MoxelGraphics::EIdSelected ) != 0;
@@ -93,7 +96,7 @@ VFlowRenderCameras::VFlowRenderCameras( MoxelGraphics::VMoxelScene& i_rScene,
 {
 }
 
-void VFlowRenderCameras::Update( const ZEK::IFlowState& )
+void VFlowRenderCameras::Update( const ZEK::IFlowState& i_rState )
 {
   if ( TakeCameras() )
   {
@@ -101,8 +104,9 @@ void VFlowRenderCameras::Update( const ZEK::IFlowState& )
   }
   GiveBodyIds();
   TakePictures();
+  SettleWand( i_rState.GetKey() );
   GiveCellIds();
-  SetPictures( m_Pictures, m_NewestWand );
+  SetPictures( m_Pictures, m_NewestWand + m_WandAge );
 }
 
 void VFlowRenderCameras::GiveBodyIds()
@@ -137,6 +141,7 @@ void VFlowRenderCameras::TakePictures()
   const auto& rCameras = m_pCameras->FlowCameras();
   const std::uint64_t Generation = m_rScene.Registry().MarksGeneration();
   const bool bMarks = std::exchange( m_MarksGeneration, Generation ) != Generation;
+  m_Seen = {};
   m_Kept.resize( rCameras.size() );
   m_Pictures.resize( rCameras.size() );
   for ( std::size_t Index = 0; Index < rCameras.size(); ++Index )
@@ -200,12 +205,10 @@ void VFlowRenderCameras::TakeWand( VKept& io_rKept, VCameraPictures& io_rPicture
   if ( !rPoints.empty() && Newest < rPoints.back().Frame )
   {
     rPoints.clear();
+    m_Seen.bBack = true;
   }
-  if ( m_NewestWand > static_cast< double >( Newest + WandFrames ) )
-  {
-    m_NewestWand = 0;
-  }
-  m_NewestWand = std::max( m_NewestWand, static_cast< double >( Newest ) );
+  m_Seen.bAny = m_Seen.bAny || rPoints.empty() || Newest > rPoints.back().Frame;
+  m_Seen.Newest = std::max( m_Seen.Newest, static_cast< double >( Newest ) );
   const float Known = rPoints.empty() ? -std::numeric_limits< float >::infinity() : rPoints.back().Frame;
   for ( const VCameraWand2d::P& rPoint : pWand->Points )
   {
@@ -231,25 +234,59 @@ void VFlowRenderCameras::TakeWand( VKept& io_rKept, VCameraPictures& io_rPicture
   io_rPictures.WandGeneration = ++m_Generation;
 }
 
+void VFlowRenderCameras::SettleWand( const ZEK::VFlowTimeKey& i_rKey )
+{
+  if ( !m_Seen.bAny )
+  {
+    // The wand is gone, and what it left grows old with the states.
+    const std::int64_t Frames = ( i_rKey.Frame - m_WandState ) / std::max< std::int64_t >( i_rKey.Span, 1 );
+    m_WandAge = static_cast< double >( std::max< std::int64_t >( Frames, 0 ) );
+    return;
+  }
+  m_WandState = i_rKey.Frame;
+  m_WandAge = 0;
+  const bool bAnew = m_Seen.bBack || m_NewestWand > m_Seen.Newest + static_cast< double >( WandFrames );
+  m_NewestWand = bAnew ? m_Seen.Newest : std::max( m_NewestWand, m_Seen.Newest );
+  for ( std::size_t Index = 0; m_Seen.bBack && Index < m_Kept.size(); ++Index )
+  {
+    // A camera that does not see the wand now would show for ever what is yet to come.
+    std::vector< MoxelGraphics::VWandPoint >& rPoints = m_Kept[Index].Wand;
+    if ( !rPoints.empty() && static_cast< double >( rPoints.back().Frame ) > m_NewestWand )
+    {
+      rPoints.clear();
+      m_Pictures[Index].Wand = {};
+      m_Pictures[Index].WandGeneration = ++m_Generation;
+    }
+  }
+}
+
 std::shared_ptr< VFlowRenderCamera > VFlowRenderCameras::EditedCamera() const
 {
-  std::shared_ptr< VFlowRenderCamera > pEdited;
+  std::shared_ptr< VFlowRenderCamera > pSelected, pWithCells;
+  std::size_t Selected = 0, WithCells = 0;
   if ( m_rScene.Registry().Marks().empty() )
   {
-    return pEdited;
+    return nullptr;
   }
   for ( const std::shared_ptr< VFlowRenderCamera >& rpCamera : m_pCameras->FlowCameras() )
   {
-    if ( IsEdited( rpCamera->GetMarks() ) )
+    const VCameraMarks& rMarks = rpCamera->GetMarks();
+    if ( IsSelected( rMarks ) )
     {
-      if ( pEdited )
-      {
-        return nullptr;
-      }
-      pEdited = rpCamera;
+      ++Selected;
+      pSelected = rpCamera;
+    }
+    if ( HasSelectedCells( rMarks ) )
+    {
+      ++WithCells;
+      pWithCells = rpCamera;
     }
   }
-  return pEdited;
+  if ( Selected != 0 )
+  {
+    return Selected == 1 ? pSelected : nullptr;
+  }
+  return WithCells == 1 ? pWithCells : nullptr;
 }
 
 void VFlowRenderCameras::GiveCellIds()

@@ -229,6 +229,9 @@ TEST_F( VCameraTiles, CellsOfTheOneSelectedCameraArePickedWhereTheyAreSeen )
   pScene->Select( { Cell( Name( 2 ), 5 ) } );
   DrawGrid();
   EXPECT_EQ( Grid.Frame().Result().Ids.size(), 1u ) << "a selected cell keeps its camera's mask open";
+  pScene->Select( { Cell( Name( 1 ), 5 ), Device( 2 ) } );
+  DrawGrid();
+  EXPECT_EQ( Grid.Frame().Result().Ids.size(), 1u ) << "cells of the camera before are in nobody's way";
 }
 
 TEST_F( VCameraTiles, WhatDisagreesOrIsNoNumberIsNotShown )
@@ -323,4 +326,46 @@ TEST_F( VCameraTiles, TheWandSmearsOverItsNewestFramesAndBeginsAnewWhenTimeGoesB
   const int Later = Lit( 500, 500 );
   EXPECT_LT( std::abs( Later - Full ), Full / 4 ) << "500 frames are kept";
   EXPECT_NEAR( Lit( 0, 20 ), Few, 5 ) << "time went back";
+}
+
+TEST_F( VCameraTiles, WhatTheWandLeftAgesWithTheWandAndThenWithTheStates )
+{
+  GridOptions().CameraWandSmear = true;
+  Show();
+  const QImage Empty = DrawGrid();
+  const auto Sees = [&]( std::initializer_list< int > i_First )
+  {
+    Items.resize( 12 );
+    std::size_t Camera = 0;
+    for ( const int First : i_First )
+    {
+      Give< FlowCameraWand2d >( Camera++, Wand( First, 20 ) );
+    }
+    Show();
+    return DrawGrid();
+  };
+  const QImage Fresh = Sees( { 100 } );
+  EXPECT_NE( Sees( { 400, 400 } ), Fresh );
+  EXPECT_EQ( Sees( { 100 } ), Fresh ) << "time went back; what the second camera is yet to see is not there";
+  // No camera sees it any more: what it left turns from orange to blue.
+  const auto Warmth = [&]( std::int64_t i_States )
+  {
+    Items.resize( 12 );
+    Frame += i_States;
+    Show();
+    const QImage Picture = DrawGrid();
+    EXPECT_NE( Picture, Empty );
+    int Sum = 0;
+    for ( int Pixel = 0; Pixel < 320 * 256; ++Pixel )
+    {
+      const QRgb Colour = Picture.pixel( Pixel % 320, Pixel / 320 );
+      Sum += qRed( Colour ) - qBlue( Colour );
+    }
+    return Sum;
+  };
+  const int New = Warmth( 0 ), Half = Warmth( 250 );
+  EXPECT_GT( New, Half + 1000 );
+  EXPECT_LT( Warmth( 250 ), std::min( Half - 1000, 0 ) );
+  Sees( { 700 } );
+  EXPECT_GT( Warmth( 0 ), Half + 1000 ) << "seen again, it is new again";
 }

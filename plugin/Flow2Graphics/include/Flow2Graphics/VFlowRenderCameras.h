@@ -7,6 +7,7 @@
 #include <MoxelGraphics/VSelectionRegistry.h>
 
 #include <cstdint>
+#include <limits>
 #include <memory>
 #include <vector>
 
@@ -25,8 +26,9 @@ public:
 };
 
 /// Feeds the cameras of the provider, with the ids of their bodies and, of the one camera whose mask can be edited,
-/// those of its cells: the only one that is selected or has cells that are. What a wand leaves in a camera's view is
-/// kept for its newest 500 frames. A frame in which nothing changed costs a few comparisons a camera.
+/// those of its cells: the only one that is selected or, where none is, the only one with cells that are. What a wand
+/// leaves in a camera's view is kept for its newest 500 frames; it ages with the frames in which a camera saw the wand
+/// and, while none does, with those of the states. A frame in which nothing changed costs a few comparisons a camera.
 class VFlowRenderCameras : public MoxelGraphics::VRenderCameras, public IFlowRenderType
 {
 public:
@@ -50,10 +52,20 @@ private:
     std::vector< MoxelGraphics::VWandPoint > Wand;
   };
 
+  /// What this update brought of the wand.
+  struct VSeen
+  {
+    double Newest = -std::numeric_limits< double >::infinity();
+    bool bAny = false;  ///< it was seen in another frame
+    bool bBack = false; ///< a camera's time went back
+  };
+
   void GiveBodyIds();
   void TakePictures();
   static void TakeMarkedCells( VKept& io_rKept, MoxelGraphics::VCameraPictures& io_rPictures );
   void TakeWand( VKept& io_rKept, MoxelGraphics::VCameraPictures& io_rPictures );
+  /// After all cameras gave what they saw of the wand: what its age is counted from.
+  void SettleWand( const ZEK::VFlowTimeKey& i_rKey );
   void GiveCellIds();
   /// Null for none and for several.
   std::shared_ptr< VFlowRenderCamera > EditedCamera() const;
@@ -66,7 +78,10 @@ private:
   std::vector< MoxelGraphics::VCameraPictures > m_Pictures;
   std::uint64_t m_Generation = 0;
   std::uint64_t m_MarksGeneration = 0;
-  double m_NewestWand = 0; ///< the newest frame in which a camera saw the wand: age counts from there
+  VSeen m_Seen;
+  double m_NewestWand = 0;      ///< the newest frame in which a camera saw the wand
+  double m_WandAge = 0;         ///< states since then
+  std::int64_t m_WandState = 0; ///< the time of the state that brought it, in ticks
 };
 
 } // namespace Flow2Graphics
