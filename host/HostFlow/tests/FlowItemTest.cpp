@@ -1,6 +1,6 @@
 #include "FlowTestItems.h"
 
-#include "../src/VNameBook.h"
+#include "VNameBook.h"
 
 #include <TestSupport/LogGuard.h>
 
