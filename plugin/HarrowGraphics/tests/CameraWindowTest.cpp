@@ -177,6 +177,22 @@ TEST_F( CameraWindow, OverlaysStandOverTheirTilesAndHideWhatHasNoRoom )
         {
           return Tiles( *pContent ).size() == Count;
         } ) );
+    // Warnings are laid out a little after their tiles.
+    WaitFor(
+        [&]
+        {
+          const auto All = Tiles( *pContent );
+          return std::none_of( All.begin(), All.end(),
+                               []( const QQuickItem* i_pTile )
+                               {
+                                 const auto Parts = i_pTile->childItems();
+                                 return std::any_of( Parts.begin(), Parts.end(),
+                                                     []( const QQuickItem* i_pPart )
+                                                     {
+                                                       return i_pPart->isVisible() && i_pPart->size().isNull();
+                                                     } );
+                               } );
+        } );
     for ( QQuickItem* const pTile : Tiles( *pContent ) )
     {
       for ( QQuickItem* const pPart : pTile->childItems() )
