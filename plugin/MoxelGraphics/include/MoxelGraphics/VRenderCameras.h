@@ -91,8 +91,8 @@ public:
   /// selection word from EIdSelected up, shifted down by 21.
   void SetIds( std::uint32_t i_FirstId, std::span< const std::uint8_t > i_Flags );
   std::uint32_t FirstId() const { return m_FirstId; }
-  /// By the cameras' numbers, as many as the provider has cameras. `i_Frame` is that of the state, for the age of what
-  /// the wand left.
+  /// By the cameras' numbers, as many as the provider has cameras. `i_Frame` is the newest in which the wand was
+  /// seen, and the states since: the age of what the wand left counts from it.
   void SetPictures( std::span< const VCameraPictures > i_Pictures, double i_Frame );
 
   void SetPrimaryColour( const QVector4D& i_rColour ) { m_PrimaryColour = i_rColour; }
