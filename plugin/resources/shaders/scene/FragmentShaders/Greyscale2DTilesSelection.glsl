@@ -2,7 +2,9 @@
 uniform highp usamplerBuffer t_Lines; // a line: its first column, its length above bit 16; its first byte
 uniform highp samplerBuffer t_Pixels;
 #else
+#ifdef GL_ES
 precision highp int;
+#endif
 uniform highp usampler2D t_Lines;
 uniform sampler2D t_Pixels;
 #endif
