@@ -220,6 +220,30 @@ void VMainWindow::FillWindowMenu()
   {
     m_pWindowMenu->addAction( pDock->toggleViewAction() );
   }
+  FillContexts();
+}
+
+void VMainWindow::FillContexts()
+{
+  // The first two are the session's own, and the transport bar switches between them.
+  const std::vector< std::string > Names = m_rSession.Host().Contexts()->Names();
+  if ( Names.size() <= 2 )
+  {
+    return;
+  }
+  m_pWindowMenu->addSeparator();
+  const std::string Shown = m_rSession.Context()->Name();
+  for ( std::size_t Index = 2; Index < Names.size(); ++Index )
+  {
+    QAction* pAction = m_pWindowMenu->addAction(
+        tr( "Show %1" ).arg( QString::fromStdString( Names[Index] ).replace( '&', "&&" ) ), this,
+        [this, Name = Names[Index]]
+        {
+          m_rSession.ShowContext( m_rSession.Context()->Name() == Name ? std::string() : Name );
+        } );
+    pAction->setCheckable( true );
+    pAction->setChecked( Names[Index] == Shown );
+  }
 }
 
 void VMainWindow::FillPluginMenus()

@@ -126,6 +126,7 @@ HostSources::VStateMaker VSession::Maker( std::uint32_t i_Clock ) const
 
 void VSession::GoLive()
 {
+  m_OtherContext.clear();
   m_bLive = true;
   if ( !m_pLive )
   {
@@ -172,6 +173,7 @@ void VSession::GoPlayback()
   {
     return;
   }
+  m_OtherContext.clear();
   m_bLive = false;
   m_pHost->Activity()->SetName( "Playback" );
   Clock().SetPlayback( true );
@@ -229,8 +231,21 @@ const HostSources::IFrameSource* VSession::Source() const
   return m_pRecording.get();
 }
 
+void VSession::ShowContext( const std::string& i_rName )
+{
+  m_OtherContext = i_rName;
+  emit SourceChanged();
+}
+
 std::shared_ptr< HarrowPluginInterface::IStateCacheContext > VSession::Context() const
 {
+  if ( !m_OtherContext.empty() )
+  {
+    if ( auto pOther = m_pHost->Contexts()->Find( m_OtherContext ) )
+    {
+      return pOther;
+    }
+  }
   return m_pHost->Contexts()->Find( m_bLive ? HostServices::LiveContextName : HostServices::PlaybackContextName );
 }
 

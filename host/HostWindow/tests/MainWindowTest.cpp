@@ -11,6 +11,8 @@
 #include <QtCore/QThread>
 #include <QtGui/QDropEvent>
 #include <QtQml/QQmlComponent>
+#include <QtWidgets/QMenu>
+#include <QtWidgets/QMenuBar>
 #include <QtWidgets/QStatusBar>
 
 #include <gmock/gmock.h>
@@ -197,6 +199,39 @@ TEST_F( MainWindow, ARecordingTurnsTheViewsToPlaybackAndKeepsTheirState )
   m_pSession->GoLive();
   EXPECT_EQ( m_pFactory->Newest().Context, "Live" );
   EXPECT_EQ( m_pFactory->Newest().Mark, 42 );
+}
+
+TEST_F( MainWindow, ContextsOfThePlugInAreShownFromTheWindowMenuUntilTheCaptureIs )
+{
+  const auto Choose = [&]
+  {
+    QMenu* pMenu = nullptr;
+    for ( QAction* pAction : m_pWindow->menuBar()->actions() )
+    {
+      pMenu = pAction->text() == "&Window" ? pAction->menu() : pMenu;
+    }
+    emit pMenu->aboutToShow();
+    for ( QAction* pAction : pMenu->actions() )
+    {
+      if ( pAction->text() == "Show Made && Shown" )
+      {
+        pAction->trigger();
+        return true;
+      }
+    }
+    return false;
+  };
+  EXPECT_FALSE( Choose() );
+  std::shared_ptr< ZEK::IFlowWritableStateCache > pCache;
+  ASSERT_EQ( m_pSession->Host().CacheManager()->CreateCache( pCache, "Made & Shown", 0 ), ZEK::IResult::Ok );
+  ASSERT_TRUE( Choose() );
+  EXPECT_EQ( m_pFactory->Newest().Context, "Made & Shown" );
+  ASSERT_TRUE( Choose() );
+  EXPECT_EQ( m_pFactory->Newest().Context, "Live" );
+  ASSERT_TRUE( Choose() );
+  m_pSession->GoLive();
+  EXPECT_EQ( m_pFactory->Newest().Context, "Live" );
+  EXPECT_EQ( m_pFactory->Alive(), 1u );
 }
 
 TEST_F( MainWindow, ARecordingWaitsWhereTheOperatorWantsItTo )

@@ -63,6 +63,8 @@ private:
   void FillRecentMenu();
   void FillOpenedMenu();
   void FillWindowMenu();
+  /// Entries for contexts that the plug-in made.
+  void FillContexts();
   void FillPluginMenus();
   void ShowAbout();
 

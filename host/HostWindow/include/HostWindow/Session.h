@@ -53,6 +53,9 @@ public:
   const HostSources::IFrameSource* Source() const;
   /// The context that the views of now belong to.
   std::shared_ptr< HarrowPluginInterface::IStateCacheContext > Context() const;
+  /// The views show a context that neither capture nor recordings fill, such as one of the plug-in's, until they go
+  /// live or play again. One that is not there is not shown.
+  void ShowContext( const std::string& i_rName );
 
   /// The index of the frame in the cache; -1 before the first.
   std::int64_t ShownFrame() const;
@@ -89,6 +92,7 @@ private:
   std::unique_ptr< HostSources::VSourcePump > m_pPlaybackPump;
   HostSources::EUpAxis m_FoundUp = HostSources::EUpAxis::Z; ///< by the recording
   std::optional< HostSources::EUpAxis > m_UpChoice;
+  std::string m_OtherContext; ///< that the views show in place of capture or recording
   bool m_bLive = true;
   bool m_bSeen = true;
   std::int64_t m_LastShown = -1;
