@@ -57,8 +57,8 @@ public:
   /// Ends the tiles of a camera view: draws, for all of them at once and over each tile's world, what `Render` has only
   /// collected since the view was cleared. In `Render` the tile is the context's viewport, scissor and `View2D`, and
   /// the camera `VSceneOptions::OverlayCamera`. Viewport and scissor are the whole frame here, or what of it is looked
-  /// at by a pick. With the scene's `TilesAgain` the tiles of the last call are drawn once more: nothing changed, so the
-  /// view did not call `Render` for them.
+  /// at by a pick. With the scene's `TilesAgain` the tiles of the last call are drawn once more: nothing changed, so
+  /// the view did not call `Render` for them.
   virtual void RenderTiles( CoreGraphics::VRenderContext& /*io_rContext*/, const VSceneOptions& /*i_rOptions*/ ) {}
   /// Text and 2D decoration on top of the finished frame. A type that overrides this overrides `WantsPaint` too.
   virtual void Paint( QPainter& /*io_rPainter*/, CoreGraphics::VRenderContext& /*io_rContext*/,
