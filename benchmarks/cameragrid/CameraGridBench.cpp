@@ -103,7 +103,7 @@ BENCHMARK( Grow )
 int main( int i_Count, char** i_ppArguments )
 {
   QGuiApplication Application( i_Count, i_ppArguments );
-  VOffscreen The;
+  VOffscreen The( Width, Height );
   pOffscreen = &The;
   benchmark::Initialize( &i_Count, i_ppArguments );
   benchmark::RunSpecifiedBenchmarks();

@@ -4,8 +4,6 @@
 #include <HostFlow/VFlowFramework.h>
 
 #include <algorithm>
-#include <cstdio>
-#include <cstdlib>
 #include <random>
 
 namespace CameraGridBench
@@ -130,23 +128,6 @@ int BestRows( int i_Count )
   return Rows;
 }
 } // namespace
-
-VOffscreen::VOffscreen()
-{
-  QSurfaceFormat Format;
-  Format.setVersion( 4, 3 );
-  Format.setProfile( QSurfaceFormat::CoreProfile );
-  Format.setDepthBufferSize( 24 );
-  m_Surface.setFormat( Format );
-  m_Surface.create();
-  m_Context.setFormat( Format );
-  if ( !m_Context.create() || !m_Context.makeCurrent( &m_Surface ) )
-  {
-    std::fprintf( stderr, "no OpenGL context\n" );
-    std::exit( 1 );
-  }
-  m_pTarget = std::make_unique< QOpenGLFramebufferObject >( Width, Height, QOpenGLFramebufferObject::Depth );
-}
 
 std::string CameraName( int i_Camera )
 {

@@ -1,12 +1,10 @@
 #pragma once
 
+#include "../support/VOffscreen.h"
+
 #include <Flow2Graphics/VFlowScene.h>
 #include <MoxelGraphics/VCameraTile.h>
 #include <ZEK/FlowState.h>
-
-#include <QtGui/QOffscreenSurface>
-#include <QtGui/QOpenGLContext>
-#include <QtOpenGL/QOpenGLFramebufferObject>
 
 #include <memory>
 #include <string>
@@ -26,18 +24,7 @@ struct VWorkload
   bool bLens = false;  ///< the cameras are calibrated, and their data corrected for the lens
 };
 
-/// A current 4.3 core context without a window, and a target without samples.
-class VOffscreen
-{
-public:
-  VOffscreen();
-  QOpenGLFramebufferObject& Target() { return *m_pTarget; }
-
-private:
-  QOffscreenSurface m_Surface;
-  QOpenGLContext m_Context;
-  std::unique_ptr< QOpenGLFramebufferObject > m_pTarget;
-};
+using BenchSupport::VOffscreen;
 
 std::string CameraName( int i_Camera );
 

@@ -94,7 +94,7 @@ BENCHMARK( Floor )->Name( "scene/recons/floor_frame" )->Arg( 1000 )->Arg( 10000 
 int main( int i_Count, char** i_ppArguments )
 {
   QGuiApplication Application( i_Count, i_ppArguments );
-  VOffscreen The;
+  VOffscreen The( Width, Height );
   pOffscreen = &The;
   benchmark::Initialize( &i_Count, i_ppArguments );
   benchmark::RunSpecifiedBenchmarks();

@@ -4,28 +4,9 @@
 #include <HostFlow/VFlowFramework.h>
 
 #include <cmath>
-#include <cstdio>
-#include <cstdlib>
 
 namespace SceneBench
 {
-
-VOffscreen::VOffscreen()
-{
-  QSurfaceFormat Format;
-  Format.setVersion( 4, 3 );
-  Format.setProfile( QSurfaceFormat::CoreProfile );
-  Format.setDepthBufferSize( 24 );
-  m_Surface.setFormat( Format );
-  m_Surface.create();
-  m_Context.setFormat( Format );
-  if ( !m_Context.create() || !m_Context.makeCurrent( &m_Surface ) )
-  {
-    std::fprintf( stderr, "no OpenGL context\n" );
-    std::exit( 1 );
-  }
-  m_pTarget = std::make_unique< QOpenGLFramebufferObject >( Width, Height, QOpenGLFramebufferObject::Depth );
-}
 
 MoxelGraphics::VScenePoint PointAt( std::size_t i_Index, const VPopulation& i_rPopulation, int i_Frame )
 {

@@ -1,13 +1,11 @@
 #pragma once
 
+#include "../support/VOffscreen.h"
+
 #include <CoreGraphics/VCameraController.h>
 #include <Flow2Graphics/VFlowScene.h>
 #include <MoxelGraphics/VSceneFrame.h>
 #include <ZEK/FlowState.h>
-
-#include <QtGui/QOffscreenSurface>
-#include <QtGui/QOpenGLContext>
-#include <QtOpenGL/QOpenGLFramebufferObject>
 
 #include <memory>
 #include <vector>
@@ -19,18 +17,7 @@ inline constexpr int Width = 1280;
 inline constexpr int Height = 720;
 inline constexpr int FrameCount = 60;
 
-/// A current 4.3 core context without a window, and a target without samples.
-class VOffscreen
-{
-public:
-  VOffscreen();
-  QOpenGLFramebufferObject& Target() { return *m_pTarget; }
-
-private:
-  QOffscreenSurface m_Surface;
-  QOpenGLContext m_Context;
-  std::unique_ptr< QOpenGLFramebufferObject > m_pTarget;
-};
+using BenchSupport::VOffscreen;
 
 /// So many reconstructions, of radius 7 mm, and behind them so many of radius 9.
 struct VPopulation
