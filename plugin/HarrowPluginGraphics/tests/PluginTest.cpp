@@ -50,6 +50,8 @@ public:
     ++m_Calls;
   }
   ZEK::IMultiCallback< void() >& Changed() override { return m_Changed; }
+  std::shared_ptr< const VMeshScene > Request( const std::string&, const std::string& ) override { return nullptr; }
+  bool CanRead( const std::filesystem::path& ) const override { return false; }
 
   std::map< std::string, std::string > m_Folders;
   int m_Calls = 0;

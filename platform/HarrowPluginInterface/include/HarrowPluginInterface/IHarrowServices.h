@@ -25,6 +25,7 @@ class IStore;
 
 namespace HarrowPluginInterface
 {
+struct VMeshScene;
 
 /// Application modes; opaque but for the bits that are named here.
 enum EHarrowFeatureFlags : std::uint32_t
@@ -154,8 +155,16 @@ class VMeshSceneCache
 {
 public:
   virtual ~VMeshSceneCache() = default;
+  /// Where the meshes of a category are looked for; the first folder that has the file wins. What failed so far is
+  /// tried again.
   virtual void SetSearchFolders( const std::string& i_rCategory, std::vector< std::filesystem::path > i_Folders ) = 0;
+  /// Fires when meshes came or may have become others, on the loader's thread or that of `SetSearchFolders`.
   virtual ZEK::IMultiCallback< void() >& Changed() = 0;
+  /// The mesh of that file name, which may hold folders below a search folder. Null when it is not there: not yet, if
+  /// it is found and can be read, and `Changed` then tells. Never waits for a file. Thread: any.
+  virtual std::shared_ptr< const VMeshScene > Request( const std::string& i_rCategory, const std::string& i_rName ) = 0;
+  /// Whether the file is there and its name is that of a format that can be read. Thread: any.
+  virtual bool CanRead( const std::filesystem::path& i_rPath ) const = 0;
 };
 
 class IKeyedCommands
