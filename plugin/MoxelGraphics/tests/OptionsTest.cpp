@@ -32,7 +32,7 @@ QVariant Other( const VSceneOptions& i_rOptions, const VOptionField& i_rField )
 
 TEST( SceneOptions, EveryKeyGoesIntoTheMapAndBackToItsOwnField )
 {
-  ASSERT_EQ( SceneOptionFields().size(), 55u + 5u * 14u );
+  ASSERT_EQ( SceneOptionFields().size(), 60u + 5u * 14u );
   for ( const VOptionField& rField : SceneOptionFields() )
   {
     SCOPED_TRACE( rField.Key.toStdString() );

@@ -30,6 +30,13 @@ enum ECentroidColourScheme : int
   EColourByMarker = 2
 };
 
+/// `VSceneOptions::TrailUnit`: what the lengths of trails count.
+enum ETrailUnit : int
+{
+  ETrailFrames = 0,
+  ETrailSeconds = 1
+};
+
 /// What is shown of one kind of subject.
 struct VDisplayRecord
 {
@@ -91,14 +98,19 @@ struct VSceneOptions
   bool FillMethod = true;
   bool MarkerTrails = false;
   bool AllowTrailKeySelection = false;
-  int trialLengthPast = 10;   ///< frames
-  int trialLengthFuture = 10; ///< frames
+  int trialLengthPast = 10;     ///< in `TrailUnit`
+  int trialLengthFuture = 10;   ///< in `TrailUnit`
+  int TrailUnit = ETrailFrames; ///< ETrailUnit
   bool Locators = true;
   bool RigidBodies = true;
   bool FBXScene = true;
   bool Threshold = false;
   bool ActiveLabelHalo = false;
   bool SubjectNames = true;
+  bool MarkerNames = false;
+  int LabelSize = 13;             ///< height of names in item pixels
+  float LabelDistance = 20000.0f; ///< mm from the eye, beyond which names fade out; 0 for no end
+  int LabelLimit = 150;           ///< so many names are shown at once, the nearest
   bool Manipulator = true;
   QString SubjectPreset;
   VDisplayRecord PropSubject;

@@ -1,0 +1,74 @@
+#pragma once
+
+#include <MoxelGraphics/IRenderType.h>
+#include <MoxelGraphics/VLabelBatch.h>
+#include <MoxelGraphics/VSubjectGroup.h>
+
+#include <array>
+#include <cstdint>
+#include <vector>
+
+namespace MoxelGraphics
+{
+class VMoxelScene;
+struct VDisplayRecord;
+
+/// The names of subjects, above the highest of their markers or bones, those of other things that the scene has labels
+/// for, and on request those of markers. One of several groups that know a subject of the same name shows it.
+class VRenderSubjectLabels : public IRenderType
+{
+public:
+  static constexpr std::size_t GroupCount = 6;
+  using VGroups = std::array< const VSubjectGroup*, GroupCount >;
+
+  /// The scene owns this object.
+  explicit VRenderSubjectLabels( VMoxelScene& i_rScene );
+  ~VRenderSubjectLabels() override;
+
+  /// Rigid object, subject, prop, solving, retargeting, scene mesh; any may be null. They outlive this object's last
+  /// draw.
+  void SetGroups( const VGroups& i_rGroups );
+
+  void Render( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions,
+               std::uint32_t i_Pass ) override;
+
+  VLabelBatch& Labels() { return m_Labels; }
+
+private:
+  /// What the labels were made from.
+  struct VSeen
+  {
+    std::array< std::uint64_t, GroupCount > Structure{}, Markers{}, Poses{}, Records{}, MarkerIds{};
+    std::array< bool, GroupCount > bGroup{}, bMarkers{};
+    bool bNames = false, bMarkerNames = false, bYUp = false;
+    std::uint64_t Updates = 0;
+    friend bool operator==( const VSeen&, const VSeen& ) = default;
+  };
+  /// The label of a subject, and those of its markers if there are any.
+  struct VNamed
+  {
+    std::uint32_t Group = 0, Record = 0;
+    std::uint32_t Label = 0, FirstMarker = 0;
+    std::int32_t Same = -1; ///< an earlier one of the same name
+    bool bShown = false;
+  };
+
+  VSeen Look( const VSceneOptions& i_rOptions ) const;
+  bool TextsDiffer( const VSeen& i_rNew ) const;
+  void MakeTexts( bool i_bMarkerNames );
+  void AddSceneLabels();
+  void Place( const VSeen& i_rSeen );
+  void PlaceSubject( VNamed& io_rNamed, const VSeen& i_rSeen );
+  void PlaceMarkers( const VNamed& i_rNamed, const VSeen& i_rSeen );
+
+  VMoxelScene& m_rScene;
+  VGroups m_Groups{};
+  VLabelBatch m_Labels;
+  VSeen m_Seen;
+  bool m_bMade = false;
+  std::vector< VNamed > m_Named;
+  std::size_t m_SceneLabels = 0; ///< how many of the last labels are the scene's own
+  std::vector< std::string > m_SceneTexts;
+};
+
+} // namespace MoxelGraphics
