@@ -12,7 +12,7 @@ namespace HostMeshes
 {
 
 /// Larger files are refused.
-constexpr std::uintmax_t LargestMeshFile = 256u << 20u;
+constexpr std::uintmax_t LargestMeshFile = 128u << 20u;
 
 /// Whether the name ends as that of a format that is read: ".fbx" or ".obj", in any case.
 bool IsMeshName( const std::filesystem::path& i_rPath );
