@@ -162,6 +162,7 @@ bool VSceneFrame::Render( QOpenGLFramebufferObject& io_rTarget )
   Begin();
   m_Figures.UpdateMs = Lap();
   m_pScene->SetHighlighted( false );
+  m_pScene->SetSettled( m_Input.bReporting );
   // A device that refuses the off-screen target costs the view its picks and highlights, not its picture.
   if ( m_pSelectionTarget->isValid() && m_pOutlineTarget->isValid() )
   {

@@ -38,7 +38,10 @@ struct VLabelText
   std::string Text;                  ///< UTF-8 of any script, shortened where it is too long; empty: never shown
   std::uint32_t Colour = 0xFFFFFFFF; ///< 0xAABBGGRR
   ELabelPlace Place = ELabelPlace::Beside;
-  bool bName = false; ///< stands before all that are none, however near those are, and is drawn bold
+  bool bName = false;            ///< stands before all that are none, however near those are, and is drawn bold
+  std::uint32_t Needs = 0;       ///< bits of `VLabelStyle::Switches` that must all be on
+  std::int32_t Unless = -1;      ///< a label: where that one has a place, this one is not shown
+  std::uint32_t UnlessNeeds = 0; ///< provided that these switches are on
 };
 
 /// Where a label's point is: motion.
@@ -46,8 +49,8 @@ struct VLabelPoint
 {
   float X = 0, Y = 0, Z = 0; ///< mm; not finite: not shown
   float Radius = 0;          ///< mm that a text beside it keeps off
-  bool bShown = true;
-  bool bMarked = false; ///< shown in the colour of what is selected, before the others
+  bool bShown = true;        ///< it has a place
+  bool bMarked = false;      ///< shown in the colour of what is selected, before the others
 };
 
 struct VLabelStyle
@@ -55,6 +58,7 @@ struct VLabelStyle
   int Pixels = 13;    ///< height of the texts in item pixels
   float Distance = 0; ///< mm from the eye at which labels are gone; 0: none. Views without perspective have no distance
   int Limit = 150;    ///< labels at a time
+  std::uint32_t Switches = 0; ///< what the view shows; the bits are the user's own
   friend bool operator==( const VLabelStyle&, const VLabelStyle& ) = default;
 };
 
@@ -72,8 +76,8 @@ public:
   std::span< VLabelPoint > Points() { return m_Points; }
   void Moved() { ++m_PointsGeneration; }
 
-  /// Draws into the overlay pass of a view.
-  void Draw( CoreGraphics::VRenderContext& io_rContext, const VLabelStyle& i_rStyle );
+  /// Draws into the overlay pass of a view. `i_bSettled`: without fades.
+  void Draw( CoreGraphics::VRenderContext& io_rContext, const VLabelStyle& i_rStyle, bool i_bSettled = false );
 
   /// The seconds that fades go by; a steady clock at first.
   void SetClock( std::function< double() > i_Clock ) { m_Clock = std::move( i_Clock ); }
@@ -84,18 +88,24 @@ public:
 
 private:
   struct VView;
+  struct VSheet;
   struct VGl;
-  class VSheets;
 
   VView& ViewOf( CoreGraphics::VRenderContext& io_rContext ) const;
-  bool Upload( CoreGraphics::VRenderContext& io_rContext, VView& io_rView );
+  VSheet& SheetOf( int i_Pixels );
+  void Choose( CoreGraphics::VRenderContext& io_rContext, VView& io_rView, const VSheet& i_rSheet,
+               const VLabelStyle& i_rStyle ) const;
+  bool IsWanted( std::size_t i_Label, std::uint32_t i_Switches ) const;
+  void Fade( VView& io_rView, float i_Step ) const;
+  bool Feed( CoreGraphics::VRenderContext& io_rContext, VView& io_rView, VSheet& io_rSheet ) const;
+  bool WriteGlyphs( VView& io_rView, VSheet& io_rSheet ) const;
 
   std::vector< VLabelText > m_Texts;
   std::vector< VLabelPoint > m_Points;
-  std::uint64_t m_TextsGeneration = 1, m_PointsGeneration = 1;
+  std::uint64_t m_TextsGeneration = 1, m_PointsGeneration = 1, m_SheetSerial = 0;
   std::function< double() > m_Clock;
   std::unique_ptr< VGl > m_pGl;
-  std::unique_ptr< VSheets > m_pSheets;
+  std::vector< std::unique_ptr< VSheet > > m_Sheets; ///< of the sizes in use, the one drawn last in front
 };
 
 } // namespace MoxelGraphics

@@ -137,6 +137,10 @@ public:
   bool IsHighlighted() const { return m_bHighlighted; }
   void SetHighlighted( bool i_bHighlighted ) { m_bHighlighted = i_bHighlighted; }
 
+  /// Whether the frame is measured or kept: it shows at once what others come to by and by. Set by the view.
+  bool IsSettled() const { return m_bSettled; }
+  void SetSettled( bool i_bSettled ) { m_bSettled = i_bSettled; }
+
   /// What is selected now.
   ZEK::VSelection GetSelection() const;
   Q_INVOKABLE void SelectCamera( QString i_rDeviceURN, bool i_bPreselect );
@@ -209,6 +213,7 @@ private:
   bool m_bDeveloperMode = false;
   bool m_bCanDraw = false;
   bool m_bHighlighted = false;
+  bool m_bSettled = false;
   bool m_bTilesAgain = false;
   std::uint64_t m_TileWalk = 0;
   std::uint64_t m_UpdateCount = 0;

@@ -39,27 +39,25 @@ private:
   struct VSeen
   {
     std::array< std::uint64_t, GroupCount > Structure{}, Markers{}, Poses{}, Records{}, MarkerIds{};
-    std::array< bool, GroupCount > bGroup{}, bMarkers{};
-    bool bNames = false, bMarkerNames = false, bYUp = false;
+    bool bMarkerNames = false; ///< a view asked for them
+    bool bYUp = false;
     std::uint64_t Updates = 0;
     friend bool operator==( const VSeen&, const VSeen& ) = default;
   };
-  /// The label of a subject, and those of its markers if there are any.
+  /// The label of a subject; those of its markers, if there are any, follow it.
   struct VNamed
   {
-    std::uint32_t Group = 0, Record = 0;
-    std::uint32_t Label = 0, FirstMarker = 0;
-    std::int32_t Same = -1; ///< an earlier one of the same name
-    bool bShown = false;
+    std::uint32_t Group = 0, Record = 0, Label = 0;
   };
 
   VSeen Look( const VSceneOptions& i_rOptions ) const;
   bool TextsDiffer( const VSeen& i_rNew ) const;
-  void MakeTexts( bool i_bMarkerNames );
-  void AddSceneLabels();
-  void Place( const VSeen& i_rSeen );
-  void PlaceSubject( VNamed& io_rNamed, const VSeen& i_rSeen );
-  void PlaceMarkers( const VNamed& i_rNamed, const VSeen& i_rSeen );
+  bool TakeSceneLabels();
+  void MakeTexts();
+  void AddSubject( std::size_t i_Group, std::size_t i_Record, std::vector< VLabelText >& io_rTexts );
+  void Place();
+  void PlaceSubject( const VNamed& i_rNamed );
+  void PlaceMarkers( const VNamed& i_rNamed );
 
   VMoxelScene& m_rScene;
   VGroups m_Groups{};
@@ -67,7 +65,7 @@ private:
   VSeen m_Seen;
   bool m_bMade = false;
   std::vector< VNamed > m_Named;
-  std::size_t m_SceneLabels = 0; ///< how many of the last labels are the scene's own
+  std::vector< const struct VSceneLabel* > m_SceneLabels; ///< the scene's own, good until its next update
   std::vector< std::string > m_SceneTexts;
 };
 

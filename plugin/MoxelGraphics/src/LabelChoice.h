@@ -1,0 +1,39 @@
+#pragma once
+
+#include <QtCore/QSize>
+
+#include <cstdint>
+#include <vector>
+
+namespace MoxelGraphics
+{
+
+/// A label that a view could show.
+struct VLabelCandidate
+{
+  std::uint32_t Label = 0;
+  std::uint8_t Rank = 0;                                 ///< the lower, the sooner
+  bool bHeld = false;                                    ///< shown until now
+  float Away = 0;                                        ///< among those of one rank the nearest comes first
+  float X = 0, Y = 0;                                    ///< the label's place, pixels from the lower left
+  std::int16_t Left = 0, Bottom = 0, Right = 0, Top = 0; ///< of its text about that place, y up
+  float Strength = 1;                                    ///< that it would be shown with
+  bool bChosen = false;
+};
+
+/// Chooses among labels: the nearest, up to a number, of which none covers another. What is shown already stays until
+/// another is clearly nearer, so that equals do not take turns.
+class VLabelChoice
+{
+public:
+  /// Orders the candidates, and marks those that are chosen.
+  void Choose( std::vector< VLabelCandidate >& io_rCandidates, int i_Limit, QSize i_Viewport );
+
+private:
+  bool Take( const VLabelCandidate& i_rCandidate );
+
+  int m_Columns = 0, m_Rows = 0;
+  std::vector< std::uint8_t > m_Taken; ///< by cell of the viewport
+};
+
+} // namespace MoxelGraphics

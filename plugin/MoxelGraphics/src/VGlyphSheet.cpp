@@ -1,0 +1,248 @@
+#include "VGlyphSheet.h"
+
+#include "Log.h"
+
+#include <CoreGraphics/VRenderContext.h>
+
+#include <QtGui/QFontMetricsF>
+#include <QtGui/QGlyphRun>
+#include <QtGui/QGuiApplication>
+#include <QtGui/QImage>
+#include <QtGui/QPainter>
+#include <QtGui/QRawFont>
+#include <QtGui/QTextLayout>
+
+#include <algorithm>
+#include <cmath>
+
+namespace MoxelGraphics
+{
+namespace
+{
+constexpr int SheetWidth = 1024;
+constexpr int MostRows = 4096; ///< any device takes a texture of so many
+constexpr int HeightStep = 64;
+constexpr double WidestText = 22; ///< in heights of the text
+constexpr qsizetype LongestText = 256;
+
+QFont MakeFont( int i_Pixels, bool i_bBold )
+{
+  QFont Font = QGuiApplication::font();
+  Font.setPixelSize( i_Pixels );
+  Font.setBold( i_bBold );
+  // Whole pixels: a label stands on them, and its glyphs are drawn once for all places.
+  Font.setHintingPreference( QFont::PreferFullHinting );
+  Font.setStyleStrategy( QFont::StyleStrategy( QFont::PreferAntialias | QFont::NoSubpixelAntialias ) );
+  return Font;
+}
+
+std::int16_t Short( int i_Value )
+{
+  return static_cast< std::int16_t >( i_Value );
+}
+} // namespace
+
+VGlyphSheet::VGlyphSheet( int i_Pixels )
+  : m_Pixels( i_Pixels )
+  , m_Soft( std::max( 2, ( i_Pixels + 3 ) / 7 ) )
+  , m_Plain( MakeFont( i_Pixels, false ) )
+  , m_Bold( MakeFont( i_Pixels, true ) )
+{
+  const QFontMetricsF Metrics( m_Bold );
+  m_Ascent = static_cast< int >( std::lround( Metrics.ascent() ) );
+  m_Descent = static_cast< int >( std::lround( Metrics.descent() ) );
+}
+
+QString VGlyphSheet::Prepare( const std::string& i_rText, const QFont& i_rFont ) const
+{
+  // One line, and not measured at a length that nobody would read.
+  QString Text = QString::fromUtf8( i_rText.data(), static_cast< qsizetype >( i_rText.size() ) );
+  if ( Text.size() > LongestText )
+  {
+    Text.truncate( LongestText );
+  }
+  Text = Text.simplified();
+  for ( QChar& rLetter : Text )
+  {
+    if ( rLetter.category() == QChar::Other_Control )
+    {
+      rLetter = u' ';
+    }
+  }
+  return QFontMetricsF( i_rFont ).elidedText( Text, Qt::ElideRight, WidestText * m_Pixels );
+}
+
+const VTextLayout& VGlyphSheet::Layout( const std::string& i_rText, bool i_bBold )
+{
+  const QFont& rFont = i_bBold ? m_Bold : m_Plain;
+  const QString Text = Prepare( i_rText, rFont );
+  const auto Found = m_Layouts[i_bBold].constFind( Text );
+  if ( Found != m_Layouts[i_bBold].constEnd() )
+  {
+    return *Found;
+  }
+  VTextLayout Result;
+  Result.First = static_cast< std::uint32_t >( m_Placed.size() );
+  if ( !Text.isEmpty() )
+  {
+    ++m_LaidOut;
+    QTextLayout Lines( Text, rFont );
+    Lines.beginLayout();
+    QTextLine Line = Lines.createLine();
+    Line.setNumColumns( static_cast< int >( Text.size() ) );
+    Lines.endLayout();
+    for ( const QGlyphRun& rRun : Line.glyphRuns() )
+    {
+      Place( rRun, Line.ascent() );
+    }
+    Result.Width = static_cast< std::int32_t >( std::ceil( Line.naturalTextWidth() ) );
+  }
+  Result.Count = static_cast< std::uint32_t >( m_Placed.size() ) - Result.First;
+  return *m_Layouts[i_bBold].insert( Text, Result );
+}
+
+void VGlyphSheet::Place( const QGlyphRun& i_rRun, double i_Baseline )
+{
+  const QRawFont Font = i_rRun.rawFont();
+  const QString Name = Font.familyName() + u'/' + Font.styleName() + u'/' + QString::number( Font.weight() ) + u'/' +
+                       QString::number( Font.pixelSize() );
+  const quint64 Key = *m_Fonts.insert( Name, m_Fonts.value( Name, static_cast< quint64 >( m_Fonts.size() + 1 ) ) );
+  const QList< quint32 > Indexes = i_rRun.glyphIndexes();
+  const QList< QPointF > Positions = i_rRun.positions();
+  for ( qsizetype Index = 0; Index < Indexes.size() && Index < Positions.size(); ++Index )
+  {
+    const VCell& rCell = CellOf( Font, Key, Indexes[Index] );
+    if ( rCell.Width > 0 )
+    {
+      const int X = static_cast< int >( std::lround( Positions[Index].x() ) );
+      const int Y = static_cast< int >( std::lround( Positions[Index].y() - i_Baseline ) );
+      m_Placed.push_back(
+          { Short( X + rCell.Left ), Short( Y + rCell.Top ), rCell.Width, rCell.Height, rCell.X, rCell.Y } );
+    }
+  }
+}
+
+const VGlyphSheet::VCell& VGlyphSheet::CellOf( const QRawFont& i_rFont, quint64 i_FontKey, quint32 i_Glyph )
+{
+  const quint64 Key = i_FontKey << 32 | i_Glyph;
+  const auto Found = m_Cells.constFind( Key );
+  return Found != m_Cells.constEnd() ? *Found : *m_Cells.insert( Key, Draw( i_rFont, i_Glyph ) );
+}
+
+VGlyphSheet::VCell VGlyphSheet::Draw( const QRawFont& i_rFont, quint32 i_Glyph )
+{
+  const QRectF Bounds = i_rFont.boundingRect( i_Glyph );
+  VCell Cell;
+  if ( !( Bounds.width() > 0 ) || !( Bounds.height() > 0 ) || Bounds.width() > 8 * m_Pixels ||
+       Bounds.height() > 8 * m_Pixels )
+  {
+    return Cell; // a space, or what no font means
+  }
+  // What antialiasing adds to the bounds, and the soft edge.
+  const int Rim = m_Soft + 2;
+  const int Left = static_cast< int >( std::floor( Bounds.left() ) ) - Rim;
+  const int Top = static_cast< int >( std::floor( Bounds.top() ) ) - Rim;
+  const int Width = static_cast< int >( std::ceil( Bounds.right() ) ) + Rim - Left;
+  const int Height = static_cast< int >( std::ceil( Bounds.bottom() ) ) + Rim - Top;
+  if ( !Reserve( Width, Height, Cell ) )
+  {
+    return Cell;
+  }
+  Cell.Left = Short( Left );
+  Cell.Top = Short( Top );
+  QImage Image( Width, Height, QImage::Format_ARGB32_Premultiplied );
+  Image.fill( Qt::transparent );
+  QPainter Painter( &Image );
+  Painter.setRenderHint( QPainter::TextAntialiasing );
+  Painter.setPen( Qt::white );
+  QGlyphRun Run;
+  Run.setRawFont( i_rFont );
+  Run.setGlyphIndexes( { i_Glyph } );
+  Run.setPositions( { QPointF( 0, 0 ) } );
+  Painter.drawGlyphRun( QPointF( -Left, -Top ), Run );
+  Painter.end();
+  Copy( Image, Cell );
+  return Cell;
+}
+
+bool VGlyphSheet::Reserve( int i_Width, int i_Height, VCell& o_rCell )
+{
+  if ( m_RowX + i_Width > SheetWidth )
+  {
+    m_RowY += m_RowHeight;
+    m_RowX = m_RowHeight = 0;
+  }
+  const int Bottom = m_RowY + std::max( m_RowHeight, i_Height );
+  if ( i_Width > SheetWidth || Bottom > MostRows )
+  {
+    if ( m_RowY < MostRows )
+    {
+      m_RowY = MostRows; // said once
+      ZEK::Log( LogCategory(), ZEK::ELogWarning, "The names of this scene have more letters than can be shown" );
+    }
+    return false;
+  }
+  if ( Bottom > m_Height )
+  {
+    m_Height = ( Bottom + HeightStep - 1 ) / HeightStep * HeightStep;
+    m_Pixmap.resize( static_cast< std::size_t >( m_Height ) * SheetWidth * 2 );
+  }
+  o_rCell.X = Short( m_RowX );
+  o_rCell.Y = Short( m_RowY );
+  o_rCell.Width = Short( i_Width );
+  o_rCell.Height = Short( i_Height );
+  m_RowX += i_Width;
+  m_RowHeight = std::max( m_RowHeight, i_Height );
+  return true;
+}
+
+void VGlyphSheet::Copy( const QImage& i_rImage, const VCell& i_rCell )
+{
+  const auto Alpha = [&]( int i_X, int i_Y )
+  {
+    const bool bInside = i_X >= 0 && i_Y >= 0 && i_X < i_rImage.width() && i_Y < i_rImage.height();
+    return bInside ? qAlpha( reinterpret_cast< const QRgb* >( i_rImage.constScanLine( i_Y ) )[i_X] ) : 0;
+  };
+  for ( int Y = 0; Y < i_rImage.height(); ++Y )
+  {
+    std::uint8_t* pOut = &m_Pixmap[( static_cast< std::size_t >( i_rCell.Y + Y ) * SheetWidth +
+                                     static_cast< std::size_t >( i_rCell.X ) ) *
+                                   2];
+    for ( int X = 0; X < i_rImage.width(); ++X )
+    {
+      // The edge: the strongest of what lies around, weaker with its distance.
+      float Edge = 0;
+      for ( int Dy = -m_Soft; Dy <= m_Soft; ++Dy )
+      {
+        for ( int Dx = -m_Soft; Dx <= m_Soft; ++Dx )
+        {
+          const float Far = std::sqrt( static_cast< float >( Dx * Dx + Dy * Dy ) ) / static_cast< float >( m_Soft + 1 );
+          Edge = std::max( Edge, static_cast< float >( Alpha( X + Dx, Y + Dy ) ) * ( 1 - Far * Far ) );
+        }
+      }
+      *pOut++ = static_cast< std::uint8_t >( Alpha( X, Y ) );
+      *pOut++ = static_cast< std::uint8_t >( Edge );
+    }
+  }
+  m_bWritten = false;
+}
+
+bool VGlyphSheet::Bind( CoreGraphics::VRenderContext& io_rContext, int i_Unit )
+{
+  if ( m_Height == 0 )
+  {
+    return false;
+  }
+  if ( !m_bWritten || !m_Texture.IsThere( io_rContext ) )
+  {
+    m_bWritten = m_Texture.Write( io_rContext, ETexel::RG8, SheetWidth, m_Height, m_Pixmap.data(),
+                                  std::size_t{ SheetWidth } * 2 );
+  }
+  if ( m_bWritten )
+  {
+    m_Texture.Bind( io_rContext, i_Unit );
+  }
+  return m_bWritten;
+}
+
+} // namespace MoxelGraphics
