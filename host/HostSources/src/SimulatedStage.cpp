@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <iterator>
 #include <limits>
+#include <string>
 
 using namespace CoreMoxelTypes;
 
@@ -35,50 +36,12 @@ bool IsOnPlate( std::size_t i_Plate, const D3& i_rPoint )
   return std::abs( Away.x ) <= PlateHalf && std::abs( Away.y ) <= PlateHalf;
 }
 
-/// The angle-axis vector of a rotation given by its rows.
-D3 RotationVector( const D3& i_rX, const D3& i_rY, const D3& i_rZ )
+VHash HashOf( const VSimulatedCaptureOptions& i_rOptions, std::uint32_t i_Performer )
 {
-  // By way of the quaternion part that is greatest, which holds up to half a turn.
-  const double Trace = i_rX.x + i_rY.y + i_rZ.z;
-  double Q[4] = { 1 + Trace, 1 + i_rX.x - i_rY.y - i_rZ.z, 1 - i_rX.x + i_rY.y - i_rZ.z, 1 - i_rX.x - i_rY.y + i_rZ.z };
-  const D3 Skew{ i_rZ.y - i_rY.z, i_rX.z - i_rZ.x, i_rY.x - i_rX.y };
-  const double XY = i_rX.y + i_rY.x, XZ = i_rX.z + i_rZ.x, YZ = i_rY.z + i_rZ.y;
-  const double Rows[4][4] = {
-      { Q[0], Skew.x, Skew.y, Skew.z }, { Skew.x, Q[1], XY, XZ }, { Skew.y, XY, Q[2], YZ }, { Skew.z, XZ, YZ, Q[3] } };
-  const auto Best = std::max_element( std::begin( Q ), std::end( Q ) ) - std::begin( Q );
-  const double* pRow = Rows[Best];
-  const double Sign = pRow[0] < 0 ? -1 : 1;
-  const D3 Axis{ Sign * pRow[1], Sign * pRow[2], Sign * pRow[3] };
-  const double Sine = Length( Axis );
-  return Sine > 0 ? Axis * ( 2 * std::atan2( Sine, Sign * pRow[0] ) / Sine ) : D3{};
-}
-
-u32 Mixed( u32 i_Colour, u32 i_Towards, double i_Share )
-{
-  u32 Result = 0xFF000000u;
-  for ( const int Shift : { 0, 8, 16 } )
-  {
-    const double From = ( i_Colour >> Shift ) & 0xFF, To = ( i_Towards >> Shift ) & 0xFF;
-    Result |= static_cast< u32 >( From + ( To - From ) * i_Share + 0.5 ) << Shift;
-  }
-  return Result;
+  return VHash( i_rOptions.Seed ).With( 0x5747 ).With( i_Performer );
 }
 
 } // namespace
-
-std::uint32_t PerformerColour( std::uint32_t i_Performer )
-{
-  constexpr u32 Colours[] = { 0xFF4FB4FFu, 0xFFFFB84Fu, 0xFF7ED957u, 0xFFC77DFFu,
-                              0xFF5CE1E6u, 0xFF6B6BFFu, 0xFFE6C229u, 0xFFB0B0B0u };
-  return Colours[i_Performer % std::size( Colours )];
-}
-
-std::string PerformerName( std::uint32_t i_Performer )
-{
-  static constexpr const char* Names[] = { "Ada", "Ben", "Cleo", "Dan", "Eve", "Finn", "Gil",  "Hana",
-                                           "Ivo", "Joy", "Kai",  "Lea", "Max", "Nora", "Olaf", "Pia" };
-  return i_Performer < std::size( Names ) ? Names[i_Performer] : "Performer " + std::to_string( i_Performer + 1 );
-}
 
 VWalkerStyle PerformerStyle( const VSimulatedCaptureOptions& i_rOptions, std::uint32_t i_Performer )
 {
@@ -90,7 +53,7 @@ VWalkerStyle PerformerStyle( const VSimulatedCaptureOptions& i_rOptions, std::ui
     ++pCircle;
   }
   const std::uint32_t Sharing = std::min( pCircle->Places, i_rOptions.Performers - First );
-  const VHash Hash = VHash( i_rOptions.Seed ).With( 0x5747 ).With( i_Performer );
+  const VHash Hash = HashOf( i_rOptions, i_Performer );
   VWalkerStyle Style;
   Style.Radius = pCircle->Radius;
   Style.Speed = pCircle->Speed;
@@ -101,6 +64,13 @@ VWalkerStyle PerformerStyle( const VSimulatedCaptureOptions& i_rOptions, std::ui
   Style.Scale = 0.95 + 0.09 * Hash.With( 1 ).Uniform();
   Style.MassKg = 75 * Style.Scale * Style.Scale * ( 0.9 + 0.2 * Hash.With( 2 ).Uniform() );
   return Style;
+}
+
+VBodyShape PerformerShape( const VSimulatedCaptureOptions& i_rOptions, std::uint32_t i_Performer )
+{
+  VBodyShape Shape = ShapeScaled( PerformerStyle( i_rOptions, i_Performer ).Scale );
+  Shape.Breadth *= 0.95 + 0.1 * HashOf( i_rOptions, i_Performer ).With( 3 ).Uniform();
+  return Shape;
 }
 
 void FillCamera( std::uint32_t i_Camera, std::uint32_t i_Count, double i_RateHz, VCameraHardware& o_rHardware,
@@ -138,36 +108,6 @@ void FillCamera( std::uint32_t i_Camera, std::uint32_t i_Count, double i_RateHz,
   }
 }
 
-void FillSubject( std::uint32_t i_Performer, VSubject& o_rSubject )
-{
-  o_rSubject.Id = i_Performer + 1;
-  o_rSubject.Name = PerformerName( i_Performer );
-  for ( const char* pName : WalkerMarkerNames() )
-  {
-    VMarker& rMarker = o_rSubject.Markers.emplace_back();
-    rMarker.Id = static_cast< u32 >( o_rSubject.Markers.size() - 1 );
-    rMarker.Name = pName;
-    rMarker.Radius = 7;
-  }
-}
-
-void FillColours( std::uint32_t i_Performer, VSubjectApplicationData& o_rData )
-{
-  const u32 Colour = PerformerColour( i_Performer );
-  for ( const std::string_view Name : WalkerMarkerNames() )
-  {
-    // Left lighter, right darker: which way a person faces can be seen.
-    o_rData.MarkerColours.push_back( Name[0] == 'L'   ? Mixed( Colour, 0xFFFFFFFFu, 0.35 )
-                                     : Name[0] == 'R' ? Mixed( Colour, 0xFF000000u, 0.3 )
-                                                      : Colour );
-  }
-  for ( const auto& rStick : WalkerSticks() )
-  {
-    o_rData.Sticks.push_back(
-        { rStick[0], rStick[1], o_rData.MarkerColours[rStick[0]], o_rData.MarkerColours[rStick[1]] } );
-  }
-}
-
 void FillPlate( std::size_t i_Plate, VDevice& o_rDevice )
 {
   o_rDevice.Name = "Plate " + std::to_string( i_Plate + 1 );
@@ -188,27 +128,6 @@ void FillVolume( VParametersItem& o_rParameters )
   for ( std::size_t Index = 0; Index < ReconstructionVolumeNames.size(); ++Index )
   {
     o_rParameters.Values[ReconstructionVolumeNames[Index]] = Corners[Index];
-  }
-}
-
-void PoseObjects( double i_Seconds, std::array< D3, ObjectMarkers >& o_rMarkers )
-{
-  VFrame Prop;
-  Prop.Origin = { -2450, -2450, 900 };
-  Prop = Yawed( Prop, 0.4 * i_Seconds );
-  constexpr D3 PropPoints[] = { { 0, 0, 0 }, { 160, 0, 0 }, { 0, 90, 20 }, { -70, -60, 40 }, { 60, -40, 120 } };
-  VFrame Wand = Pitched( Yawed( {}, 0.8 * std::sin( 1.3 * i_Seconds ) ), 0.9 * std::sin( 2.1 * i_Seconds ) );
-  Wand.Origin = { 2400 + 120 * std::sin( 1.7 * i_Seconds ), -2400 + 120 * std::cos( 1.1 * i_Seconds ),
-                  1200 + 250 * std::sin( 0.9 * i_Seconds ) };
-  constexpr D3 WandPoints[] = { { 0, 0, 0 }, { 0, 120, 0 }, { 0, -240, 0 }, { 180, 0, 0 }, { 360, 0, 0 } };
-  auto* pNext = o_rMarkers.data();
-  for ( const D3& rPoint : PropPoints )
-  {
-    *pNext++ = Prop.Point( rPoint.x, rPoint.y, rPoint.z );
-  }
-  for ( const D3& rPoint : WandPoints )
-  {
-    *pNext++ = Wand.Point( rPoint.x, rPoint.y, rPoint.z );
   }
 }
 

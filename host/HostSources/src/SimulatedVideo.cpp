@@ -17,7 +17,6 @@ namespace
 
 constexpr std::size_t Width = VVideoPainter::Width, Height = VVideoPainter::Height;
 constexpr std::uint32_t VideoFlag = 2;
-constexpr std::uint32_t PlainColour = 0xFFE8E8E8;
 
 struct VColour
 {
@@ -259,7 +258,7 @@ void VVideoPainter::Paint( const VSensorView& i_rView, const std::vector< VStage
     if ( i_rView.Project( rMarker.Position, Point ) )
     {
       Dot( ( Point.x - 1.5 ) / Scale, ( Point.y - 1.5 ) / Scale, std::max( MarkerRadius * Point.Scale / Scale, 1.5 ),
-           rMarker.SubjectId == NoSubject ? PlainColour : PerformerColour( rMarker.SubjectId - 1 ) );
+           rMarker.Colour );
     }
   }
 }

@@ -2,14 +2,16 @@
 
 #include "VectorMath.h"
 
+#include <algorithm>
 #include <cstdint>
+#include <iterator>
 
 namespace HostSources::Simulation
 {
 
 inline constexpr double Pi = 3.14159265358979323846;
 
-/// A body's place: `X` forward, `Y` to the left, `Z` up.
+/// A place with axes; of a body: `X` forward, `Y` to the left, `Z` up.
 struct VFrame
 {
   D3 Origin, X{ 1, 0, 0 }, Y{ 0, 1, 0 }, Z{ 0, 0, 1 };
@@ -28,6 +30,35 @@ inline VFrame Pitched( const VFrame& i_rFrame, double i_Angle )
 {
   const double C = std::cos( i_Angle ), S = std::sin( i_Angle );
   return { i_rFrame.Origin, i_rFrame.X * C - i_rFrame.Z * S, i_rFrame.Y, i_rFrame.Z * C + i_rFrame.X * S };
+}
+
+/// The angle-axis vector of a rotation given by its rows.
+inline D3 RotationVector( const D3& i_rX, const D3& i_rY, const D3& i_rZ )
+{
+  // By way of the quaternion part that is greatest, which holds up to half a turn.
+  const double Trace = i_rX.x + i_rY.y + i_rZ.z;
+  const double Q[4] = { 1 + Trace, 1 + i_rX.x - i_rY.y - i_rZ.z, 1 - i_rX.x + i_rY.y - i_rZ.z,
+                        1 - i_rX.x - i_rY.y + i_rZ.z };
+  const D3 Skew{ i_rZ.y - i_rY.z, i_rX.z - i_rZ.x, i_rY.x - i_rX.y };
+  const double XY = i_rX.y + i_rY.x, XZ = i_rX.z + i_rZ.x, YZ = i_rY.z + i_rZ.y;
+  const double Rows[4][4] = {
+      { Q[0], Skew.x, Skew.y, Skew.z }, { Skew.x, Q[1], XY, XZ }, { Skew.y, XY, Q[2], YZ }, { Skew.z, XZ, YZ, Q[3] } };
+  const auto Best = std::max_element( std::begin( Q ), std::end( Q ) ) - std::begin( Q );
+  const double* pRow = Rows[Best];
+  const double Sign = pRow[0] < 0 ? -1 : 1;
+  const D3 Axis{ Sign * pRow[1], Sign * pRow[2], Sign * pRow[3] };
+  const double Sine = Length( Axis );
+  return Sine > 0 ? Axis * ( 2 * std::atan2( Sine, Sign * pRow[0] ) / Sine ) : D3{};
+}
+
+/// The rotation that leads from one frame's axes to another's, in those of the first.
+inline D3 RotationVector( const VFrame& i_rFrom, const VFrame& i_rTo )
+{
+  const auto Row = [&]( const D3& i_rAxis )
+  {
+    return D3{ Dot( i_rAxis, i_rTo.X ), Dot( i_rAxis, i_rTo.Y ), Dot( i_rAxis, i_rTo.Z ) };
+  };
+  return RotationVector( Row( i_rFrom.X ), Row( i_rFrom.Y ), Row( i_rFrom.Z ) );
 }
 
 /// Numbers that look random and depend on nothing but what they are asked for: a frame is the same in whatever order

@@ -4,6 +4,7 @@
 #include "SimulatedItems.h"
 #include "SimulatedMarkers.h"
 #include "SimulatedStage.h"
+#include "SimulatedSubjects.h"
 
 #include <CoreMoxelTypes/FlowTypes.h>
 #include <CoreMoxelTypes/Parameters.h>
@@ -35,6 +36,7 @@ VSimulatedCaptureOptions Limited( VSimulatedCaptureOptions i_Options )
   i_Options.RateHz = Within( i_Options.RateHz, 25.0, 1000.0 );
   i_Options.NoiseMm = Within( i_Options.NoiseMm, 0.0, 50.0 );
   i_Options.GapProbability = Within( i_Options.GapProbability, 0.0, 1.0 );
+  i_Options.SwapProbability = Within( i_Options.SwapProbability, 0.0, 1.0 );
   i_Options.ExtraPoints = Within( i_Options.ExtraPoints, 0u, 1000u );
   i_Options.VideoCameras = Within( i_Options.VideoCameras, 0u, i_Options.Cameras / 2 );
   i_Options.LateFrames = Within( i_Options.LateFrames, 0u, 15u );
@@ -73,6 +75,8 @@ struct VSimulatedCapture::VImpl
     , SamplesPerFrame( std::max( 1, static_cast< int >( std::lround( 1000 / Options.RateHz ) ) ) )
     , Stage( Options )
     , Cameras( Options )
+    , Subjects( Options, Stage )
+    , Poses( Options.Performers )
   {
   }
 
@@ -90,7 +94,9 @@ struct VSimulatedCapture::VImpl
   bool bOverruled = false;
   const VMarkerStage Stage;
   VSimulatedCameras Cameras;
+  VSimulatedSubjects Subjects;
   VItemMaker Maker;
+  std::vector< VWalkerPose > Poses;    // of the frame being made, by performer
   std::vector< VStageMarker > Markers; // of the frame being made
   bool bSlowMade = false;
   std::vector< VFlowItemRef > Slow;
@@ -104,16 +110,7 @@ void VSimulatedCapture::VImpl::MakeSlowItems()
 {
   Slow.clear();
   Cameras.AddSlowItems( Maker, Slow );
-  for ( std::uint32_t Performer = 0; Performer < Options.Performers; ++Performer )
-  {
-    VSubject Subject;
-    VSubjectApplicationData Colours;
-    FillSubject( Performer, Subject );
-    FillColours( Performer, Colours );
-    const std::string Name = Subject.Name;
-    Maker.AddSlow< FlowSubject >( Slow, EFlowNameObject, Name, std::move( Subject ) );
-    Maker.AddSlow< FlowSubjectApplicationData >( Slow, EFlowNameObject, Name, std::move( Colours ) );
-  }
+  Subjects.AddSlowItems( Maker, Slow );
   for ( std::size_t Plate = 0; Plate < ( Options.bForcePlates ? Plates : 0 ); ++Plate )
   {
     VDevice Device;
@@ -159,7 +156,7 @@ void VSimulatedCapture::VImpl::AddPoints( double i_Seconds, std::int64_t i_Index
   }
   pSet->Items.reserve( Stage.MostMarkers() );
   Labels.clear();
-  Stage.At( i_Seconds, Markers );
+  Stage.At( i_Seconds, Markers, Poses.data() );
   for ( VStageMarker& rMarker : Markers )
   {
     if ( rMarker.bLost )
@@ -176,6 +173,7 @@ void VSimulatedCapture::VImpl::AddPoints( double i_Seconds, std::int64_t i_Index
   Cameras.AddFrame( Markers, Maker, i_rState, *pSet );
   Cameras.AddVideo( Stage, i_Seconds, Maker, i_rState );
   Cameras.AddSensors( i_Seconds, Maker, i_rState );
+  Subjects.AddFrame( i_Seconds, Poses, Markers, *pSet, Maker, i_rState );
   i_rState.AddItem( Item );
   AddLabels( i_rState );
 }

@@ -1,15 +1,11 @@
 #pragma once
 
-#include "SimulationMath.h"
+#include "WalkerBody.h"
 
-#include <array>
-#include <cstddef>
-#include <span>
+#include <string>
 
 namespace HostSources::Simulation
 {
-
-inline constexpr std::size_t WalkerMarkers = 53;
 
 /// How one person walks: in a circle about the middle of the floor. Lengths in mm.
 struct VWalkerStyle
@@ -20,7 +16,7 @@ struct VWalkerStyle
   double Speed = 1050;   ///< mm/s
   double Cadence = 0.92; ///< strides (two steps) a second
   double Phase = 0;      ///< of the stride at 0 s, 0 to 1
-  double Scale = 1;      ///< 1 is 1.75 m tall
+  double Scale = 1;      ///< of the body
   double MassKg = 75;
 };
 
@@ -32,20 +28,48 @@ struct VFootLoad
   D3 Force;  ///< on the body, N
 };
 
-struct VWalkerPose
+/// One foot in its stride.
+struct VWalkerFoot
 {
-  std::array< D3, WalkerMarkers > Markers;
-  std::array< VFootLoad, 2 > Feet; ///< left, right
+  VFrame Frame; ///< at the ball, on the sole, pitched
+  D3 Place;     ///< of the ball, were the sole flat on the floor
+  double Stride = 0;
+  double Toes = 0; ///< how far they are bent up, rad
 };
 
-const std::array< const char*, WalkerMarkers >& WalkerMarkerNames();
+struct VWalkerPose
+{
+  VWalkerState State;
+  std::array< ComputeSubject::VRigidTransform, EBones > Segments; ///< in the world
+  std::array< D3, WalkerMarkers > Solved;                         ///< where the bones have the markers
+  std::array< D3, WalkerMarkers > Markers;                        ///< where they are, on skin that moves
+};
 
-/// Pairs of markers to join by a stick.
-std::span< const std::array< std::uint32_t, 2 > > WalkerSticks();
+inline D3 Placed( const ComputeSubject::VRigidTransform& i_rPose, const D3& i_rLocal )
+{
+  const double Local[3] = { i_rLocal.x, i_rLocal.y, i_rLocal.z };
+  double World[3];
+  i_rPose.Place( Local, World );
+  return { World[0], World[1], World[2] };
+}
 
-/// Thread: any.
-void PoseWalker( const VWalkerStyle& i_rStyle, double i_Seconds, VWalkerPose& o_rPose );
+/// The body's place over the floor when it has walked for that long.
+VFrame PathAt( const VWalkerStyle& i_rStyle, double i_Seconds );
+/// `i_Side` is 1 for the left one, -1 for the right one.
+VWalkerFoot FootAt( const VWalkerStyle& i_rStyle, double i_Seconds, int i_Side );
+
+/// Thread: any. The body's legs are as the style's scale says.
+void PoseWalker( const VWalkerStyle& i_rStyle, const VWalkerBody& i_rBody, double i_Seconds, VWalkerPose& o_rPose );
 /// The feet alone, for the plates, which feel many times a frame.
 void LoadFeet( const VWalkerStyle& i_rStyle, double i_Seconds, std::array< VFootLoad, 2 >& o_rFeet );
+
+/// A pose to look at, where the body stands on the origin and looks along x.
+struct VNamedPose
+{
+  std::string Name;
+  VWalkerState State;
+};
+/// The first is "Neutral", zeros.
+std::vector< VNamedPose > NamedPoses( const VWalkerBody& i_rBody );
 
 } // namespace HostSources::Simulation
