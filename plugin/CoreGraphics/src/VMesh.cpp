@@ -24,7 +24,9 @@ const char* AttributeName( EVertexAttribute i_Attribute )
                                                                         "u_StickColourB",
                                                                         "u_SegmentColour",
                                                                         "a_InstanceFlags",
-                                                                        "a_Tile" };
+                                                                        "a_Tile",
+                                                                        "u_StickA",
+                                                                        "u_StickB" };
   return Names[i_Attribute];
 }
 

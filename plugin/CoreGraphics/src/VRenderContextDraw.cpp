@@ -12,7 +12,7 @@ namespace CoreGraphics
 namespace
 {
 constexpr int MatrixColumns = 4;
-constexpr int MatrixComponents = 16;
+constexpr int LargestVector = 4;
 
 const void* AsPointer( std::size_t i_Offset )
 {
@@ -62,7 +62,7 @@ bool VRenderContext::SetStream( const VVertexStream& i_rStream, std::uint32_t& i
     {
       return false;
     }
-    const bool bMatrix = rElement.Components == MatrixComponents;
+    const bool bMatrix = rElement.Components > LargestVector;
     SetPointer( Location, i_rStream, rElement );
     io_rEnabled |= ( bMatrix ? 0xFu : 1u ) << Location;
   }
@@ -72,13 +72,13 @@ bool VRenderContext::SetStream( const VVertexStream& i_rStream, std::uint32_t& i
 void VRenderContext::SetPointer( int i_Location, const VVertexStream& i_rStream, const VVertexElement& i_rElement )
 {
   const VVertexLayout& rLayout = *i_rStream.pLayout;
-  const int Columns = i_rElement.Components == MatrixComponents ? MatrixColumns : 1;
+  const int Columns = i_rElement.Components > LargestVector ? MatrixColumns : 1;
   VPointer Wanted;
   Wanted.Serial = i_rStream.pBuffer->Serial();
   Wanted.Offset = i_rStream.pBuffer->Offset() + i_rStream.Offset + i_rElement.Offset;
   Wanted.Type = i_rElement.Type;
   Wanted.Stride = rLayout.Stride;
-  Wanted.Components = Columns == 1 ? i_rElement.Components : std::uint8_t( MatrixColumns );
+  Wanted.Components = static_cast< std::uint8_t >( i_rElement.Components / Columns );
   Wanted.Divisor = rLayout.Divisor;
   Wanted.bNormalised = i_rElement.bNormalised;
   for ( int Column = 0; Column < Columns; ++Column )
@@ -96,7 +96,7 @@ void VRenderContext::SetPointer( int i_Location, const VVertexStream& i_rStream,
       }
       rKnown = Wanted;
     }
-    Wanted.Offset += MatrixColumns * sizeof( float );
+    Wanted.Offset += Wanted.Components * sizeof( float );
   }
 }
 

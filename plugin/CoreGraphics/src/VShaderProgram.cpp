@@ -17,7 +17,8 @@ std::atomic< std::uint64_t > s_LinkSerial{ 0 };
 // The same place for an attribute in all programs: what streams turn on then seldom changes between draws, and
 // location 0, which compatibility contexts must have, is always the position's. No program takes two that share
 // a place.
-constexpr std::array< int, EAttributeCount > AttributePlaces = { 0, 1, 2, 3, 4, 5, 6, 10, 10, 11, 11, 12, 11, 13, 14 };
+constexpr std::array< int, EAttributeCount > AttributePlaces = { 0,  1,  2,  3,  4,  5,  6, 10, 10,
+                                                                 11, 11, 12, 11, 13, 14, 6, 7 };
 } // namespace
 
 const char* FixedUniformName( EFixedUniform i_Uniform )

@@ -20,7 +20,7 @@ Simple3DVertexColour: Colour; FullScreen: Copy Distort; Simple: Outlines AntiAli
 ForcePlate: ForcePlate SimpleLighting; Simple3DModel: SimpleLighting;
 Simple3DModelColour: SimpleLighting ClipFloor CameraCoverageFurstum;
 Simple3DModelWireframe: Colour UniformColour; Locator: Colour; Billboard: ActiveLabelHalo;
-PlumeMarkerTrails: Colour; Point3D: Colour; Simple3DPointSize: UniformColour; SimpleColour: Colour;
+PlumeMarkerTrails: Colour; MarkerTrail: Colour; Label: Label; Point3D: Colour; Simple3DPointSize: UniformColour; SimpleColour: Colour;
 ColoredLine: StippledLine; Camera: Camera; CameraRay: Colour CameraCoverageFurstum ClipFloor StippledLine;
 Edge3D: Colour; Edge2D: Colour; General2D: Colour; MaskSquare: Mask MaskSelection;
 Greyscale2D: Greyscale2D Greyscale2DSelection; GreyscaleMaximised: Greyscale2D Greyscale2DSelection;
@@ -30,7 +30,7 @@ Centroid2DTileQuads: Centroid2DTileQuads Centroid2DTileQuadsSelection;
 Greyscale2DTiles: Greyscale2DTiles Greyscale2DTilesSelection; MaskSquareTiles: MaskTiles MaskTilesSelection;
 Edge2DTiles: MaskTiles; WandWave2DTiles: WandWave2DTiles;
 Video: VideoBayer VideoLuminance VideoYUV VideoYUVPlanar VideoImage;
-Stick: Colour SimpleLighting; StickShadow: Colour; Target: SimpleLighting Colour; Segment: Segment;
+Stick: Colour SimpleLighting; StickBetween: Colour; StickShadow: Colour; Target: SimpleLighting Colour; Segment: Segment;
 NonUniformSphere: Covariance; MissingMarker: MissingMarker; FBXSkin: FBXMaterial XRay;
 FBXMesh: FBXMaterial XRay; FBXColoredMesh: FBXMaterial SimpleLighting XRay;)";
 } // namespace

@@ -1,7 +1,10 @@
 #pragma once
 
+#include <MoxelGraphics/VSelectionRegistry.h>
+
 #include <QtGui/QVector4D>
 
+#include <algorithm>
 #include <array>
 
 namespace CoreGraphics
@@ -29,6 +32,20 @@ public:
   {
     return At( m_Planes[0], i_X, i_Y, i_Z ) >= -i_Radius && At( m_Planes[1], i_X, i_Y, i_Z ) >= -i_Radius &&
            At( m_Planes[2], i_X, i_Y, i_Z ) >= -i_Radius && At( m_Planes[3], i_X, i_Y, i_Z ) >= -i_Radius;
+  }
+  /// Whether a stick does that runs from one sphere to another; sure to say yes when it does.
+  bool MeetsLine( const VScenePoint& i_rA, const VScenePoint& i_rB ) const
+  {
+    const auto Reach = [&]( const VScenePoint& i_rEnd )
+    {
+      return Drawn( i_rEnd.Radius, Depth( i_rEnd.X, i_rEnd.Y, i_rEnd.Z ) );
+    };
+    const float Radius = std::max( Reach( i_rA ), Reach( i_rB ) );
+    const auto Inside = [&]( const QVector4D& i_rPlane )
+    {
+      return std::max( At( i_rPlane, i_rA.X, i_rA.Y, i_rA.Z ), At( i_rPlane, i_rB.X, i_rB.Y, i_rB.Z ) ) >= -Radius;
+    };
+    return Inside( m_Planes[0] ) && Inside( m_Planes[1] ) && Inside( m_Planes[2] ) && Inside( m_Planes[3] );
   }
   float PixelsAtOne() const { return m_PixelsAtOne; }
 

@@ -31,6 +31,8 @@ enum EVertexAttribute : std::uint8_t
   EAttributeSegmentColour,    ///< vec4
   EAttributeInstanceFlags,    ///< EInstanceFlag bits, not normalised; from bit 8 on, ids left out so far, below 0x4000
   EAttributeTile,             ///< float: the row of a table that the object is placed by
+  EAttributeStickA,           ///< vec3: where a stick begins
+  EAttributeStickB,           ///< vec3: where it ends
   EAttributeCount
 };
 
@@ -51,7 +53,7 @@ const char* AttributeName( EVertexAttribute i_Attribute );
 struct VVertexElement
 {
   EVertexAttribute Attribute = EAttributePosition;
-  std::uint8_t Components = 4; ///< 1 to 4, or 16 for a matrix
+  std::uint8_t Components = 4; ///< 1 to 4, 16 for a matrix, 12 for one whose columns lack the last row
   GLenum Type = GL_FLOAT;
   bool bNormalised = false;
   std::uint16_t Offset = 0; ///< bytes from the start of a record

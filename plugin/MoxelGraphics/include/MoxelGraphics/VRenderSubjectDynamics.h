@@ -42,7 +42,7 @@ public:
                std::uint32_t i_Pass ) override;
 
   /// Thread: any.
-  const VSubjectCounts& Counts( EGroup i_Group ) const;
+  const VSubjectCounts& Counts( EGroup i_Group ) const { return m_Counts[i_Group]; }
 
   /// The display record that a group goes by.
   static const VDisplayRecord& Record( const VSceneOptions& i_rOptions, std::size_t i_Group );
@@ -50,9 +50,18 @@ public:
 private:
   struct VGl;
   struct VGroupDraw;
+  struct VPass;
+  void RenderSeen( const VPass& i_rPass );
+  void RenderIds( const VPass& i_rPass );
+  void RenderSkins( const VPass& i_rPass );
+  std::size_t DrawBones( const VPass& i_rPass, bool i_bTranslucent );
+  std::size_t DrawWires( const VPass& i_rPass );
+  void TakeBoneMesh();
+
   VMoxelScene& m_rScene;
   std::unique_ptr< VGl > m_pGl;
   std::array< std::unique_ptr< VGroupDraw >, GroupCount > m_Groups;
+  std::array< VSubjectCounts, GroupCount > m_Counts;
 };
 
 } // namespace MoxelGraphics

@@ -40,7 +40,7 @@ public:
                std::uint32_t i_Pass ) override;
 
   /// Thread: any.
-  const VSubjectCounts& Counts( EGroup i_Group ) const;
+  const VSubjectCounts& Counts( EGroup i_Group ) const { return m_Counts[i_Group]; }
 
   /// The display record that a group goes by.
   static const VDisplayRecord& Record( const VSceneOptions& i_rOptions, std::size_t i_Group );
@@ -49,10 +49,18 @@ private:
   struct VGl;
   struct VGroupDraw;
   void RenderGroup( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions, std::size_t i_Group );
+  // What is drawn of the kind; how many show.
+  std::size_t RenderTargets( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions,
+                             VGroupDraw& io_rDraw );
+  std::size_t RenderSticks( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions,
+                            VGroupDraw& io_rDraw, bool i_bDuringGaps );
+  void DrawLines( CoreGraphics::VRenderContext& io_rContext, VGroupDraw& io_rDraw );
+  void DrawRound( CoreGraphics::VRenderContext& io_rContext, VGroupDraw& io_rDraw );
 
   VMoxelScene& m_rScene;
   std::unique_ptr< VGl > m_pGl;
   std::array< std::unique_ptr< VGroupDraw >, GroupCount > m_Groups;
+  std::array< VSubjectCounts, GroupCount > m_Counts;
 };
 
 } // namespace MoxelGraphics

@@ -14,9 +14,8 @@ varying vec4 v_colour;
 
 void main()
 {
-  vec4 world = u_ModelTransform * vec4( a_position, 1.0 );
-  v_position = world.xyz;
+  v_position = ( u_ModelTransform * vec4( a_position, 1.0 ) ).xyz;
   v_normal = mat3( u_ModelTransform ) * a_position;
   v_colour = u_ModelColour;
-  gl_Position = u_ViewProjection * world;
+  gl_Position = u_ViewProjection * vec4( v_position, 1.0 );
 }

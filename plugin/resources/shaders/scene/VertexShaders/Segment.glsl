@@ -29,11 +29,10 @@ vec3 WorldNormal( mat4 model, vec3 normal )
 
 void main()
 {
-  vec4 world = u_ModelTransform * vec4( a_position, 1.0 );
-  v_position = world.xyz;
+  v_position = ( u_ModelTransform * vec4( a_position, 1.0 ) ).xyz;
   v_normal = WorldNormal( u_ModelTransform, a_normal );
   v_localnormal = a_normal;
   v_colour = u_SegmentColour;
   v_uv = a_uv;
-  gl_Position = u_ViewProjection * world;
+  gl_Position = u_ViewProjection * vec4( v_position, 1.0 );
 }
