@@ -145,6 +145,21 @@ bool VTaggedCoreTypeExtractor::Changed( std::uint32_t i_Tag ) const
   return pCache && pCache->Changed();
 }
 
+bool VTaggedCoreTypeExtractor::Changed() const
+{
+  return m_bNamesChanged || std::any_of( m_ItemCacheMap.begin(), m_ItemCacheMap.end(),
+                                         []( const auto& i_rEntry )
+                                         {
+                                           return i_rEntry.second->Changed();
+                                         } );
+}
+
+bool VTaggedCoreTypeExtractor::Occurs( std::uint32_t i_Tag ) const
+{
+  const VItemCache* pCache = Find( i_Tag );
+  return pCache && pCache->Occurs();
+}
+
 void VTaggedCoreTypeExtractor::ChangedBits( std::uint32_t i_Tag, std::vector< bool >& o_rBits ) const
 {
   o_rBits.clear();

@@ -99,6 +99,11 @@ void VRenderCameras::SetPictures( std::span< const VCameraPictures > i_Pictures,
   m_pParts->Edges.Take( m_pProvider->GetCameras(), i_Pictures );
 }
 
+void VRenderCameras::SetPicturesFrame( double i_Frame )
+{
+  m_pParts->Pictures.SetFrame( i_Frame );
+}
+
 void VRenderCameras::Render( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions,
                              std::uint32_t i_Pass )
 {

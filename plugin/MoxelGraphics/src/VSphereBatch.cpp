@@ -5,7 +5,9 @@
 
 #include <CoreGraphics/VRenderContext.h>
 
+#include <bit>
 #include <cmath>
+#include <cstring>
 
 namespace MoxelGraphics
 {
@@ -23,6 +25,15 @@ static_assert( EIdSelected >> FlagShift == CoreGraphics::EInstanceSelected &&
 constexpr std::size_t Lanes = 8;
 
 constexpr VScenePoint Nowhere{ 1e18f, 1e18f, 1e18f, 0 };
+
+/// A sphere in one register.
+using VFour = float __attribute__( ( vector_size( 16 ) ) );
+static_assert( sizeof( VFour ) == sizeof( VScenePoint ) );
+
+constexpr VFour Four( float i_Value )
+{
+  return VFour{ i_Value, i_Value, i_Value, i_Value };
+}
 
 bool IsFinite( float i_Value )
 {
@@ -51,6 +62,11 @@ void VSphereBatch::SetSpheres( std::span< const VScenePoint > i_Spheres )
     ++m_ColoursGeneration;
   }
   m_Spheres.resize( i_Spheres.size() );
+  ++m_SpheresGeneration;
+  if ( TakeOrdinary( i_Spheres ) )
+  {
+    return;
+  }
   m_BoxMin.fill( std::numeric_limits< float >::max() );
   m_BoxMax.fill( std::numeric_limits< float >::lowest() );
   m_LargestRadius = 0;
@@ -68,7 +84,26 @@ void VSphereBatch::SetSpheres( std::span< const VScenePoint > i_Spheres )
     m_BoxMax = { std::max( m_BoxMax[0], rNew.X ), std::max( m_BoxMax[1], rNew.Y ), std::max( m_BoxMax[2], rNew.Z ) };
     m_LargestRadius = std::max( m_LargestRadius, rSphere.Radius );
   }
-  ++m_SpheresGeneration;
+}
+
+bool VSphereBatch::TakeOrdinary( std::span< const VScenePoint > i_Spheres )
+{
+  VFour Least = Four( std::numeric_limits< float >::max() ), Most = Four( std::numeric_limits< float >::lowest() );
+  VFour Excess = Four( 0 ); // 0 for numbers, else NaN
+  for ( std::size_t Index = 0; Index < i_Spheres.size(); ++Index )
+  {
+    const auto Sphere = std::bit_cast< VFour >( i_Spheres[Index] );
+    Least = Sphere < Least ? Sphere : Least;
+    Most = Sphere > Most ? Sphere : Most;
+    Excess += Sphere - Sphere;
+    m_Spheres[Index] = i_Spheres[Index];
+  }
+  const bool bNumbers = Excess[0] == 0 && Excess[1] == 0 && Excess[2] == 0 && Excess[3] == 0;
+  m_bOrdinary = bNumbers && Least[3] > 0 && Most[3] < LargestSize;
+  m_BoxMin = { Least[0], Least[1], Least[2] };
+  m_BoxMax = { Most[0], Most[1], Most[2] };
+  m_LargestRadius = std::max( Most[3], 0.0f );
+  return m_bOrdinary;
 }
 
 void VSphereBatch::SetColour( const std::array< float, 4 >& i_rColour )
@@ -112,7 +147,8 @@ void VSphereBatch::SetIds( std::uint32_t i_FirstId, std::span< const std::uint8_
   }
 }
 
-VSphereExtent VSphereBatch::Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing )
+VSphereExtent VSphereBatch::Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing,
+                                    float i_Small )
 {
   const float Largest = ( i_rSizing.FixedRadius < 0 ? m_LargestRadius : i_rSizing.FixedRadius ) * i_rSizing.Scale;
   const float AtOne = PixelsAtOne( io_rContext );
@@ -130,7 +166,7 @@ VSphereExtent VSphereBatch::Extent( CoreGraphics::VRenderContext& io_rContext, c
     Square += Gap * Gap;
   }
   const float AtMost = Largest * AtOne / std::max( std::sqrt( Square ), 1e-3f );
-  if ( AtMost < CoarsePixels )
+  if ( AtMost < i_Small )
   {
     return { AtMost, 0 };
   }
@@ -223,11 +259,18 @@ bool VSphereBatch::UploadSpheres( const VSphereSizing& i_rSizing )
   {
     return false;
   }
-  for ( const VScenePoint& rSphere : m_Spheres )
+  if ( m_bOrdinary && i_rSizing == VSphereSizing() )
   {
-    // What is not drawn stands where no view reaches: a point would show there even without a size.
-    const float Size = SizeOf( rSphere, i_rSizing );
-    *pInstance++ = Size > 0 ? VScenePoint{ rSphere.X, rSphere.Y, rSphere.Z, Size } : Nowhere;
+    std::memcpy( pInstance, m_Spheres.data(), m_Spheres.size() * sizeof( VScenePoint ) );
+  }
+  else
+  {
+    for ( const VScenePoint& rSphere : m_Spheres )
+    {
+      // What is not drawn stands where no view reaches: a point would show there even without a size.
+      const float Size = SizeOf( rSphere, i_rSizing );
+      *pInstance++ = Size > 0 ? VScenePoint{ rSphere.X, rSphere.Y, rSphere.Z, Size } : Nowhere;
+    }
   }
   m_pGl->Sizing = i_rSizing;
   m_pGl->SpheresGeneration = m_pGl->Spheres.Unmap() ? m_SpheresGeneration : 0;

@@ -113,8 +113,9 @@ void VSphereHelper::Draw( CoreGraphics::VRenderContext& io_rContext, const VMoxe
   // In the highlight mask only the stretch that holds all marked spheres is drawn.
   const std::uint32_t First = bVisible ? 0 : io_rBatch.m_MarkedBegin;
   const std::uint32_t End = bVisible ? static_cast< std::uint32_t >( io_rBatch.Count() ) : io_rBatch.m_MarkedEnd;
-  VMesh* pMesh = m_pGl->MeshFor( io_rBatch.Extent( io_rContext, i_rSizing ), io_rBatch.Count(),
-                                 io_rBatch.Count() < ManySpheres ? CoarsePixels : SmallestPixels );
+  const float PointPixels = io_rBatch.Count() < ManySpheres ? CoarsePixels : SmallestPixels;
+  VMesh* pMesh =
+      m_pGl->MeshFor( io_rBatch.Extent( io_rContext, i_rSizing, PointPixels ), io_rBatch.Count(), PointPixels );
   VInstancedProgramPair& rPrograms = pMesh ? m_pGl->Programs : m_pGl->Points;
   if ( !rPrograms.Use( io_rContext, io_rBatch.FirstId() == 0 ? 0 : io_rBatch.FirstId() + First ) )
   {

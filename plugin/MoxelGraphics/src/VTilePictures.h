@@ -19,6 +19,7 @@ public:
 
   /// As `VRenderCameras::SetPictures`.
   void SetPictures( std::span< const VCameraPictures > i_Pictures, double i_Frame );
+  void SetFrame( double i_Frame ) { m_Frame = i_Frame; }
   /// A camera came, went or has another sensor.
   void CamerasChanged() { ++m_CamerasGeneration; }
 

@@ -99,6 +99,10 @@ public:
   /// The entries of a tag by slot; the state's end cursor where an object has none.
   const std::vector< ZEK::VFlowCursor >& Entries( std::uint32_t i_Tag ) const;
   bool Changed( std::uint32_t i_Tag ) const;
+  /// Whether the names or anything of any tag changed.
+  bool Changed() const;
+  /// Whether the state has an item of the tag, be it of an object or not.
+  bool Occurs( std::uint32_t i_Tag ) const;
   /// See `VItemCache::ChangedBits`.
   void ChangedBits( std::uint32_t i_Tag, std::vector< bool >& o_rBits ) const;
 

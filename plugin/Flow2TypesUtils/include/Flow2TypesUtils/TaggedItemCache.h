@@ -59,6 +59,7 @@ public:
   void ChangedBits( std::vector< bool >& o_rBits ) const;
   /// By slot, the end cursor where an object has none.
   const std::vector< ZEK::VFlowCursor >& Entries() const;
+  bool Occurs() const { return !m_Seen.empty(); }
   ETagRequirement Requirement() const { return m_Requirement; }
   std::uint32_t Tag() const { return m_Tag; }
   std::span< const ZEK::VFlowValueId > Ids() const { return m_Ids; }

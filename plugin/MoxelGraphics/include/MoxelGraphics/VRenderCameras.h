@@ -94,6 +94,8 @@ public:
   /// By the cameras' numbers, as many as the provider has cameras. `i_Frame` is the newest in which the wand was
   /// seen, and the states since: the age of what the wand left counts from it.
   void SetPictures( std::span< const VCameraPictures > i_Pictures, double i_Frame );
+  /// The same pictures in another frame.
+  void SetPicturesFrame( double i_Frame );
 
   void SetPrimaryColour( const QVector4D& i_rColour ) { m_PrimaryColour = i_rColour; }
 

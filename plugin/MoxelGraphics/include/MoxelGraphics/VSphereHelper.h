@@ -92,7 +92,10 @@ private:
     VSphereExtent Extent;
   };
 
-  VSphereExtent Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing );
+  /// Takes spheres that all have numbers and a size; false, with the spheres half taken, when there are others.
+  bool TakeOrdinary( std::span< const VScenePoint > i_Spheres );
+  /// Below `i_Small` pixels an upper bound does.
+  VSphereExtent Extent( CoreGraphics::VRenderContext& io_rContext, const VSphereSizing& i_rSizing, float i_Small );
   VSphereExtent MeasureEach( const QVector4D& i_rDepth, float i_PixelsAtOne, const VSphereSizing& i_rSizing ) const;
   /// Appends those of the spheres from `i_First` to `i_End` that reach into the window and are not ignored.
   VSphereExtent Gather( const VPickWindow& i_rWindow, const VSphereSizing& i_rSizing, const VMoxelScene& i_rScene,
@@ -109,6 +112,7 @@ private:
   std::uint32_t m_MarkedBegin = 0, m_MarkedEnd = 0; ///< all selected and preselected ones lie in between
   std::array< float, 3 > m_BoxMin{}, m_BoxMax{};
   float m_LargestRadius = 0;
+  bool m_bOrdinary = false; ///< all are drawn, with the radius that they have
   std::uint64_t m_SpheresGeneration = 1;
   std::uint64_t m_ColoursGeneration = 1;
   std::uint64_t m_FlagsGeneration = 1;
