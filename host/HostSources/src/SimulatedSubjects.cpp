@@ -15,9 +15,6 @@ namespace
 
 constexpr f32 HealthOfLostBone = 0.15F;
 
-/// A character's proportions: small, with a big head and long arms.
-constexpr VBodyShape CharacterShape{ .Legs = 0.68, .Trunk = 0.72, .Arms = 0.8, .Head = 1.15, .Breadth = 0.85 };
-
 VSubject Named( const VWalkerBody& i_rBody, std::uint32_t i_Id, const std::string& i_rName, bool i_bMarkers )
 {
   VSubject Subject = i_rBody.Subject();

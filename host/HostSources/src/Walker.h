@@ -71,5 +71,7 @@ struct VNamedPose
 };
 /// The first is "Neutral", zeros.
 std::vector< VNamedPose > NamedPoses( const VWalkerBody& i_rBody );
+/// Arms and legs away from each other and from the trunk, feet flat on the floor.
+VWalkerState SpreadState( const VWalkerBody& i_rBody );
 
 } // namespace HostSources::Simulation

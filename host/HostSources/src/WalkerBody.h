@@ -81,6 +81,8 @@ struct VBodyShape
   double Legs = 1, Trunk = 1, Arms = 1, Head = 1, Breadth = 1;
 };
 VBodyShape ShapeScaled( double i_Scale );
+/// Of a character that a performer drives: small, with a big head and long arms.
+inline constexpr VBodyShape CharacterShape{ .Legs = 0.68, .Trunk = 0.72, .Arms = 0.8, .Head = 1.15, .Breadth = 0.85 };
 
 // Lengths of a leg of 1, mm.
 inline constexpr double ThighLength = 430, ShinLength = 420, AnkleHeight = 80, ToeJointHeight = 18;

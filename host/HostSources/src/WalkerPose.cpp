@@ -133,6 +133,17 @@ void FillWalk( const VWalkerStyle& i_rStyle, const VBodyShape& i_rShape, double 
   }
 }
 
+void PutFeet( const VBodyShape& i_rShape, const VFrame& i_rPelvis, double i_Apart, VStateFiller& io_rState )
+{
+  io_rState.PutHips( i_rPelvis );
+  for ( const int Side : { 1, -1 } )
+  {
+    VFrame Foot;
+    Foot.Origin = { BallToAnkle * i_rShape.Legs, Side * ( HipWidth * i_rShape.Breadth + i_Apart ), 0 };
+    io_rState.PutLeg( i_rPelvis, Foot, 0, Side );
+  }
+}
+
 } // namespace
 
 void PoseWalker( const VWalkerStyle& i_rStyle, const VWalkerBody& i_rBody, double i_Seconds, VWalkerPose& o_rPose )
@@ -164,16 +175,6 @@ std::vector< VNamedPose > NamedPoses( const VWalkerBody& i_rBody )
     VStateFiller State( rShape, rPose.State );
     i_Fill( State, rPose.State );
   };
-  const auto PutFeet = [&]( VStateFiller& io_rState, const VFrame& i_rPelvis )
-  {
-    io_rState.PutHips( i_rPelvis );
-    for ( const int Side : { 1, -1 } )
-    {
-      VFrame Foot;
-      Foot.Origin = { BallToAnkle * rShape.Legs, Side * HipWidth * rShape.Breadth, 0 };
-      io_rState.PutLeg( i_rPelvis, Foot, 0, Side );
-    }
-  };
   Add( "Neutral", []( VStateFiller&, VWalkerState& ) {} );
   Add( "T-pose",
        []( VStateFiller& io_rState, VWalkerState& )
@@ -195,7 +196,7 @@ std::vector< VNamedPose > NamedPoses( const VWalkerBody& i_rBody )
        {
          VFrame Pelvis = Pitched( Yawed( {}, 0.15 ), 0.1 );
          Pelvis.Origin = { 20 * rShape.Legs, 0, ( HipsHeight - 25 ) * rShape.Legs };
-         PutFeet( io_rState, Pelvis );
+         PutFeet( rShape, Pelvis, 0, io_rState );
          io_rState.Bend( ESpine, 0.2, 0.08, 0.05 );
          io_rState.Bend( EChest, 0.2, 0.05, 0.05 );
          io_rState.Bend( EHead, 0.1, -0.35, 0 );
@@ -208,7 +209,7 @@ std::vector< VNamedPose > NamedPoses( const VWalkerBody& i_rBody )
        {
          VFrame Pelvis = Pitched( {}, 0.45 );
          Pelvis.Origin = { -130 * rShape.Legs, 0, 0.56 * HipsHeight * rShape.Legs };
-         PutFeet( io_rState, Pelvis );
+         PutFeet( rShape, Pelvis, 0, io_rState );
          io_rState.Bend( ESpine, 0, 0.15, 0 );
          io_rState.Bend( EChest, 0, 0.1, 0 );
          io_rState.Bend( EHead, 0, -0.5, 0 );
@@ -216,6 +217,19 @@ std::vector< VNamedPose > NamedPoses( const VWalkerBody& i_rBody )
          io_rState.PutArm( -1, 1.5, 0.1, 0.3 );
        } );
   return Poses;
+}
+
+VWalkerState SpreadState( const VWalkerBody& i_rBody )
+{
+  const VBodyShape& rShape = i_rBody.Shape();
+  VWalkerState Result;
+  VStateFiller State( rShape, Result );
+  VFrame Pelvis;
+  Pelvis.Origin.z = ( HipsHeight - 15 ) * rShape.Legs;
+  PutFeet( rShape, Pelvis, 110 * rShape.Legs, State );
+  State.PutArm( 1, 0, 1.1, 0.1 );
+  State.PutArm( -1, 0, 1.1, 0.1 );
+  return Result;
 }
 
 } // namespace HostSources::Simulation
