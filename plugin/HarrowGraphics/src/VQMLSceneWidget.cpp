@@ -115,15 +115,6 @@ void VQMLSceneWidget::update()
   QQuickWidget::update();
 }
 
-void VQMLSceneWidget::setPoseIndex( uint i_Index )
-{
-  if ( m_PoseIndex != i_Index )
-  {
-    m_PoseIndex = i_Index;
-    emit PoseIndexChanged();
-  }
-}
-
 void VQMLSceneWidget::OnViewSettingsToggled( bool i_bChecked )
 {
   SetContextProperty( "contextViewSettingsEnabled", i_bChecked );

@@ -2,6 +2,7 @@
 
 #include "SceneOptionsState.h"
 
+#include <HarrowGraphics/VHarrowSubjectScene.h>
 #include <MoxelGraphics/VCameraGrid.h>
 #include <ZEK/Log.h>
 
@@ -39,6 +40,7 @@ VSceneWindowContent::VSceneWindowContent( std::string i_Name, const QPointer< QW
                                           VSceneWidgetArguments i_Arguments )
   : m_Name( std::move( i_Name ) )
   , m_Kind( i_Arguments.Kind )
+  , m_bChoosesPoses( ( i_Arguments.FeatureFlags & HarrowPluginInterface::EFeatureSubjects ) != 0 )
   , m_pWidget( new VQMLSceneWidget( std::move( i_Arguments ) ) )
 {
   setWindowTitle( QString::fromStdString( m_Name ) );
@@ -71,6 +73,51 @@ void VSceneWindowContent::FillToolbar( QWidget& io_rToolbar )
   {
     AddCameraTypes( io_rToolbar );
   }
+  if ( m_Kind == EWindowKindSubject && m_bChoosesPoses )
+  {
+    AddPoses( io_rToolbar );
+  }
+}
+
+void VSceneWindowContent::AddPoses( QWidget& io_rToolbar )
+{
+  m_pPose = new QComboBox( &io_rToolbar );
+  m_pPose->setObjectName( "Pose" );
+  m_pPose->setFocusPolicy( Qt::NoFocus );
+  m_pPose->setSizeAdjustPolicy( QComboBox::AdjustToContents );
+  m_pPose->setToolTip( tr( "The pose that the subjects stand in" ) );
+  connect( m_pPose.data(), &QComboBox::activated, m_pWidget,
+           [this]( int i_Index )
+           {
+             m_pWidget->setPoseIndex( static_cast< uint >( i_Index ) );
+           } );
+  connect( m_pWidget, &VQMLSceneWidget::PoseIndexChanged, this, &VSceneWindowContent::ShowPoses );
+  connect( m_pWidget->SubjectScene(), &VHarrowSubjectScene::PosesChanged, this, &VSceneWindowContent::ShowPoses );
+  io_rToolbar.layout()->addWidget( m_pPose );
+  m_Tools << m_pPose.data();
+  ShowPoses();
+}
+
+void VSceneWindowContent::ShowPoses()
+{
+  if ( !m_pPose )
+  {
+    return;
+  }
+  const QStringList Poses = m_pWidget->SubjectScene()->PoseNames();
+  QStringList Shown;
+  for ( int Index = 0; Index < m_pPose->count(); ++Index )
+  {
+    Shown << m_pPose->itemText( Index );
+  }
+  if ( Shown != Poses )
+  {
+    m_pPose->clear();
+    m_pPose->addItems( Poses );
+  }
+  m_pPose->setEnabled( !Poses.isEmpty() );
+  const uint Pose = m_pWidget->poseIndex();
+  m_pPose->setCurrentIndex( Pose < static_cast< uint >( Poses.size() ) ? static_cast< int >( Pose ) : -1 );
 }
 
 void VSceneWindowContent::AddCameraTypes( QWidget& io_rToolbar )
@@ -141,6 +188,10 @@ void VSceneWindowContent::SaveState( HarrowPluginInterface::IStateWriter& io_rWr
   {
     SaveCameras( io_rWriter, i_rPrefix );
   }
+  if ( m_Kind == EWindowKindSubject )
+  {
+    io_rWriter.Write( i_rPrefix + "PoseIndex", m_pWidget->poseIndex() );
+  }
 }
 
 void VSceneWindowContent::SaveCameras( HarrowPluginInterface::IStateWriter& io_rWriter, const QString& i_rPrefix )
@@ -164,6 +215,12 @@ void VSceneWindowContent::RestoreState( const HarrowPluginInterface::IStateReade
   if ( m_Kind == EWindowKindCameras )
   {
     RestoreCameras( i_rReader, i_rPrefix );
+  }
+  if ( m_Kind == EWindowKindSubject )
+  {
+    uint Pose = m_pWidget->poseIndex();
+    ReadValue( i_rReader, i_rPrefix + "PoseIndex", Pose );
+    m_pWidget->setPoseIndex( Pose );
   }
   auto* const pItem = m_pWidget->SceneItem();
   if ( !pItem )

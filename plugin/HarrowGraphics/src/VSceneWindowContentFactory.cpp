@@ -2,6 +2,7 @@
 
 #include <HarrowGraphics/VCameraModelStateCacheDataSource.h>
 #include <HarrowGraphics/VHarrowScene.h>
+#include <HarrowGraphics/VHarrowSubjectScene.h>
 #include <HarrowGraphics/VSceneManager.h>
 #include <HarrowGraphics/VSceneWindowContent.h>
 
@@ -23,19 +24,41 @@ VSceneWindowContentFactory::VSceneWindowContentFactory( HarrowPluginInterface::I
 {
 }
 
+void VSceneWindowContentFactory::MakeSubjectScene(
+    const std::shared_ptr< HarrowPluginInterface::IStateCacheContext >& i_rpContext,
+    VSceneWidgetArguments& io_rArguments )
+{
+  VHarrowSubjectSceneArguments Scene;
+  Scene.pRenderResources = m_rWorkspace.RenderResources();
+  Scene.pContext = i_rpContext;
+  Scene.pPostal = m_rApplication.PostalService();
+  Scene.pSelection = m_rApplication.Selection();
+  Scene.pMeshCache = m_rWorkspace.MeshCache();
+  Scene.SubjectFlowContext = m_rApplication.SubjectFlowContext();
+  Scene.bDeveloperMode = m_rApplication.DeveloperMode();
+  io_rArguments.pScene = ZEK::MakeShared< VHarrowSubjectScene >( std::move( Scene ) );
+}
+
 void VSceneWindowContentFactory::Create(
     std::shared_ptr< HarrowPluginInterface::VWindowFrameContent >& o_rpContent,
     const std::shared_ptr< HarrowPluginInterface::IStateCacheContext >& i_rpContext,
     const QPointer< QWidget >& i_rpToolbar )
 {
   VSceneWidgetArguments Arguments;
-  const VContextScene Scene = m_pSceneManager->ForContext( i_rpContext );
-  Arguments.pScene = Scene.pScene;
-  Arguments.pCameraData = Scene.pCameraData;
-  if ( Scene.pScene && m_Kind == EWindowKindCameras )
+  if ( m_Kind == EWindowKindSubject )
   {
-    Arguments.pCameraData =
-        std::make_shared< Flow2Graphics::VContributionTileData >( Scene.pCameraData, Scene.pScene->Contributions() );
+    MakeSubjectScene( i_rpContext, Arguments );
+  }
+  else
+  {
+    const VContextScene Scene = m_pSceneManager->ForContext( i_rpContext );
+    Arguments.pScene = Scene.pScene;
+    Arguments.pCameraData = Scene.pCameraData;
+    if ( Scene.pScene && m_Kind == EWindowKindCameras )
+    {
+      Arguments.pCameraData =
+          std::make_shared< Flow2Graphics::VContributionTileData >( Scene.pCameraData, Scene.pScene->Contributions() );
+    }
   }
   Arguments.pQuickHost = m_rWorkspace.QuickHost();
   Arguments.pSelection = m_rApplication.Selection();

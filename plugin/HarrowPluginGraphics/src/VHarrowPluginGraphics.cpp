@@ -53,6 +53,10 @@ bool VHarrowPluginGraphics::CreateWorkspaceContent( HarrowPluginInterface::IHarr
   pFactories->AddFactory(
       "Cameras", std::make_shared< HarrowGraphics::VSceneWindowContentFactory >(
                      io_rApplication, io_rWorkspace, "Cameras", pSceneManager, HarrowGraphics::EWindowKindCameras ) );
+  const char* const pSubject = ( Flags & HarrowPluginInterface::EFeatureSubjects ) != 0 ? "Subject" : "Object";
+  pFactories->AddFactory(
+      pSubject, std::make_shared< HarrowGraphics::VSceneWindowContentFactory >(
+                    io_rApplication, io_rWorkspace, pSubject, pSceneManager, HarrowGraphics::EWindowKindSubject ) );
 
   if ( const auto pManipulator = io_rApplication.ObjectManipulator();
        pManipulator &&

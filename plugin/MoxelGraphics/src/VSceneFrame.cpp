@@ -202,10 +202,10 @@ void VSceneFrame::Begin()
   m_pContext->SetPixelRatio( m_Input.PixelRatio );
 }
 
-void VSceneFrame::CollectPoints( const ZEK::VSelection& i_rSelection )
+void VSceneFrame::CollectPoints( const std::vector< VScenePoint >& i_rPoints )
 {
   m_Points.clear();
-  for ( const VScenePoint& rPoint : m_pScene->GetSelectionPositions( i_rSelection ) )
+  for ( const VScenePoint& rPoint : i_rPoints )
   {
     if ( std::isfinite( rPoint.X ) && std::isfinite( rPoint.Y ) && std::isfinite( rPoint.Z ) )
     {
@@ -216,17 +216,22 @@ void VSceneFrame::CollectPoints( const ZEK::VSelection& i_rSelection )
 
 void VSceneFrame::UpdateCamera()
 {
-  const bool bFit = std::exchange( m_Input.bFit, false );
+  bool bFit = std::exchange( m_Input.bFit, false );
   VScenePose Pose;
   const bool bPose = m_Input.Tracking == ELockCurrent && m_pScene->GetSelectionPose( m_Input.TrackedSelection, Pose );
   m_Points.clear();
   if ( bFit || m_Input.Tracking == ETrackCurrent )
   {
-    CollectPoints( m_Input.TrackedSelection );
+    CollectPoints( m_pScene->GetSelectionPositions( m_Input.TrackedSelection ) );
   }
   else if ( m_Input.Tracking == ETrackSelection )
   {
-    CollectPoints( m_pScene->GetSelection() );
+    CollectPoints( m_pScene->GetSelectionPositions( m_pScene->GetSelection() ) );
+  }
+  else if ( !m_bAtHome && !m_Input.Options.CameraView )
+  {
+    CollectPoints( m_pScene->HomePoints() );
+    m_bAtHome = bFit = !m_Points.empty();
   }
   m_pController->SetYUp( m_pScene->YUp() );
   m_pController->SetFocusPoints( m_Points, bFit );

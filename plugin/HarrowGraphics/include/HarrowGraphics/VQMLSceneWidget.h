@@ -26,6 +26,7 @@ class ICoreUserPreferencesLayout;
 
 namespace HarrowGraphics
 {
+class VHarrowSubjectScene;
 
 /// The window kinds; they index the root document.
 enum EWindowKind : int
@@ -59,6 +60,8 @@ class VQMLSceneWidget : public MoxelQtQuick::VQuickWidget
   Q_PROPERTY( bool focusSupported READ focusSupported CONSTANT )
   Q_PROPERTY( bool trackingSupported READ trackingSupported CONSTANT )
   Q_PROPERTY( uint poseIndex READ poseIndex WRITE setPoseIndex NOTIFY PoseIndexChanged )
+  Q_PROPERTY( int labellingPoseIndex READ labellingPoseIndex WRITE setLabellingPoseIndex NOTIFY PoseIndexChanged )
+  Q_PROPERTY( int solvingPoseIndex READ solvingPoseIndex WRITE setSolvingPoseIndex NOTIFY PoseIndexChanged )
 
 public:
   explicit VQMLSceneWidget( VSceneWidgetArguments i_Arguments );
@@ -68,6 +71,13 @@ public:
   bool trackingSupported() const { return m_Arguments.Kind == EWindowKind3D; }
   uint poseIndex() const { return m_PoseIndex; }
   void setPoseIndex( uint i_Index );
+  /// Of labelled or solved subjects alone; below 0: they follow `poseIndex`.
+  int labellingPoseIndex() const { return m_LabellingPose; }
+  void setLabellingPoseIndex( int i_Index );
+  int solvingPoseIndex() const { return m_SolvingPose; }
+  void setSolvingPoseIndex( int i_Index );
+  /// The scene of a window of subjects; null in other windows.
+  VHarrowSubjectScene* SubjectScene() const;
 
   /// The item of the loaded document; null until the document is ready, and when it failed.
   MoxelGraphics::VSceneFramebufferObject* SceneItem() const { return m_pSceneItem; }
@@ -117,6 +127,7 @@ private:
   void PublishContext();
   void FindSceneItem();
   void StartCameraWindow();
+  void ShowPoses();
   void OnActivityChanged();
   void PaintMask( std::uint8_t i_Value );
   bool ExecuteCameraCommand( const std::string& i_rText );
@@ -130,6 +141,8 @@ private:
   QTimer m_UpdateTimer;
   QPointer< MoxelGraphics::VSceneFramebufferObject > m_pSceneItem;
   uint m_PoseIndex = 0;
+  int m_LabellingPose = -1;
+  int m_SolvingPose = -1;
   ZEK::VConnection m_ActivityConnection;
   std::shared_ptr< ZEK::IMultiCallback< void() > > m_pCameraSelection;
   ZEK::VConnection m_SelectionConnection;

@@ -6,6 +6,7 @@
 #include <QtCore/QList>
 #include <QtCore/QPointer>
 
+class QComboBox;
 class QPushButton;
 
 namespace HarrowGraphics
@@ -32,6 +33,8 @@ private:
   void FillToolbar( QWidget& io_rToolbar );
   void AddCameraTypes( QWidget& io_rToolbar );
   void AddCameraTools( QWidget& io_rToolbar );
+  void AddPoses( QWidget& io_rToolbar );
+  void ShowPoses();
   QPushButton* AddButton( QWidget& io_rToolbar, const QString& i_rName, const QString& i_rText );
   void UpdateMaskButtons();
   void SaveCameras( HarrowPluginInterface::IStateWriter& io_rWriter, const QString& i_rPrefix );
@@ -39,8 +42,10 @@ private:
 
   std::string m_Name;
   EWindowKind m_Kind;
+  bool m_bChoosesPoses;
   VQMLSceneWidget* m_pWidget;           ///< a child widget
   QList< QPointer< QWidget > > m_Tools; ///< in the host's toolbar
+  QPointer< QComboBox > m_pPose;
   QPointer< QPushButton > m_pPin;
   QPointer< QPushButton > m_pMaskPaint;
   QPointer< QPushButton > m_pMaskErase;

@@ -23,6 +23,9 @@ public:
                const QPointer< QWidget >& i_rpToolbar ) override;
 
 private:
+  void MakeSubjectScene( const std::shared_ptr< HarrowPluginInterface::IStateCacheContext >& i_rpContext,
+                         VSceneWidgetArguments& io_rArguments );
+
   HarrowPluginInterface::IHarrowApplication& m_rApplication;
   HarrowPluginInterface::IHarrowWorkspace& m_rWorkspace;
   std::string m_Name;

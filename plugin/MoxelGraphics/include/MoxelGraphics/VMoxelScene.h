@@ -94,6 +94,8 @@ public:
   virtual QString GetSelectedCameraURN();
   /// Makes the named item the whole selection or preselection. Nothing in the base.
   virtual void SelectDevice( const QString& i_rName, bool i_bPreselect );
+  /// Spheres that a free view shows all of at first, as soon as there are some. None in the base: views start alike.
+  virtual std::vector< VScenePoint > HomePoints() { return {}; }
   /// What a view's report tells of the scene beside the frame. Thread: GUI. Nothing in the base.
   virtual QVariantMap SceneReport() { return {}; }
 

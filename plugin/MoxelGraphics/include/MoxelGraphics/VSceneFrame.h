@@ -118,7 +118,7 @@ private:
   void UpdateCamera();
   /// Of a free view that looks through a camera: all of its image, in the middle of the frame.
   const QVector4D& ViewThroughCamera();
-  void CollectPoints( const ZEK::VSelection& i_rSelection );
+  void CollectPoints( const std::vector< VScenePoint >& i_rPoints );
   void SelectAndHighlight();
   bool IsBand() const;
   void PickPoint();
@@ -172,7 +172,8 @@ private:
   QString m_Notice;
   QSize m_Size;
   bool m_bRefused = false;
-  QRect m_DirtyMask; ///< of the selection target, what is not known to be clear
+  bool m_bAtHome = false; ///< the view has shown what the scene wants to be shown at first
+  QRect m_DirtyMask;      ///< of the selection target, what is not known to be clear
   QElapsedTimer m_Clock;
   std::vector< std::uint32_t > m_Pixels;
   std::vector< std::uint32_t > m_Found; ///< in the order in which they were found
