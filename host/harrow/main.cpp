@@ -61,7 +61,7 @@ int Run( int i_Count, char** i_ppArguments )
   }
   if ( Line.Mode == HostWindow::EProgramMode::Info )
   {
-    return Report( HostWindow::RunInfo( Line.Files, Line.bJson, Line.Common.Folder ) );
+    return Report( HostWindow::RunInfo( Line.Files, Line.bJson, Line.Common.Reading ) );
   }
   if ( Line.Mode == HostWindow::EProgramMode::InspectCameras )
   {

@@ -2,9 +2,8 @@
 
 // A skeleton as a BVH file has it, and as a subject.
 
-#include <HostSources/VRecordingSkeleton.h>
+#include "SkeletonMath.h"
 
-#include <array>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -12,8 +11,6 @@
 
 namespace HostSources::Bvh
 {
-
-using VVector = std::array< double, 3 >;
 
 /// What a number of a row says; the order of its axes within both.
 enum class EChannel : std::uint8_t

@@ -1,5 +1,7 @@
 #include "RecordingInfoParts.h"
 
+#include "RecordingSubjects.h"
+
 #include <algorithm>
 #include <array>
 #include <cmath>
@@ -355,6 +357,7 @@ VRecordingInfo DescribeRecording( const VRecording& i_rRecording )
                 : i_rRecording.Format == ERecordingFormat::Trc    ? "TRC"
                 : i_rRecording.Format == ERecordingFormat::Folder ? "folder"
                 : i_rRecording.Format == ERecordingFormat::Bvh    ? "BVH"
+                : i_rRecording.Format == ERecordingFormat::Motion ? "MOT"
                                                                   : "none";
   Info.Form = i_rRecording.Form;
   Info.Unit = i_rRecording.Unit;
@@ -379,6 +382,13 @@ VRecordingInfo DescribeRecording( const VRecording& i_rRecording )
   for ( const VForcePlate& rPlate : i_rRecording.ForcePlates )
   {
     Info.ForcePlates.push_back( DescribePlate( rPlate, i_rRecording.AnalogPerFrame ) );
+  }
+  const VRecordingSubjects Subjects = SubjectsOf( i_rRecording );
+  Info.NobodysPointCount = Info.PointCount;
+  for ( const CoreMoxelTypes::VSubject& rSubject : Subjects.Subjects )
+  {
+    Info.Subjects.push_back( DescribeSubject( rSubject ) );
+    Info.NobodysPointCount -= rSubject.Markers.size();
   }
   for ( const VRecordingSkeleton& rSkeleton : i_rRecording.Skeletons )
   {
@@ -412,6 +422,15 @@ std::string VRecordingInfo::Text() const
   for ( const VPlate& rPlate : ForcePlates )
   {
     Lines += ( &rPlate == &ForcePlates.front() ? "Plates:\n" : "" ) + PlateText( rPlate );
+  }
+  for ( const VSubject& rSubject : Subjects )
+  {
+    Lines += SubjectText( rSubject );
+  }
+  if ( NobodysPointCount > 0 )
+  {
+    Lines += HostSources::Format( "  %llu columns have no name, or one that a program gave, and belong to no subject\n",
+                                  static_cast< unsigned long long >( NobodysPointCount ) );
   }
   for ( const VSkeleton& rSkeleton : Skeletons )
   {
@@ -451,6 +470,8 @@ std::string VRecordingInfo::Json() const
   WritePoints( Writer, *this );
   HostSources::Text( Writer, "upAxis", UpAxis == EUpAxis::Y ? "y" : "z" );
   HostSources::Text( Writer, "upAxisReason", UpAxisReason );
+  WriteSubjects( Writer, *this );
+  Integer( Writer, "pointsOfNoSubject", static_cast< std::int64_t >( NobodysPointCount ) );
   WriteSkeletons( Writer, *this );
   WriteCameras( Writer, *this );
   WriteAnalogAndEvents( Writer, *this );

@@ -27,6 +27,10 @@ void Integer( VWriter& io_rWriter, const char* i_pKey, std::int64_t i_Value );
 void Text( VWriter& io_rWriter, const char* i_pKey, const std::string& i_rValue );
 void Texts( VWriter& io_rWriter, const char* i_pKey, const std::vector< std::string >& i_rValues );
 
+VRecordingInfo::VSubject DescribeSubject( const CoreMoxelTypes::VSubject& i_rSubject );
+std::string SubjectText( const VRecordingInfo::VSubject& i_rSubject );
+void WriteSubjects( VWriter& io_rWriter, const VRecordingInfo& i_rInfo );
+
 VRecordingInfo::VSkeleton DescribeSkeleton( const VRecordingSkeleton& i_rSkeleton );
 std::string SkeletonText( const VRecordingInfo::VSkeleton& i_rSkeleton );
 void WriteSkeletons( VWriter& io_rWriter, const VRecordingInfo& i_rInfo );

@@ -1,5 +1,7 @@
 #include "RecordingSkeletons.h"
 
+#include "RecordingSubjects.h"
+
 #include <CoreMoxelTypes/FlowTypes.h>
 
 namespace HostSources
@@ -21,6 +23,39 @@ ZEK::IResult MakeNamed( const VStateMaker& i_rMaker, const std::string& i_rName,
     o_rItem->MutableValue().SetName( ZEK::EFlowNameObject, i_rName );
   }
   return Result;
+}
+
+/// From a world whose y is up into one whose z is.
+Rigid TurnedUp( const Rigid& i_rRigid )
+{
+  using ComputeSubject::VRigidTransform;
+  VRigidTransform Turn; // by 90 degrees about x
+  Turn.m_Rotation[0] = 1;
+  Turn.m_Rotation[5] = -1;
+  Turn.m_Rotation[7] = 1;
+  return ( Turn * VRigidTransform::From( i_rRigid ) ).ToRigid();
+}
+
+void FillMarkerColours( const VSubject& i_rSubject, VSubjectApplicationData& o_rLook )
+{
+  for ( std::size_t Index = 0; Index < i_rSubject.Markers.size(); ++Index )
+  {
+    o_rLook.MarkerColours.push_back( MarkerColour( Index ) );
+  }
+}
+
+/// Where the pose has the model's markers.
+void FillMarkers( const ComputeSubject::VComputeSubjectFK& i_rSubject, std::size_t i_Count,
+                  VSubjectDynamicParameters& o_rMoves )
+{
+  constexpr double None = std::numeric_limits< double >::quiet_NaN();
+  std::vector< std::array< double, 3 > > Places( i_Count, { None, None, None } );
+  (void)i_rSubject.Positions( Places ); // those past the end are on no segment
+  for ( const auto& rPlace : Places )
+  {
+    o_rMoves.MarkerPositions.push_back( { rPlace[0], rPlace[1], rPlace[2] } );
+  }
+  o_rMoves.MarkerVisible.assign( i_Count, 1 );
 }
 } // namespace
 
@@ -47,7 +82,7 @@ ZEK::IResult VRecordingSkeletons::MakeSlowItems( const VStateMaker& i_rMaker,
     rPlayed.Of = -1;
     VSubject Subject = rPlayed.pSkeleton->Subject;
     Subject.Id = rPlayed.Id;
-    ZEK::VFlowItemRef Items[3];
+    ZEK::VFlowItemRef Items[2];
     Result = MakeNamed< FlowSubject >( i_rMaker, Subject.Name, Items[0],
                                        [&]( VSubject& o_rValue )
                                        {
@@ -59,24 +94,44 @@ ZEK::IResult VRecordingSkeletons::MakeSlowItems( const VStateMaker& i_rMaker,
                                                                          {
                                                                            o_rValue.SegmentColours.assign(
                                                                                Subject.Segments.size(), BoneColour );
+                                                                           FillMarkerColours( Subject, o_rValue );
                                                                          } );
-    // The neutral pose and the first one, for views of the structure alone.
-    Result = Result.IsError() ? Result
-                              : MakeNamed< FlowSubjectParametrised >(
-                                    i_rMaker, Subject.Name, Items[2],
-                                    [&]( VSubjectParametrised& o_rValue )
-                                    {
-                                      const auto First = rPlayed.pSkeleton->State( 0 );
-                                      o_rValue.Base = Subject;
-                                      o_rValue.Poses = { std::vector< f64 >( First.size() ),
-                                                         std::vector< f64 >( First.begin(), First.end() ) };
-                                      o_rValue.PoseNames = { "Neutral", "First frame" };
-                                    } );
     if ( Result.IsError() )
     {
       return Result;
     }
     io_rSlow.insert( io_rSlow.end(), std::begin( Items ), std::end( Items ) );
+  }
+  return Result;
+}
+
+ZEK::IResult VRecordingSkeletons::MakePoses( const VStateMaker& i_rMaker, EUpAxis i_Up )
+{
+  ZEK::IResult Result;
+  for ( VPlayed& rPlayed : m_Played )
+  {
+    const VRecordingSkeleton& rSkeleton = *rPlayed.pSkeleton;
+    // The neutral pose and the first one.
+    const auto Fill = [&]( VSubjectParametrised& o_rValue )
+    {
+      const auto First = rSkeleton.State( 0 );
+      o_rValue.Base = rSkeleton.Subject;
+      o_rValue.Base.Id = rPlayed.Id;
+      for ( VSegment& rSegment : o_rValue.Base.Segments )
+      {
+        if ( i_Up == EUpAxis::Y && rSegment.Parent < 0 )
+        {
+          rSegment.Pre = TurnedUp( rSegment.Pre );
+        }
+      }
+      o_rValue.Poses = { std::vector< f64 >( First.size() ), std::vector< f64 >( First.begin(), First.end() ) };
+      o_rValue.PoseNames = { "Neutral", "First frame" };
+    };
+    Result = MakeNamed< FlowSubjectParametrised >( i_rMaker, rSkeleton.Subject.Name, rPlayed.Poses, Fill );
+    if ( Result.IsError() )
+    {
+      return Result;
+    }
   }
   return Result;
 }
@@ -100,6 +155,7 @@ ZEK::IResult VRecordingSkeletons::MakeFastItems( const VStateMaker& i_rMaker, st
           o_rValue.Segments.push_back( rPose.ToRigid() );
         }
         o_rValue.SegmentHealth.assign( o_rValue.Segments.size(), 1 );
+        FillMarkers( *rPlayed.pSubject, rPlayed.pSkeleton->Subject.Markers.size(), o_rValue );
       }
     };
     const ZEK::IResult Result =
@@ -113,10 +169,11 @@ ZEK::IResult VRecordingSkeletons::MakeFastItems( const VStateMaker& i_rMaker, st
   return {};
 }
 
-void VRecordingSkeletons::AddItems( ZEK::IFlowState& io_rState ) const
+void VRecordingSkeletons::AddItems( const ZEK::VFlowTimeKey& i_rSlowKey, ZEK::IFlowState& io_rState ) const
 {
   for ( const VPlayed& rPlayed : m_Played )
   {
+    io_rState.AddItemAt( rPlayed.Poses, i_rSlowKey );
     io_rState.AddItem( rPlayed.Item );
   }
 }

@@ -21,8 +21,10 @@ public:
   VRecordingSkeletons( const VRecording& i_rRecording, std::uint32_t i_FirstId );
 
   ZEK::IResult MakeSlowItems( const VStateMaker& i_rMaker, std::vector< ZEK::VFlowItemRef >& io_rSlow );
+  /// The structures with some poses, z up as views of the structure alone take them, made from data of that axis.
+  ZEK::IResult MakePoses( const VStateMaker& i_rMaker, EUpAxis i_Up );
   ZEK::IResult MakeFastItems( const VStateMaker& i_rMaker, std::int64_t i_Index );
-  void AddItems( ZEK::IFlowState& io_rState ) const;
+  void AddItems( const ZEK::VFlowTimeKey& i_rSlowKey, ZEK::IFlowState& io_rState ) const;
 
 private:
   struct VPlayed
@@ -31,7 +33,7 @@ private:
     std::unique_ptr< ComputeSubject::VComputeSubjectFK > pSubject; ///< null where it cannot be posed
     std::uint32_t Id = 0;
     std::int64_t Of = -1; ///< the frame that the item was made of
-    ZEK::VFlowItemRef Item;
+    ZEK::VFlowItemRef Item, Poses;
   };
   std::vector< VPlayed > m_Played;
 };

@@ -9,19 +9,6 @@ namespace HostSources
 {
 namespace
 {
-/// Colours far apart on the wheel for neighbouring indices, none of them dark.
-std::uint32_t MarkerColour( std::size_t i_Index )
-{
-  constexpr double GoldenTurn = 0.6180339887498949;
-  const double Hue = std::fmod( static_cast< double >( i_Index ) * GoldenTurn, 1.0 ) * 6;
-  const auto Channel = [&]( double i_Shift )
-  {
-    const double Distance = std::abs( std::fmod( Hue + i_Shift, 6.0 ) - 3 ) - 1;
-    return static_cast< std::uint32_t >( std::lround( 255 * ( 0.3 + 0.7 * std::clamp( Distance, 0.0, 1.0 ) ) ) );
-  };
-  return 0xFF000000u | Channel( 2 ) << 16 | Channel( 4 ) << 8 | Channel( 0 );
-}
-
 struct VSplitName
 {
   std::string Subject, Marker;
@@ -37,6 +24,18 @@ VSplitName Split( const std::string& i_rLabel, const std::string& i_rDefault )
   return { i_rLabel.substr( 0, Colon ), i_rLabel.substr( Colon + 1 ) };
 }
 } // namespace
+
+std::uint32_t MarkerColour( std::size_t i_Index )
+{
+  constexpr double GoldenTurn = 0.6180339887498949;
+  const double Hue = std::fmod( static_cast< double >( i_Index ) * GoldenTurn, 1.0 ) * 6;
+  const auto Channel = [&]( double i_Shift )
+  {
+    const double Distance = std::abs( std::fmod( Hue + i_Shift, 6.0 ) - 3 ) - 1;
+    return static_cast< std::uint32_t >( std::lround( 255 * ( 0.3 + 0.7 * std::clamp( Distance, 0.0, 1.0 ) ) ) );
+  };
+  return 0xFF000000u | Channel( 2 ) << 16 | Channel( 4 ) << 8 | Channel( 0 );
+}
 
 VRecordingSubjects SubjectsOf( const VRecording& i_rRecording )
 {

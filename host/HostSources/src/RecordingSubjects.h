@@ -26,6 +26,9 @@ struct VRecordingSubjects
   std::vector< VPlace > Places;                        ///< one a point
 };
 
+/// 0xAABBGGRR; colours of neighbours lie far apart.
+std::uint32_t MarkerColour( std::size_t i_Index );
+
 /// "Subject:Marker" belongs to "Subject"; a name without a colon to the file's name without its suffix.
 VRecordingSubjects SubjectsOf( const VRecording& i_rRecording );
 

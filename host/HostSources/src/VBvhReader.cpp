@@ -4,9 +4,6 @@
 #include "BvhWords.h"
 #include "ReaderSupport.h"
 #include "TrcText.h"
-#include "UpAxis.h"
-
-#include <ComputeSubjectFK/VComputeSubjectFK.h>
 
 #include <algorithm>
 #include <cmath>
@@ -20,10 +17,7 @@ namespace
 constexpr std::string_view Mark = "HIERARCHY";
 constexpr std::string_view ByteOrderMark = "\xEF\xBB\xBF";
 constexpr double Centimetre = 10; // mm
-constexpr double Farthest = 1e9;  // mm
 constexpr std::size_t MostJoints = 4096;
-/// Memory for the poses: times the size of the file, and what any file may have beside that.
-constexpr double Mebibyte = 1024.0 * 1024.0, MostPerByte = 16, LeastMost = 64 * Mebibyte;
 
 std::string_view AsText( std::span< const std::byte > i_Bytes )
 {
@@ -80,11 +74,9 @@ private:
   ZEK::IResult ReadChannels();
   ZEK::IResult ReadNumberOf( const char* i_pWhat, double& o_rValue );
   ZEK::IResult ReadMotionHeader();
-  bool HasRoom( std::size_t i_Rows );
   ZEK::IResult ReadRows();
   ZEK::IResult TakeRow( std::vector< double >& io_rRow );
   ZEK::IResult Finish();
-  void FindBounds();
 
   VWords m_Words;
   std::size_t m_Size;
@@ -303,21 +295,6 @@ ZEK::IResult VReader::TakeRow( std::vector< double >& io_rRow )
   return {};
 }
 
-/// Files of short numbers, or of joints that say little of themselves, take far more room in memory than on disk.
-bool VReader::HasRoom( std::size_t i_Rows )
-{
-  const double Needed =
-      static_cast< double >( i_Rows ) * static_cast< double >( m_Skeleton.StateSize ) * sizeof( double );
-  if ( Needed <= MostPerByte * static_cast< double >( m_Size ) + LeastMost )
-  {
-    return true;
-  }
-  m_rMessage = std::string( "expected poses in proportion to the file, found some that need " )
-                   .append( std::to_string( static_cast< std::uint64_t >( Needed / Mebibyte ) ) )
-                   .append( " MiB of memory" );
-  return false;
-}
-
 ZEK::IResult VReader::ReadRows()
 {
   const auto Channels = static_cast< std::size_t >( m_Skeleton.ChannelCount );
@@ -333,7 +310,7 @@ ZEK::IResult VReader::ReadRows()
                                     } );
     m_Skeleton.StateSize += rJoint.Channels.empty() ? 0 : bFree ? 6 : 3;
   }
-  if ( !HasRoom( Rows ) )
+  if ( !HasRoomForPoses( Rows, m_Skeleton.StateSize, m_Size, m_rMessage ) )
   {
     return ZEK::IResult::NotSupported;
   }
@@ -373,35 +350,6 @@ ZEK::IResult VReader::ReadRows()
   return {};
 }
 
-/// Where the joints go, for the floor; of very long recordings every so many frames.
-void VReader::FindBounds()
-{
-  constexpr std::size_t MostPoses = 4'000'000;
-  std::string Message;
-  std::unique_ptr< ComputeSubject::VComputeSubjectFK > pSubject;
-  if ( ComputeSubject::VComputeSubjectFK::Build( m_Skeleton.Subject, pSubject, Message ).IsError() )
-  {
-    m_rRecording.Notes.push_back( std::move( Message ) );
-    return;
-  }
-  const auto Frames = static_cast< std::size_t >( m_rRecording.FrameCount );
-  const std::size_t Stride = 1 + Frames * m_Joints.size() / MostPoses;
-  for ( std::size_t Frame = 0; Frame < Frames; Frame += Stride )
-  {
-    if ( pSubject->LoadState( m_Skeleton.State( static_cast< std::int64_t >( Frame ) ) ).IsError() )
-    {
-      return;
-    }
-    for ( const ComputeSubject::VRigidTransform& rPose : pSubject->WorldTransforms() )
-    {
-      const double* T = rPose.m_Translation;
-      const VRecordingPoint Point{ static_cast< float >( T[0] ), static_cast< float >( T[1] ),
-                                   static_cast< float >( T[2] ), 0 };
-      AddToBounds( m_rRecording.Bounds, { &Point, 1 } );
-    }
-  }
-}
-
 ZEK::IResult VReader::Finish()
 {
   VRecording& rR = m_rRecording;
@@ -419,9 +367,10 @@ ZEK::IResult VReader::Finish()
   TakeRate( rR.RateHz, rR );
   m_Skeleton.Subject = SubjectOf( m_Joints );
   m_Skeleton.Subject.Id = 1;
+  m_Skeleton.JointCount = m_Joints.size();
   m_Skeleton.Subject.Name = std::filesystem::path( rR.Name ).stem().string();
   m_Skeleton.Subject.Name = m_Skeleton.Subject.Name.empty() ? m_Joints[0].Name : m_Skeleton.Subject.Name;
-  FindBounds();
+  AddToBounds( m_Skeleton, rR );
   const std::int64_t Missing = m_Promised - rR.FrameCount;
   rR.Skeletons.push_back( std::move( m_Skeleton ) );
   if ( Missing > 0 )

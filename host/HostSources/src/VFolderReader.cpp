@@ -26,7 +26,7 @@ class VJoin
 {
 public:
   VJoin( const std::filesystem::path& i_rPath, VRecording& io_rRecording, std::string& o_rMessage,
-         const VProgress& i_rProgress, const VFolderOptions& i_rOptions )
+         const VProgress& i_rProgress, const VReadOptions& i_rOptions )
     : m_rPath( i_rPath )
     , m_rRecording( io_rRecording )
     , m_rMessage( o_rMessage )
@@ -54,7 +54,7 @@ private:
   VRecording& m_rRecording;
   std::string& m_rMessage;
   const VProgress& m_rProgress;
-  const VFolderOptions& m_rOptions;
+  const VReadOptions& m_rOptions;
   VFolderFiles m_Files;
   VDetections m_Detections;
   VCameraCalibrations m_Calibrations;
@@ -397,7 +397,7 @@ ZEK::IResult VJoin::Run()
 } // namespace
 
 ZEK::IResult ReadFolder( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
-                         const VProgress& i_rProgress, const VFolderOptions& i_rOptions )
+                         const VProgress& i_rProgress, const VReadOptions& i_rOptions )
 {
   return ReadGuarded( ERecordingFormat::Folder, i_rPath.string(), o_rRecording, o_rMessage,
                       [&]

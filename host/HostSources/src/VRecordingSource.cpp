@@ -126,6 +126,7 @@ ZEK::IResult VRecordingSource::VState::MakeAxisItems( const VStateMaker& i_rMake
       *pFloor = FloorOf( m_rRecording.Bounds, i_Up );
     }
   }
+  Result = Result.IsOk() ? m_Skeletons.MakePoses( i_rMaker, i_Up ) : Result;
   if ( Result.IsOk() )
   {
     m_Up = i_Up;
@@ -277,7 +278,10 @@ ZEK::IResult VRecordingSource::VState::MakeFastItems( const VStateMaker& i_rMake
 {
   ZEK::IResult Result;
   m_Videos.Want( i_Index ); // decoders work while the rest is made
-  if ( m_PointsOf < 0 || !SamePoints( m_PointsOf, i_Index ) )
+  // Of solved poses alone no point was measured, which is not the same as none being there.
+  const bool bPoints =
+      m_rRecording.PointCount() > 0 || !m_rRecording.UnlabelledBegin.empty() || m_rRecording.Skeletons.empty();
+  if ( bPoints && ( m_PointsOf < 0 || !SamePoints( m_PointsOf, i_Index ) ) )
   {
     Result = MakePoints( i_rMaker, i_Index );
   }
@@ -320,12 +324,15 @@ ZEK::IResult VRecordingSource::VState::AddSamples( const VStateMaker& i_rMaker, 
 
 void VRecordingSource::VState::AddItems( const ZEK::VFlowTimeKey& i_rSlowKey, ZEK::IFlowState& io_rState ) const
 {
-  io_rState.AddItem( m_Points );
+  if ( m_Points )
+  {
+    io_rState.AddItem( m_Points );
+  }
   if ( m_Labels )
   {
     io_rState.AddItem( m_Labels );
   }
-  m_Skeletons.AddItems( io_rState );
+  m_Skeletons.AddItems( i_rSlowKey, io_rState );
   m_Cameras.AddItems( io_rState );
   m_Videos.AddItems( io_rState );
   for ( const ZEK::VFlowItemRef& rItem : m_Slow )

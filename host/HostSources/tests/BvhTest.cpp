@@ -1,10 +1,7 @@
 #include "ReadHelpers.h"
+#include "RecordingPlayer.h"
 
-#include <CoreMoxelTypes/FlowTypes.h>
-#include <CoreMoxelTypes/Subject.h>
-#include <HostFlow/VFlowFramework.h>
 #include <HostSources/VBvhReader.h>
-#include <HostSources/VRecordingSource.h>
 
 #include <cmath>
 #include <fstream>
@@ -22,59 +19,6 @@ VOutcome Read( std::string_view i_Text )
   Outcome.Result = ReadBvh( Bytes( i_Text ), "made.bvh", Outcome.Recording, Outcome.Message );
   return Outcome;
 }
-
-/// Plays a recording and finds items by kind.
-class VPlayer
-{
-public:
-  explicit VPlayer( VRecording i_Recording )
-    : m_Source( std::make_shared< const VRecording >( std::move( i_Recording ) ) )
-  {
-  }
-  void Show( std::int64_t i_Index ) { EXPECT_EQ( m_Source.MakeState( i_Index, m_Maker, m_State ), Ok ); }
-  template < typename TFlow >
-  ZEK::VFlowItemRef Item() const
-  {
-    ZEK::VFlowItemRef Found;
-    m_State->FindItem( Found, ZEK::FlowTag< TFlow >, ZEK::EFlowTimeMatch::Overlap );
-    return Found;
-  }
-  template < typename TFlow >
-  const typename ZEK::FlowValueType< TFlow >::type& Value() const
-  {
-    static const typename ZEK::FlowValueType< TFlow >::type None{};
-    const auto* pValue = ZEK::FlowPayload< typename ZEK::FlowValueType< TFlow >::type >( Item< TFlow >().Get() );
-    EXPECT_NE( pValue, nullptr );
-    return pValue ? *pValue : None;
-  }
-  /// The origin of a joint's segment, mm.
-  D3 Joint( const std::string& i_rName ) const
-  {
-    const auto& rSegments = Value< FlowSubject >().Segments;
-    const auto& rPoses = Value< FlowSubjectDynamicParameters >().Segments;
-    for ( std::size_t Index = 0; Index < rSegments.size() && Index < rPoses.size(); ++Index )
-    {
-      if ( rSegments[Index].Name == i_rName )
-      {
-        return { rPoses[Index].T[0], rPoses[Index].T[1], rPoses[Index].T[2] };
-      }
-    }
-    ADD_FAILURE() << i_rName;
-    return {};
-  }
-  void ExpectJoint( const std::string& i_rName, double i_X, double i_Y, double i_Z ) const
-  {
-    const D3 Place = Joint( i_rName );
-    EXPECT_NEAR( Place.x, 10 * i_X, 1e-3 ) << i_rName;
-    EXPECT_NEAR( Place.y, 10 * i_Y, 1e-3 ) << i_rName;
-    EXPECT_NEAR( Place.z, 10 * i_Z, 1e-3 ) << i_rName;
-  }
-
-private:
-  const VStateMaker m_Maker{ HostFlow::MakeStateFactory(), HostFlow::MakeItemStore(), 2 };
-  VRecordingSource m_Source;
-  ZEK::VFlowStateRef m_State;
-};
 
 /// A hip that moves, a bone without channels along y, and one that turns about z at its end; three frames.
 const std::string Small = "HIERARCHY\n"
@@ -112,7 +56,7 @@ TEST( Bvh, JointsStandWhereTheHierarchyAndTheRowsPutThem )
   EXPECT_EQ( rSubject.Segments[2].Joint, EJointType::Ball );
   EXPECT_EQ( rSubject.Segments[0].BoneLength, 100 );
   EXPECT_EQ( rSubject.Segments[2].BoneLength, 50 ) << "to the end site";
-  VPlayer Player( Outcome.Recording );
+  VRecordingPlayer Player( Outcome.Recording );
   Player.Show( 1 );
   // Only y of the hip moves; the quarter turn lays y along -x; the last bone then points along -x as well.
   Player.ExpectJoint( "Hip", 1, 90, 3 );
@@ -144,7 +88,7 @@ TEST( Bvh, RealFilesAgreeWithTheirFigures )
   EXPECT_EQ( Louise.Skeletons[0].Subject.Segments.size(), 18u );
   EXPECT_EQ( Louise.Skeletons[0].EndSiteCount, 5u );
   EXPECT_EQ( Louise.Skeletons[0].ChannelCount, 57u );
-  VPlayer Player( Louise );
+  VRecordingPlayer Player( Louise );
   Player.Show( 0 );
   Player.ExpectJoint( "Hips", 12.6297, 91.9799, -4.7173 );
   Player.ExpectJoint( "Head", 8.0463, 155.9385, -3.1395 );
@@ -160,7 +104,7 @@ TEST( Bvh, RealFilesAgreeWithTheirFigures )
   EXPECT_EQ( Milad.Skeletons.at( 0 ).Subject.Segments.size(), 59u );
   EXPECT_EQ( Milad.Skeletons[0].EndSiteCount, 13u );
   EXPECT_EQ( Milad.Skeletons[0].ChannelCount, 354u );
-  VPlayer Suit( Milad );
+  VRecordingPlayer Suit( Milad );
   Suit.Show( 0 );
   Suit.ExpectJoint( "Hips", 34.6316, 94.0860, -42.0484 );
   Suit.ExpectJoint( "Head", 33.9384, 156.9412, -33.1584 );
@@ -169,7 +113,9 @@ TEST( Bvh, RealFilesAgreeWithTheirFigures )
   Suit.Show( 421 );
   Suit.ExpectJoint( "LeftHand", 36.9983, 97.5083, -15.7936 );
   const VRecordingInfo Info = DescribeRecording( Milad );
-  EXPECT_THAT( Info.Text(), testing::HasSubstr( "59 joints, 13 end sites, 354 channels, 354 degrees of freedom" ) );
+  EXPECT_THAT( Info.Text(),
+               testing::HasSubstr( "59 joints, 59 bones, 13 end sites, 354 channels, 354 degrees of freedom, "
+                                   "0 markers, 422 poses" ) );
   EXPECT_THAT( Info.Json(), testing::HasSubstr( "\"format\": \"BVH\"" ) );
 }
 

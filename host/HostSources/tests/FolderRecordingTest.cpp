@@ -44,7 +44,7 @@ class FolderRecording : public testing::Test
 {
 protected:
   std::shared_ptr< VRecording > Read( const std::filesystem::path& i_rPath, ZEK::IResult i_Expected = ZEK::IResult::Ok,
-                                      const VFolderOptions& i_rOptions = {} )
+                                      const VReadOptions& i_rOptions = {} )
   {
     auto pRecording = std::make_shared< VRecording >();
     EXPECT_EQ( ReadFolder( i_rPath, *pRecording, m_Message, {}, i_rOptions ), i_Expected ) << m_Message;
@@ -206,7 +206,7 @@ TEST_F( FolderRecording, ThePersonIsFoundBesideTheBystander )
     }
   }
   EXPECT_EQ( Known, 21u );
-  const auto pKept = Read( TestSupport::RecordingsDir() / "multicam-person" / "static", ZEK::IResult::Ok, { "xyz" } );
+  const auto pKept = Read( TestSupport::RecordingsDir() / "multicam-person" / "static", ZEK::IResult::Ok, { "xyz", {} } );
   EXPECT_THAT( m_Notes, testing::HasSubstr( "as was asked" ) );
   ExpectPoint( *pKept, 0, "RHip", -80.589, 869.695, 76.164, 1e-2 );
   const VRecordingInfo Info = DescribeRecording( *pR );
@@ -350,8 +350,8 @@ TEST_F( FolderRecording, WhatCannotBeReadIsNamed )
     EXPECT_THAT( m_Message, testing::StartsWith( Folder.string() ) );
     EXPECT_THAT( m_Message, testing::HasSubstr( rCase.pMessage ) );
   }
-  Read( m_Folder.Path(), ZEK::IResult::InvalidArgument, { "xxy" } );
-  Read( m_Folder.Path(), ZEK::IResult::InvalidArgument, { "yxz" } );
+  Read( m_Folder.Path(), ZEK::IResult::InvalidArgument, { "xxy", {} } );
+  Read( m_Folder.Path(), ZEK::IResult::InvalidArgument, { "yxz", {} } );
 }
 
 } // namespace HostSources

@@ -103,9 +103,13 @@ void AddCommon( CLI::App& io_rApp, VCommonOptions& o_rCommon )
       ->check( CLI::Range( 25.0, 1000.0 ) )
       ->capture_default_str();
   io_rApp
-      .add_option( "--world-axes", o_rCommon.Folder.WorldAxes,
+      .add_option( "--world-axes", o_rCommon.Reading.WorldAxes,
                    "How the axes of a folder's 3D points become those of its cameras, such as zxy or x-zy" )
       ->type_name( "AXES" );
+  io_rApp
+      .add_option( "--model", o_rCommon.Reading.Model,
+                   "The model (.osim) whose joints a motion file (.mot) moves, in place of the one beside it" )
+      ->type_name( "FILE" );
   AddOrdered( io_rApp, "--up", "The up axis, in place of the one found in the recording", "y|z",
               [&o_rCommon]( const std::string& i_rText ) -> std::string
               {
@@ -177,7 +181,7 @@ void AddRender( CLI::App& io_rApp, VRenderOptions& o_rRender )
   io_rApp.add_option( "--window", o_rRender.Window, "The kind of window, such as 3d or cameras" )
       ->capture_default_str();
   io_rApp
-      .add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC, BVH, a folder of cameras)" )
+      .add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC, BVH, MOT, a folder of cameras)" )
       ->expected( 1, -1 )
       ->capture_default_str()
       ->type_name( "simulated|FILE" );
@@ -240,8 +244,8 @@ std::string CheckTogether( const VCommandLine& i_rLine )
 VParseResult ParseCommandLine( int i_Count, const char* const* i_ppArguments, VCommandLine& o_rLine )
 {
   CLI::App App(
-      "harrow shows motion-capture data: a simulated capture, or recordings (C3D, TRC, BVH, folders of what cameras "
-      "saw).\n"
+      "harrow shows motion-capture data: a simulated capture, or recordings (C3D, TRC, BVH, MOT, folders of what "
+      "cameras saw).\n"
       "Without a subcommand it opens a window with a 3D view of the simulated capture.",
       "harrow" );
   App.set_version_flag( "--version", "harrow 1.0.0" );

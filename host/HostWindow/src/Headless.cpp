@@ -46,7 +46,7 @@ VRunResult OpenSource( VSession& io_rSession, const std::string& i_rSource, doub
     const auto pRecording = std::make_shared< HostSources::VRecording >();
     std::string Message;
     const ZEK::IResult Read =
-        HostSources::ReadRecording( i_rSource, *pRecording, Message, {}, io_rSession.Options().Folder );
+        HostSources::ReadRecording( i_rSource, *pRecording, Message, {}, io_rSession.Options().Reading );
     if ( Read.IsError() )
     {
       return Fail( EExitFile, Message.empty() ? i_rSource + ": " + Read.Text() : Message );
@@ -270,7 +270,7 @@ VRunResult RunRender( const VCommonOptions& i_rCommon, const VRenderOptions& i_r
 }
 
 VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson,
-                    const HostSources::VFolderOptions& i_rFolder )
+                    const HostSources::VReadOptions& i_rReading )
 {
   VRunResult Result;
   std::vector< std::string > Texts;
@@ -278,7 +278,7 @@ VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson,
   {
     HostSources::VRecording Recording;
     std::string Message;
-    const ZEK::IResult Read = HostSources::ReadRecording( rFile, Recording, Message, {}, i_rFolder );
+    const ZEK::IResult Read = HostSources::ReadRecording( rFile, Recording, Message, {}, i_rReading );
     if ( TellOfReading( rFile, Read, Message, Result ) )
     {
       const HostSources::VRecordingInfo Info = HostSources::DescribeRecording( Recording );

@@ -41,7 +41,7 @@ void VMainWindow::MakeFileMenu()
   pMenu->setToolTipsVisible( true );
   QAction* pOpen = pMenu->addAction( tr( "&Open…" ), this, &VMainWindow::AskForFiles );
   pOpen->setShortcut( QKeySequence::Open );
-  pOpen->setToolTip( tr( "Open recordings in C3D, TRC and BVH files" ) );
+  pOpen->setToolTip( tr( "Open recordings in C3D, TRC, BVH and MOT files" ) );
   QAction* pFolder = pMenu->addAction( tr( "Open &Folder…" ), this, &VMainWindow::AskForFolder );
   pFolder->setShortcut( QKeySequence( Qt::CTRL | Qt::SHIFT | Qt::Key_O ) );
   pFolder->setToolTip( tr( "Open a folder of what cameras saw" ) );
@@ -298,7 +298,7 @@ void VMainWindow::ShowAbout()
 {
   QMessageBox::about( this, tr( "About Harrow" ),
                       tr( "<b>Harrow %1</b><p>Shows motion-capture data: a simulated capture, and recordings in C3D, "
-                          "TRC and BVH files and folders of what cameras saw.</p><p>Qt %2</p>" )
+                          "TRC, BVH and MOT files and folders of what cameras saw.</p><p>Qt %2</p>" )
                           .arg( QApplication::applicationVersion(), qVersion() ) );
 }
 

@@ -20,6 +20,8 @@ namespace HostWindow
 {
 namespace
 {
+const QStringList Suffixes{ "c3d", "trc", "bvh", "mot", "sto" };
+
 QStringList DroppedFiles( const QMimeData* i_pData )
 {
   QStringList Paths;
@@ -27,7 +29,7 @@ QStringList DroppedFiles( const QMimeData* i_pData )
   {
     const QString Path = rUrl.toLocalFile();
     const QString Suffix = QFileInfo( Path ).suffix().toLower();
-    if ( Suffix == "c3d" || Suffix == "trc" || Suffix == "bvh" || QFileInfo( Path ).isDir() )
+    if ( Suffixes.contains( Suffix ) || QFileInfo( Path ).isDir() )
     {
       Paths << Path;
     }
@@ -40,7 +42,7 @@ VMainWindow::VMainWindow( VSession& i_rSession, QWidget* i_pParent )
   : QMainWindow( i_pParent )
   , m_rSession( i_rSession )
   , m_Preferences( i_rSession.Host().Store() )
-  , m_Loader( i_rSession.Host().Postal(), i_rSession.Options().Folder )
+  , m_Loader( i_rSession.Host().Postal(), i_rSession.Options().Reading )
 {
   setAcceptDrops( true );
   setDockNestingEnabled( true );
@@ -232,8 +234,13 @@ void VMainWindow::AskForFiles()
 {
   const auto Recent = m_rSession.Host().Preferences().RecentFiles();
   const QString Folder = Recent.isEmpty() ? QString() : QFileInfo( Recent.front() ).absolutePath();
+  QStringList Patterns;
+  for ( const QString& rSuffix : Suffixes )
+  {
+    Patterns << "*." + rSuffix << "*." + rSuffix.toUpper();
+  }
   OpenFiles( QFileDialog::getOpenFileNames( this, tr( "Open Recordings" ), Folder,
-                                            tr( "Recordings (*.c3d *.C3D *.trc *.TRC *.bvh *.BVH);;All files (*)" ) ) );
+                                            tr( "Recordings (%1);;All files (*)" ).arg( Patterns.join( ' ' ) ) ) );
 }
 
 void VMainWindow::AskForFolder()

@@ -18,10 +18,10 @@ struct VRecordingLoader::VJob
 };
 
 VRecordingLoader::VRecordingLoader( std::shared_ptr< ZEK::IPostalService > i_pPostal,
-                                    HostSources::VFolderOptions i_Folder, QObject* i_pParent )
+                                    HostSources::VReadOptions i_Reading, QObject* i_pParent )
   : QObject( i_pParent )
   , m_pPostal( std::move( i_pPostal ) )
-  , m_Folder( std::move( i_Folder ) )
+  , m_Reading( std::move( i_Reading ) )
 {
 }
 
@@ -51,7 +51,7 @@ void VRecordingLoader::Load( const QString& i_rPath )
   m_pJob->Path = i_rPath;
   m_pJob->pLoader = this;
   m_Thread = std::thread(
-      [pPostal = m_pPostal, pJob = m_pJob, Folder = m_Folder]
+      [pPostal = m_pPostal, pJob = m_pJob, Reading = m_Reading]
       {
         int LastPercent = -1;
         const auto OnProgress = [&]( double i_Fraction )
@@ -72,7 +72,7 @@ void VRecordingLoader::Load( const QString& i_rPath )
           return !pJob->bCancel;
         };
         pJob->Result = HostSources::ReadRecording( pJob->Path.toStdString(), *pJob->pRecording, pJob->Message,
-                                                   OnProgress, Folder );
+                                                   OnProgress, Reading );
         pPostal->Post(
             [pJob]
             {

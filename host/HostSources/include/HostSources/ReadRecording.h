@@ -1,6 +1,6 @@
 #pragma once
 
-#include <HostSources/VFolderReader.h>
+#include <HostSources/VReadOptions.h>
 #include <HostSources/VProgress.h>
 #include <HostSources/VRecording.h>
 
@@ -22,6 +22,6 @@ namespace HostSources
 ///
 /// Thread: any; the callback runs on the caller's thread.
 ZEK::IResult ReadRecording( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
-                            const VProgress& i_rProgress = {}, const VFolderOptions& i_rFolder = {} );
+                            const VProgress& i_rProgress = {}, const VReadOptions& i_rOptions = {} );
 
 } // namespace HostSources

@@ -35,7 +35,16 @@ struct VRecordingInfo
   {
     std::string Name;
     std::vector< std::string > Segments;
+    std::vector< std::string > Markers; ///< of the model
+    std::uint64_t JointCount = 0;       ///< segments behind them are nothing but bones
+    std::uint64_t BoneCount = 0, PoseCount = 0;
     std::uint64_t EndSiteCount = 0, ChannelCount = 0, StateSize = 0;
+  };
+  /// Whom labelled points belong to.
+  struct VSubject
+  {
+    std::string Name;
+    std::vector< std::string > Markers;
   };
   struct VVideo
   {
@@ -69,6 +78,8 @@ struct VRecordingInfo
   std::vector< VAnalogChannel > AnalogChannels;
   std::vector< VPlate > ForcePlates;
   std::vector< VCamera > Cameras;
+  std::vector< VSubject > Subjects;
+  std::uint64_t NobodysPointCount = 0; ///< columns that belong to no subject
   std::vector< VSkeleton > Skeletons;
   std::vector< VRecordingEvent > Events;
   EUpAxis UpAxis = EUpAxis::Z;

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <HostSources/VProgress.h>
+#include <HostSources/VReadOptions.h>
 #include <HostSources/VRecording.h>
 
 #include <ZEK/Result.h>
@@ -10,14 +11,6 @@
 
 namespace HostSources
 {
-
-struct VFolderOptions
-{
-  /// How the axes of the 3D points become those of the cameras' world: three letters, each with a sign or without, such
-  /// as "zxy" for world (x, y, z) = points' (z, x, y), or "x-zy". Empty: the turn by quarters of which the projected
-  /// points lie nearest to the detections.
-  std::string WorldAxes;
-};
 
 /// Reads a folder that holds what cameras saw, and joins it with its 3D points and its calibration.
 ///
@@ -32,6 +25,6 @@ struct VFolderOptions
 /// Of several persons in the image, the one nearest to the projected points is taken for the subject.
 /// Failures are those of `ReadRecording`; a folder without anything to read is `FileIOFailure`.
 ZEK::IResult ReadFolder( const std::filesystem::path& i_rPath, VRecording& o_rRecording, std::string& o_rMessage,
-                         const VProgress& i_rProgress = {}, const VFolderOptions& i_rOptions = {} );
+                         const VProgress& i_rProgress = {}, const VReadOptions& i_rOptions = {} );
 
 } // namespace HostSources

@@ -22,7 +22,8 @@ enum class ERecordingFormat : std::uint32_t
   C3d,
   Trc,
   Folder,
-  Bvh
+  Bvh,
+  Motion
 };
 
 /// One point in one frame, in millimetres; all of it NaN where the point is missing.

@@ -3,7 +3,7 @@
 #include <HostWindow/ViewAction.h>
 
 #include <HostSources/IFrameSource.h>
-#include <HostSources/VFolderReader.h>
+#include <HostSources/VReadOptions.h>
 #include <HostSources/VSimulatedCapture.h>
 
 #include <cstdint>
@@ -46,7 +46,7 @@ struct VCommonOptions
   int LogLevel = 3;
   std::optional< HostSources::EUpAxis > Up;
   HostSources::VSimulatedCaptureOptions Simulated;
-  HostSources::VFolderOptions Folder; ///< how recordings of cameras are read
+  HostSources::VReadOptions Reading; ///< how recordings are read
 };
 
 struct VRenderOptions

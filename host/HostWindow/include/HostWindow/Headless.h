@@ -20,7 +20,7 @@ VRunResult RunRender( const VCommonOptions& i_rCommon, const VRenderOptions& i_r
 
 /// Prints what each recording holds to stdout. Needs no application object. All files are tried.
 VRunResult RunInfo( const std::vector< std::string >& i_rFiles, bool i_bJson,
-                    const HostSources::VFolderOptions& i_rFolder );
+                    const HostSources::VReadOptions& i_rReading );
 
 /// Prints the cameras of each calibration, with the models that views draw them with, to stdout as JSON. Needs no
 /// application object. All files are tried.

@@ -1,6 +1,6 @@
 #pragma once
 
-#include <HostSources/VFolderReader.h>
+#include <HostSources/VReadOptions.h>
 #include <HostSources/VRecording.h>
 #include <ZEK/Callback.h>
 #include <ZEK/Result.h>
@@ -21,8 +21,8 @@ class VRecordingLoader : public QObject
   Q_OBJECT
 
 public:
-  explicit VRecordingLoader( std::shared_ptr< ZEK::IPostalService > i_pPostal,
-                             HostSources::VFolderOptions i_Folder = {}, QObject* i_pParent = nullptr );
+  explicit VRecordingLoader( std::shared_ptr< ZEK::IPostalService > i_pPostal, HostSources::VReadOptions i_Reading = {},
+                             QObject* i_pParent = nullptr );
   ~VRecordingLoader() override;
 
   /// Begins to read; what is still being read is given up without a word.
@@ -44,7 +44,7 @@ private:
   void Abandon();
 
   std::shared_ptr< ZEK::IPostalService > m_pPostal;
-  HostSources::VFolderOptions m_Folder;
+  HostSources::VReadOptions m_Reading;
   std::shared_ptr< VJob > m_pJob;
   std::thread m_Thread;
 };
