@@ -1,12 +1,12 @@
 #!/usr/bin/env bash
 # Builds the fuzzers and runs each for a while, from the kept corpus on; the first fault ends the script with an error.
 #   --seconds N      for each fuzzer, 60 without it
-#   --only NAME      one of c3d trc bvh cameras settings schema value version
+#   --only NAME      one of c3d trc bvh motion cameras settings schema value version
 # What a fuzzer finds new stays in build/fuzz/corpus, what breaks it in build/fuzz/found.
 set -eu
 cd "$(dirname "$0")/.."
 seconds=60
-fuzzers="c3d trc bvh cameras settings schema value version"
+fuzzers="c3d trc bvh motion cameras settings schema value version"
 while [ $# -gt 0 ]; do
   case $1 in
     --seconds) seconds=${2:?fuzz.sh: --seconds takes a number}; shift 2 ;;

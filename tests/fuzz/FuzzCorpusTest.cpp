@@ -11,6 +11,7 @@
 extern "C" int FuzzC3dOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzTrcOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzBvhOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
+extern "C" int FuzzMotionOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzCamerasOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzSettingsOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
 extern "C" int FuzzSchemaOneInput( const std::uint8_t* i_pData, std::size_t i_Size );
@@ -58,6 +59,11 @@ TEST( FuzzCorpus, Trc )
 TEST( FuzzCorpus, Bvh )
 {
   EXPECT_GE( Replay( "bvh", FuzzBvhOneInput ), 8u );
+}
+
+TEST( FuzzCorpus, Motion )
+{
+  EXPECT_GE( Replay( "motion", FuzzMotionOneInput ), 13u );
 }
 
 TEST( FuzzCorpus, Cameras )

@@ -17,7 +17,7 @@ struct VRecordingSubjects
 {
   struct VPlace
   {
-    std::uint32_t SubjectId = 0; ///< 0 for a point without a name
+    std::uint32_t SubjectId = 0; ///< 0 for a point of no subject
     std::uint32_t MarkerIndex = 0;
   };
 
@@ -26,10 +26,11 @@ struct VRecordingSubjects
   std::vector< VPlace > Places;                        ///< one a point
 };
 
-/// 0xAABBGGRR; colours of neighbours lie far apart.
-std::uint32_t MarkerColour( std::size_t i_Index );
+/// 0xAABBGGRR, of the marker of that place in its subject. A subject has its part of the colour wheel.
+std::uint32_t MarkerColour( std::size_t i_Subject, std::size_t i_Marker );
 
 /// "Subject:Marker" belongs to "Subject"; a name without a colon to the file's name without its suffix.
+/// Points that have no name, or a number that a program gave them, such as "*12" or "C_12", belong to no subject.
 VRecordingSubjects SubjectsOf( const VRecording& i_rRecording );
 
 } // namespace HostSources

@@ -142,6 +142,32 @@ TEST_F( RecordingSource, EveryValidPointIsAnEntryAndNamesTravelAsSubjects )
   }
 }
 
+TEST_F( RecordingSource, PointsThatAProgramNumberedBelongToNobody )
+{
+  const auto pR = Recording();
+  pR->Labels = { "*12", "Ann:C7", "Ann:*110", "C_12", "U*3" };
+  VRecordingSource Source( pR );
+  const auto Subjects = Items< FlowSubject >( State( Source, 0 ) );
+  ASSERT_EQ( Subjects.size(), 1u );
+  const auto& rSubject = *ZEK::FlowPayload< VSubject >( Subjects[0] );
+  EXPECT_EQ( rSubject.Name, "Ann" );
+  ASSERT_EQ( rSubject.Markers.size(), 1u );
+  EXPECT_EQ( rSubject.Markers[0].Name, "C7" );
+  ASSERT_EQ( Value< FlowReconstructionLabelSet >( State( Source, 0 ) ).Labels.size(), 1u );
+  EXPECT_EQ( Value< FlowReconstructionLabelSet >( State( Source, 0 ) ).Labels[0].Reconstruction, 1u );
+  EXPECT_EQ( Value< FlowReconstructionSet >( State( Source, 0 ) ).Items.size(), 5u ) << "they are there all the same";
+  EXPECT_THAT( DescribeRecording( *pR ).Text(), testing::HasSubstr( "  4 columns have no name" ) );
+  for ( const char* pName : { "Unlabeled 12", "unlabelled_3", "U_1", "C_", "RSHO12", "12", "CLAV" } )
+  {
+    pR->Labels = { "A", "B", "C", "D", pName };
+    VRecordingSource Named( pR );
+    const auto Found = Items< FlowSubject >( State( Named, 0 ) );
+    ASSERT_EQ( Found.size(), 1u );
+    const bool bAutomatic = std::string_view( pName ).starts_with( "U_" ) || std::string_view( pName ).size() > 8;
+    EXPECT_EQ( ZEK::FlowPayload< VSubject >( Found[0] )->Markers.size(), bAutomatic ? 4u : 5u ) << pName;
+  }
+}
+
 TEST_F( RecordingSource, WhatDidNotChangeIsTheSameObject )
 {
   VRecordingSource Source( Recording() );
