@@ -1,14 +1,18 @@
 #include <Flow2Graphics/VFlowRenderReconstructions.h>
 
+#include <Flow2Graphics/VFlowRenderSubjects.h>
+
 #include <CoreMoxelTypes/FlowTypes.h>
 #include <MoxelGraphics/VMoxelScene.h>
+#include <MoxelGraphics/VSceneOptions.h>
+
+#include <algorithm>
 
 namespace Flow2Graphics
 {
 namespace
 {
 using CoreMoxelTypes::VReconstruction;
-using CoreMoxelTypes::VReconstructionLabelSet;
 using CoreMoxelTypes::VReconstructionSet;
 using MoxelGraphics::VScenePoint;
 using ZEK::EFlowTimeMatch;
@@ -16,6 +20,8 @@ using ZEK::EFlowTimeMatch;
 /// Of points that were recorded without one, mm.
 constexpr float UsualRadius = 7.0F;
 constexpr unsigned FlagShift = 21;
+/// How much larger than a marker the sphere is that shows its residual.
+constexpr float CoverScale = 1.1F;
 
 bool Take( ZEK::VFlowItemRef& io_rHeld, const ZEK::IFlowState& i_rState, std::uint32_t i_Tag )
 {
@@ -50,78 +56,36 @@ void MarkMembers( std::vector< std::uint8_t >& o_rFlags, const MoxelGraphics::IR
 }
 } // namespace
 
-VFlowRenderReconstructions::VFlowRenderReconstructions( MoxelGraphics::VMoxelScene& i_rScene )
+VFlowRenderReconstructions::VFlowRenderReconstructions( MoxelGraphics::VMoxelScene& i_rScene,
+                                                        std::shared_ptr< VFlowRenderSubjects > i_pSubjects )
   : VRenderReconstructions( i_rScene )
+  , m_pSubjects( std::move( i_pSubjects ) )
 {
-  m_Subjects.AddCache< CoreMoxelTypes::FlowSubject >( Flow2TypesUtils::ETagRequirement::Required );
-  m_Subjects.AddCache< CoreMoxelTypes::FlowSubjectApplicationData >( Flow2TypesUtils::ETagRequirement::Optional );
 }
 
 void VFlowRenderReconstructions::Update( const ZEK::IFlowState& i_rState )
 {
-  if ( TakeItems( i_rState ) )
+  m_pSubjects->TakeState( i_rState );
+  const bool bSet = Take( m_Set, i_rState, ZEK::FlowTag< CoreMoxelTypes::FlowReconstructionSet > );
+  const std::uint64_t Taken = m_pSubjects->TakenGeneration();
+  if ( std::exchange( m_TakenGeneration, Taken ) != Taken || bSet )
   {
     Rebuild();
   }
   GiveIds();
 }
 
-bool VFlowRenderReconstructions::TakeItems( const ZEK::IFlowState& i_rState )
-{
-  const bool bSet = Take( m_Set, i_rState, ZEK::FlowTag< CoreMoxelTypes::FlowReconstructionSet > );
-  const bool bLabels = Take( m_Labels, i_rState, ZEK::FlowTag< CoreMoxelTypes::FlowReconstructionLabelSet > );
-  const bool bSubjects = TakeSubjects( i_rState );
-  return bSet || bLabels || bSubjects;
-}
-
-bool VFlowRenderReconstructions::TakeSubjects( const ZEK::IFlowState& i_rState )
-{
-  using namespace CoreMoxelTypes;
-  m_Subjects.Update( i_rState, ZEK::EFlowNameObject, EFlowTimeMatch::Overlap, i_rState.GetKey() );
-  if ( !m_Subjects.NamesChanged() && !m_Subjects.Changed( ZEK::FlowTag< FlowSubject > ) &&
-       !m_Subjects.Changed( ZEK::FlowTag< FlowSubjectApplicationData > ) )
-  {
-    return false;
-  }
-  m_Subjects.Items< FlowSubject >( m_SubjectItems );
-  m_Subjects.Items< FlowSubjectApplicationData >( m_DataItems );
-  m_LabelledPoints.Subjects.clear();
-  for ( std::size_t Slot = 0; Slot < m_SubjectItems.size(); ++Slot )
-  {
-    if ( const auto* const pSubject = m_Subjects.Values< FlowSubject >()[Slot] )
-    {
-      m_LabelledPoints.Subjects.push_back( { m_SubjectItems[Slot], m_DataItems[Slot], pSubject,
-                                             m_Subjects.Values< FlowSubjectApplicationData >()[Slot] } );
-    }
-  }
-  m_SubjectItems.clear();
-  m_DataItems.clear();
-  return true;
-}
-
 void VFlowRenderReconstructions::Rebuild()
 {
   m_UnlabelledPoints.Clear();
-  m_LabelledPoints.ClearPoints();
+  m_bLabelledStale = true;
+  const std::span< const std::uint8_t > Taken = m_pSubjects->TakenReconstructions();
   if ( const auto* const pSet = ZEK::FlowPayload< VReconstructionSet >( m_Set.Get() ) )
   {
     const std::vector< VReconstruction >& rItems = pSet->Items;
-    m_bLabelled.assign( rItems.size(), 0 );
-    if ( const auto* const pLabels = ZEK::FlowPayload< VReconstructionLabelSet >( m_Labels.Get() ) )
-    {
-      for ( const VReconstructionLabelSet::L& rLabel : pLabels->Labels )
-      {
-        if ( rLabel.Reconstruction >= rItems.size() || m_bLabelled[rLabel.Reconstruction] != 0 )
-        {
-          continue;
-        }
-        const VReconstruction& rItem = rItems[rLabel.Reconstruction];
-        m_bLabelled[rLabel.Reconstruction] = m_LabelledPoints.Add( rLabel, PointOf( rItem ), rItem.Residual ) ? 1 : 0;
-      }
-    }
     for ( std::size_t Index = 0; Index < rItems.size(); ++Index )
     {
-      if ( m_bLabelled[Index] == 0 )
+      if ( Taken[Index] == 0 )
       {
         m_UnlabelledPoints.Points.push_back( PointOf( rItems[Index] ) );
         m_UnlabelledPoints.Reconstruction.push_back( static_cast< std::uint32_t >( Index ) );
@@ -132,25 +96,54 @@ void VFlowRenderReconstructions::Rebuild()
   }
   SetReconstructions( m_UnlabelledPoints.Points );
   SetResiduals( m_UnlabelledPoints.Residuals );
-  SetLabelled( m_LabelledPoints.Points );
-  SetLabelledColours( m_LabelledPoints.Colours );
-  SetLabelledResiduals( m_LabelledPoints.Residuals );
+}
+
+bool VFlowRenderReconstructions::HasLabelled() const
+{
+  const std::span< const std::uint8_t > Taken = m_pSubjects->TakenReconstructions();
+  return std::find( Taken.begin(), Taken.end(), 1 ) != Taken.end();
+}
+
+/// Subjects draw their markers themselves; here they are only for their residuals, and cover the markers.
+void VFlowRenderReconstructions::FillLabelled( const MoxelGraphics::VSceneOptions& i_rOptions,
+                                               MoxelGraphics::VSphereSizing& io_rSizing )
+{
+  const bool bByResidual = i_rOptions.ReconstructionResiduals;
+  io_rSizing = { i_rOptions.MarkerRadius ? -1.0F : UsualRadius, io_rSizing.Scale * CoverScale };
+  const bool bWere = std::exchange( m_bLabelledShown, bByResidual );
+  if ( bWere == bByResidual && ( !bByResidual || !m_bLabelledStale ) )
+  {
+    return;
+  }
+  m_bLabelledStale = false;
+  m_LabelledPoints.clear();
+  m_LabelledResiduals.clear();
+  if ( const auto* const pSet = ZEK::FlowPayload< VReconstructionSet >( m_Set.Get() ); pSet && bByResidual )
+  {
+    for ( const EFlowSubjectGroup Group : { EGroupSubject, EGroupRigidObject, EGroupProp } )
+    {
+      const VFlowRenderSubject& rSubjects = m_pSubjects->Group( Group );
+      for ( std::size_t Index = 0; Index < rSubjects.Reconstructions().size(); ++Index )
+      {
+        const std::uint32_t Reconstruction = rSubjects.Reconstructions()[Index];
+        if ( Reconstruction < pSet->Items.size() )
+        {
+          m_LabelledPoints.push_back( rSubjects.Group().Markers[Index] );
+          m_LabelledResiduals.push_back( pSet->Items[Reconstruction].Residual );
+        }
+      }
+    }
+  }
+  SetLabelled( m_LabelledPoints );
+  SetLabelledResiduals( m_LabelledResiduals );
 }
 
 void VFlowRenderReconstructions::GiveIds()
 {
   MoxelGraphics::VSelectionRegistry& rRegistry = m_rScene.Registry();
-  const auto Give = [&]( const auto& i_rPoints, std::vector< std::uint8_t >& io_rFlags )
-  {
-    MarkMembers( io_rFlags, i_rPoints, i_rPoints.Points.size(), rRegistry );
-    return i_rPoints.Points.empty()
-               ? 0
-               : rRegistry.AllocateRange( static_cast< std::uint32_t >( i_rPoints.Points.size() ), i_rPoints );
-  };
-  const std::uint32_t FirstUnlabelled = Give( m_UnlabelledPoints, m_UnlabelledFlags );
-  SetReconstructionIds( FirstUnlabelled, m_UnlabelledFlags );
-  const std::uint32_t FirstLabelled = Give( m_LabelledPoints, m_LabelledFlags );
-  SetLabelledIds( FirstLabelled, m_LabelledFlags );
+  const auto Count = static_cast< std::uint32_t >( m_UnlabelledPoints.Points.size() );
+  MarkMembers( m_UnlabelledFlags, m_UnlabelledPoints, Count, rRegistry );
+  SetReconstructionIds( Count != 0 ? rRegistry.AllocateRange( Count, m_UnlabelledPoints ) : 0, m_UnlabelledFlags );
 }
 
 } // namespace Flow2Graphics

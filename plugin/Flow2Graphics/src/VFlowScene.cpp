@@ -1,6 +1,7 @@
 #include <Flow2Graphics/VFlowScene.h>
 
 #include "StateUpAxis.h"
+#include "SubjectReport.h"
 
 #include <Flow2Graphics/VContributions.h>
 #include <Flow2Graphics/VFlowContributions.h>
@@ -8,15 +9,22 @@
 #include <Flow2Graphics/VFlowRenderCentroidAssignments.h>
 #include <Flow2Graphics/VFlowRenderFloorGrid.h>
 #include <Flow2Graphics/VFlowRenderForcePlates.h>
+#include <Flow2Graphics/VFlowRenderGeometry.h>
+#include <Flow2Graphics/VFlowRenderMarkerTrails.h>
 #include <Flow2Graphics/VFlowRenderReconstructionVolume.h>
 #include <Flow2Graphics/VFlowRenderReconstructions.h>
+#include <Flow2Graphics/VFlowRenderSubjects.h>
 
 #include <CoreMoxelTypes/FlowTypes.h>
 #include <MoxelGraphics/VRenderAxis.h>
 #include <MoxelGraphics/VRenderCameraBackdrop.h>
 #include <MoxelGraphics/VRenderCameraData2D.h>
 #include <MoxelGraphics/VRenderCameraData3D.h>
+#include <MoxelGraphics/VRenderMarkerHalo.h>
 #include <MoxelGraphics/VRenderOutlines.h>
+#include <MoxelGraphics/VRenderSubjectLabels.h>
+
+#include <QtCore/QPointer>
 
 namespace Flow2Graphics
 {
@@ -31,8 +39,30 @@ VFlowScene::VFlowScene( std::shared_ptr< HarrowPluginInterface::IRenderResources
   m_pContributions->SetOnWatched(
       [this]
       {
-        MarkDirty(); // the frame that is shown is looked at again
+        MarkStale(); // the frame that is shown is looked at again
       } );
+  ConnectMeshCache();
+}
+
+void VFlowScene::ConnectMeshCache()
+{
+  if ( MeshCache() )
+  {
+    m_MeshCacheChanged = MeshCache()->Changed().Connect(
+        [pSelf = QPointer( this )]
+        {
+          if ( !pSelf )
+          {
+            return;
+          }
+          if ( const auto pSubjects = pSelf->Subjects() )
+          {
+            pSubjects->MarkDirty();
+          }
+          pSelf->MarkStale();
+        },
+        PostalService() );
+  }
 }
 
 VFlowScene::~VFlowScene()
@@ -54,7 +84,15 @@ QVariantMap VFlowScene::SceneReport()
     m_pContributions->watchRows();
   }
   m_pContributions->Flush();
-  return { { "contributions", m_pContributions->Rows() } };
+  const auto pSubjects = Subjects();
+  return { { "contributions", m_pContributions->Rows() },
+           { "subjects", pSubjects ? ReportSubjects( *pSubjects ) : QVariantMap() } };
+}
+
+std::shared_ptr< VFlowRenderSubjects > VFlowScene::Subjects() const
+{
+  const std::lock_guard Lock( m_SubjectsGuard );
+  return m_pSubjects;
 }
 
 void VFlowScene::Initialise( CoreGraphics::VRenderContext& io_rContext )
@@ -73,28 +111,72 @@ void VFlowScene::CreateRenderTypes()
   // the gizmo is drawn over it.
   const auto pFloor = std::make_shared< VFlowRenderFloorGrid >( Resources() );
   const auto pPlates = std::make_shared< VFlowRenderForcePlates >( *this );
-  const auto pReconstructions = std::make_shared< VFlowRenderReconstructions >( *this );
+  const auto pSubjects = std::make_shared< VFlowRenderSubjects >( *this );
+  const auto pReconstructions = std::make_shared< VFlowRenderReconstructions >( *this, pSubjects );
   m_pCameraProvider = std::make_shared< VFlowRenderCameraProvider >( *this );
   const auto pAssignments = std::make_shared< VFlowRenderCentroidAssignments >( *this, m_pCameraProvider );
   const auto pBackdrop = std::make_shared< MoxelGraphics::VRenderCameraBackdrop >( *this, m_pCameraProvider );
   m_pCameras = std::make_shared< VFlowRenderCameras >( *this, m_pCameraProvider );
   const auto pData2D = std::make_shared< MoxelGraphics::VRenderCameraData2D >( *this, m_pCameraProvider );
   const auto pData3D = std::make_shared< MoxelGraphics::VRenderCameraData3D >( *this, m_pCameraProvider );
+  const auto pGeometry = std::make_shared< VFlowRenderGeometry >( *this );
   const auto pVolume = std::make_shared< VFlowRenderReconstructionVolume >( Resources() );
+  const auto pTrails = std::make_shared< VFlowRenderMarkerTrails >( *this );
+  const auto pHalo = std::make_shared< MoxelGraphics::VRenderMarkerHalo >( *this );
+  const auto pLabels = std::make_shared< MoxelGraphics::VRenderSubjectLabels >( *this );
   const auto pAxis = std::make_shared< MoxelGraphics::VRenderAxis >( Resources() );
+  const auto Lists = [&]( EFlowSubjectGroup i_Group )
+  {
+    return &pSubjects->Group( i_Group ).Group();
+  };
+  pTrails->SetGroups( { Lists( EGroupSubject ), Lists( EGroupProp ) } );
+  pHalo->SetGroups( { Lists( EGroupRigidObject ), Lists( EGroupSubject ), Lists( EGroupProp ), Lists( EGroupSolving ) } );
+  pLabels->SetGroups( { Lists( EGroupRigidObject ), Lists( EGroupSubject ), Lists( EGroupProp ), Lists( EGroupSolving ),
+                        Lists( EGroupRetargeting ), Lists( EGroupSceneMesh ) } );
 
   m_PostList = { std::make_shared< MoxelGraphics::VRenderOutlines >( *this ) };
   m_pBackdrop = pBackdrop;
-  m_RenderList = { pFloor,     pPlates, pReconstructions, pAssignments, pBackdrop,
-                   m_pCameras, pData2D, pData3D,          pVolume,      pAxis };
+  m_RenderList = { pFloor, pPlates, pReconstructions };
+  pSubjects->SetAssignments( pAssignments );
+  for ( auto& rpType : pSubjects->RenderTypes() )
+  {
+    m_RenderList.push_back( std::move( rpType ) );
+  }
+  m_RenderList.insert( m_RenderList.end(), { pBackdrop, m_pCameras, pData2D, pData3D, pGeometry, pVolume, pTrails, pHalo,
+                                             pLabels, pAxis } );
   m_FlowRenderTypes = { pFloor,
                         pPlates,
                         pReconstructions,
-                        pVolume,
+                        pSubjects,
                         m_pCameraProvider,
                         pAssignments,
                         m_pCameras,
+                        pGeometry,
+                        pVolume,
+                        pTrails,
                         std::make_shared< VFlowContributions >( *this, m_pCameraProvider, m_pContributions ) };
+  const std::lock_guard Lock( m_SubjectsGuard );
+  m_pSubjects = pSubjects;
+}
+
+void VFlowScene::MarkStale()
+{
+  m_bStale.store( true, std::memory_order_release );
+  MarkDirty();
+}
+
+/// An update with the state and the selection that the types hold would find nothing to do.
+void VFlowScene::UpdateUnlessTaken( const ZEK::VFlowStateRef& i_rState )
+{
+  // Read first: what changes from here on is seen as new next time.
+  const bool bStale = m_bStale.exchange( false, std::memory_order_acq_rel );
+  const std::uint64_t Selection = SelectionService() ? SelectionService()->Generation() : 0;
+  if ( bStale || i_rState != m_TakenState || Selection != m_TakenSelection )
+  {
+    UpdateFromState( *i_rState, {} );
+    m_TakenState = i_rState;
+    m_TakenSelection = Selection;
+  }
 }
 
 bool VFlowScene::ProcessPending()
@@ -107,7 +189,7 @@ bool VFlowScene::ProcessPending()
   const ZEK::VFlowStateRef State = FetchState();
   if ( State && State->ItemCount() != 0 )
   {
-    UpdateFromState( *State, {} );
+    UpdateUnlessTaken( State );
   }
   else
   {
@@ -119,6 +201,7 @@ bool VFlowScene::ProcessPending()
 
 void VFlowScene::UpdateFromState( const ZEK::IFlowState& i_rState, const VSubjectChanges& i_rChanges )
 {
+  m_TakenState = {};
   ClearLabels();
   Registry().Reset();
   for ( const std::shared_ptr< IFlowRenderType >& rpType : m_FlowRenderTypes )

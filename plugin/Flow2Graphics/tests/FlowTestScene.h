@@ -3,8 +3,10 @@
 #include <CoreMoxelTypes/FlowTypes.h>
 #include <Flow2Graphics/VFlowRenderFloorGrid.h>
 #include <Flow2Graphics/VFlowRenderForcePlates.h>
+#include <Flow2Graphics/VFlowRenderGeometry.h>
 #include <Flow2Graphics/VFlowRenderReconstructionVolume.h>
 #include <Flow2Graphics/VFlowRenderReconstructions.h>
+#include <Flow2Graphics/VFlowRenderSubjects.h>
 #include <Flow2Graphics/VFlowScene.h>
 #include <HostFlow/VFlowFramework.h>
 
@@ -16,8 +18,10 @@ namespace FlowTest
 class VScene : public Flow2Graphics::VFlowScene
 {
 public:
-  VScene()
-    : VFlowScene( nullptr, std::make_shared< HostServices::VSelectionService >(), nullptr, nullptr, false )
+  explicit VScene( std::shared_ptr< HarrowPluginInterface::VMeshSceneCache > i_pMeshCache = nullptr,
+                   std::shared_ptr< ZEK::IPostalService > i_pPostal = nullptr )
+    : VFlowScene( nullptr, std::make_shared< HostServices::VSelectionService >(), std::move( i_pMeshCache ),
+                  std::move( i_pPostal ), false )
   {
     CreateRenderTypes();
   }
@@ -33,10 +37,16 @@ public:
   {
     SelectionService()->Set( ZEK::ISelectionService::EPrimary, std::move( i_Items ) );
   }
-  auto& Floor() { return Type< Flow2Graphics::VFlowRenderFloorGrid >( 0 ); }
-  auto& Plates() { return Type< Flow2Graphics::VFlowRenderForcePlates >( 1 ); }
-  auto& Reconstructions() { return Type< Flow2Graphics::VFlowRenderReconstructions >( 2 ); }
-  auto& Volume() { return Type< Flow2Graphics::VFlowRenderReconstructionVolume >( 3 ); }
+  auto& Floor() { return Type< Flow2Graphics::VFlowRenderFloorGrid >(); }
+  auto& Plates() { return Type< Flow2Graphics::VFlowRenderForcePlates >(); }
+  auto& Reconstructions() { return Type< Flow2Graphics::VFlowRenderReconstructions >(); }
+  auto& Volume() { return Type< Flow2Graphics::VFlowRenderReconstructionVolume >(); }
+  auto& Geometry() { return Type< Flow2Graphics::VFlowRenderGeometry >(); }
+  const MoxelGraphics::VSubjectGroup& Group( Flow2Graphics::EFlowSubjectGroup i_Group )
+  {
+    return Subjects()->Group( i_Group ).Group();
+  }
+  const std::vector< std::shared_ptr< MoxelGraphics::IRenderType > >& RenderList() const { return m_RenderList; }
 
   ZEK::VFlowStateRef State;
   int Fetches = 0;
@@ -50,9 +60,16 @@ protected:
 
 private:
   template < typename TType >
-  TType& Type( std::size_t i_Place )
+  TType& Type()
   {
-    return dynamic_cast< TType& >( *FlowRenderTypes().at( i_Place ) );
+    for ( const auto& rpType : FlowRenderTypes() )
+    {
+      if ( auto* const pType = dynamic_cast< TType* >( rpType.get() ) )
+      {
+        return *pType;
+      }
+    }
+    throw std::logic_error( "The scene lacks a type" );
   }
 };
 

@@ -77,9 +77,10 @@ TEST_F( VFlowScene, PointsFindTheirLabelsAndIdsTurnBackIntoNames )
   Scene.Show( Labelled() );
   const auto& rFeed = Scene.Reconstructions();
   EXPECT_EQ( rFeed.UnlabelledPoints().Reconstruction, ( std::vector< std::uint32_t >{ 0, 2, 3, 5 } ) );
-  EXPECT_EQ( rFeed.LabelledPoints().Points.size(), 2u );
+  const auto& rSubjects = Scene.Group( Flow2Graphics::EGroupSubject );
+  EXPECT_EQ( rSubjects.Markers.size(), 2u );
   std::vector< std::string > Labels;
-  const std::vector< std::uint32_t > Ids = { rFeed.Unlabelled().FirstId() + 2, rFeed.Labelled().FirstId() + 1 };
+  const std::vector< std::uint32_t > Ids = { rFeed.Unlabelled().FirstId() + 2, rSubjects.MarkerIds.First + 1 };
   const ZEK::VSelection Found = Scene.ResolveIds( Ids, Labels );
   EXPECT_EQ( Found, ( ZEK::VSelection{ { ZEK::ESelectReconstruction, "", 0, 3 },
                                        { ZEK::ESelectMarker, "Ada:RFHD", 7, 1 } } ) );
@@ -90,26 +91,28 @@ TEST_F( VFlowScene, PointsFindTheirLabelsAndIdsTurnBackIntoNames )
   EXPECT_EQ( Points[0].X, 300.0F );
   EXPECT_EQ( Points[1].X, 400.0F );
   Scene.Show( Without() );
-  EXPECT_TRUE( rFeed.Unlabelled().IsEmpty() && rFeed.Labelled().IsEmpty() ) << "points vanish with their set";
+  EXPECT_TRUE( rFeed.Unlabelled().IsEmpty() && rSubjects.Markers.empty() ) << "points vanish with their set";
 }
 
 TEST_F( VFlowScene, ASelectionShowsOnAPausedStateAndMovesNoGeometry )
 {
   const ZEK::VFlowStateRef Paused = Labelled();
   const auto& rFeed = Scene.Reconstructions();
+  const auto& rSubjects = Scene.Group( Flow2Graphics::EGroupSubject );
   Scene.Show( Paused );
-  const auto* const pBefore = rFeed.LabelledPoints().Points.data();
+  const std::uint64_t Before = rSubjects.MarkerGeneration;
   for ( const bool bMarked : { false, true, false } )
   {
     Scene.Select( bMarked ? ZEK::VSelection{ { ZEK::ESelectMarker, "Ada:LFHD", 7, 0 } } : ZEK::VSelection() );
     Scene.Show( Paused );
-    EXPECT_EQ( rFeed.Labelled().AnyMarked(), bMarked );
+    EXPECT_EQ( rSubjects.MarkerIds.Flags,
+               bMarked ? std::vector< std::uint8_t >( { 5, 0 } ) : std::vector< std::uint8_t >() );
     EXPECT_FALSE( rFeed.Unlabelled().AnyMarked() );
-    EXPECT_EQ( rFeed.LabelledPoints().Points.data(), pBefore );
+    EXPECT_EQ( rSubjects.MarkerGeneration, Before );
   }
 }
 
-TEST_F( VFlowScene, ColoursOfMarkersComeFromApplicationDataThatFits )
+TEST_F( VFlowScene, ASubjectWhoseColoursDoNotFitIsLeftOutAndItsPointsStay )
 {
   const auto Show = [&]( std::vector< std::uint32_t > i_Colours )
   {
@@ -118,8 +121,10 @@ TEST_F( VFlowScene, ColoursOfMarkersComeFromApplicationDataThatFits )
     Scene.Show( Maker.State( 0, { Maker.Points( 2 ), Maker.Subject( 7, "Ada", { "LFHD", "RFHD" } ),
                                   Maker.Item< FlowSubjectApplicationData >( Data, "Ada" ),
                                   Maker.Item< FlowReconstructionLabelSet >( { { { 0, 7, 1 } } } ) } ) );
-    return Scene.Reconstructions().LabelledPoints().Colours.at( 0 );
+    return Scene.Group( Flow2Graphics::EGroupSubject ).MarkerColours;
   };
-  EXPECT_EQ( Show( { 0xFF000001, 0xFF000002 } ), 0xFF000002 );
-  EXPECT_NE( Show( { 0xFF000001 } ), 0xFF000001 ) << "too few colours are no colours";
+  EXPECT_EQ( Show( { 0xFF000001, 0xFF000002 } ), ( std::vector< std::uint32_t >{ 0xFF000001, 0xFF000002 } ) );
+  EXPECT_EQ( Scene.Reconstructions().UnlabelledPoints().Points.size(), 1u );
+  EXPECT_TRUE( Show( { 0xFF000001 } ).empty() );
+  EXPECT_EQ( Scene.Reconstructions().UnlabelledPoints().Points.size(), 2u );
 }

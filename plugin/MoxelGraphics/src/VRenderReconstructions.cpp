@@ -95,6 +95,7 @@ void VRenderReconstructions::Render( CoreGraphics::VRenderContext& io_rContext, 
   {
     return;
   }
+  VSphereSizing Sizes = Sizing( i_rOptions );
   const auto Draw = [&]( VPoints& io_rPoints )
   {
     if ( io_rPoints.Spheres.IsEmpty() )
@@ -105,7 +106,7 @@ void VRenderReconstructions::Render( CoreGraphics::VRenderContext& io_rContext, 
     {
       ApplyColours( io_rPoints, i_rOptions.ReconstructionResiduals );
     }
-    pHelper->Draw( io_rContext, m_rScene, io_rPoints.Spheres, Sizing( i_rOptions ) );
+    pHelper->Draw( io_rContext, m_rScene, io_rPoints.Spheres, Sizes );
   };
   if ( i_rOptions.Reconstructions )
   {
@@ -114,6 +115,7 @@ void VRenderReconstructions::Render( CoreGraphics::VRenderContext& io_rContext, 
   const VDisplayRecord& rMarkers = i_rOptions.LabellingSubject;
   if ( rMarkers.Enabled && rMarkers.Markers )
   {
+    FillLabelled( i_rOptions, Sizes );
     Draw( m_Labelled );
   }
 }
@@ -121,7 +123,7 @@ void VRenderReconstructions::Render( CoreGraphics::VRenderContext& io_rContext, 
 bool VRenderReconstructions::WantsPaint( const VSceneOptions& i_rOptions ) const
 {
   return i_rOptions.ReconstructionResiduals && !i_rOptions.CameraView && i_rOptions.OverlayCamera.isEmpty() &&
-         ( !m_Unlabelled.Spheres.IsEmpty() || !m_Labelled.Spheres.IsEmpty() );
+         ( !m_Unlabelled.Spheres.IsEmpty() || HasLabelled() );
 }
 
 void VRenderReconstructions::Paint( QPainter& io_rPainter, CoreGraphics::VRenderContext& io_rContext,

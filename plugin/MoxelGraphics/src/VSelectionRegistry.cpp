@@ -318,24 +318,36 @@ void VSelectionRegistry::SetPose( const ZEK::VSelectionItem& i_rItem, const VSce
   m_Poses.Set( i_rItem, i_rPose );
 }
 
-bool VSelectionRegistry::GetPosition( const ZEK::VSelectionItem& i_rItem, VScenePoint& o_rPoint ) const
+template < typename TAsk >
+bool VSelectionRegistry::AskResolvers( const ZEK::VSelectionItem& i_rItem, TAsk i_Ask ) const
 {
-  if ( m_Positions.Get( i_rItem, o_rPoint ) )
-  {
-    return true;
-  }
   return std::any_of( m_Ranges.begin(), m_Ranges.end(),
                       [&]( const VRange& i_rRange )
                       {
                         std::uint32_t Index = 0;
                         return i_rRange.pResolver && i_rRange.pResolver->FindIndex( i_rItem, Index ) &&
-                               i_rRange.pResolver->GetPoint( Index, o_rPoint );
+                               i_Ask( *i_rRange.pResolver, Index );
                       } );
+}
+
+bool VSelectionRegistry::GetPosition( const ZEK::VSelectionItem& i_rItem, VScenePoint& o_rPoint ) const
+{
+  return m_Positions.Get( i_rItem, o_rPoint ) ||
+         AskResolvers( i_rItem,
+                       [&]( const IRangeResolver& i_rResolver, std::uint32_t i_Index )
+                       {
+                         return i_rResolver.GetPoint( i_Index, o_rPoint );
+                       } );
 }
 
 bool VSelectionRegistry::GetPose( const ZEK::VSelectionItem& i_rItem, VScenePose& o_rPose ) const
 {
-  return m_Poses.Get( i_rItem, o_rPose );
+  return m_Poses.Get( i_rItem, o_rPose ) ||
+         AskResolvers( i_rItem,
+                       [&]( const IRangeResolver& i_rResolver, std::uint32_t i_Index )
+                       {
+                         return i_rResolver.GetPose( i_Index, o_rPose );
+                       } );
 }
 
 const VSelectionRegistry::VRange* VSelectionRegistry::RangeOf( std::uint32_t i_Id ) const

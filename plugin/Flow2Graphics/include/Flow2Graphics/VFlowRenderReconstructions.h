@@ -1,43 +1,49 @@
 #pragma once
 
 #include <Flow2Graphics/IFlowRenderType.h>
-#include <Flow2Graphics/LabelledPoints.h>
+#include <Flow2Graphics/UnlabelledPoints.h>
 
-#include <Flow2TypesUtils/TaggedCoreTypeExtractor.h>
 #include <MoxelGraphics/VRenderReconstructions.h>
+
+#include <memory>
 
 namespace Flow2Graphics
 {
 
-/// Feeds the reconstructions of the frame, split into those that the label set names and the rest. A state without a
-/// reconstruction set shows none.
+class VFlowRenderSubjects;
+
+/// Feeds the reconstructions of the frame that no subject takes for a marker. A state without a reconstruction set
+/// shows none. While residuals are shown, those that subjects took are drawn too, over their markers.
 ///
 /// Cost: linear in the points of a frame whose set or labels changed; a few comparisons otherwise.
 class VFlowRenderReconstructions : public MoxelGraphics::VRenderReconstructions, public IFlowRenderType
 {
 public:
-  explicit VFlowRenderReconstructions( MoxelGraphics::VMoxelScene& i_rScene );
+  VFlowRenderReconstructions( MoxelGraphics::VMoxelScene& i_rScene,
+                              std::shared_ptr< VFlowRenderSubjects > i_pSubjects );
 
   void Update( const ZEK::IFlowState& i_rState ) override;
 
   const VUnlabelledPoints& UnlabelledPoints() const { return m_UnlabelledPoints; }
-  const VLabelledPoints& LabelledPoints() const { return m_LabelledPoints; }
+
+protected:
+  void FillLabelled( const MoxelGraphics::VSceneOptions& i_rOptions,
+                     MoxelGraphics::VSphereSizing& io_rSizing ) override;
+  bool HasLabelled() const override;
 
 private:
-  bool TakeItems( const ZEK::IFlowState& i_rState );
-  bool TakeSubjects( const ZEK::IFlowState& i_rState );
   void Rebuild();
   void GiveIds();
 
-  Flow2TypesUtils::VTaggedCoreTypeExtractor m_Subjects;
-  std::vector< ZEK::VFlowItemRef > m_SubjectItems, m_DataItems; ///< by slot, while subjects are taken
+  std::shared_ptr< VFlowRenderSubjects > m_pSubjects;
   ZEK::VFlowItemRef m_Set;
-  ZEK::VFlowItemRef m_Labels;
+  std::uint64_t m_TakenGeneration = 0;
   VUnlabelledPoints m_UnlabelledPoints;
-  VLabelledPoints m_LabelledPoints;
-  std::vector< std::uint8_t > m_bLabelled; ///< by index in the set
   std::vector< std::uint8_t > m_UnlabelledFlags;
-  std::vector< std::uint8_t > m_LabelledFlags;
+  std::vector< MoxelGraphics::VScenePoint > m_LabelledPoints;
+  std::vector< float > m_LabelledResiduals;
+  bool m_bLabelledStale = true;
+  bool m_bLabelledShown = false;
 };
 
 } // namespace Flow2Graphics

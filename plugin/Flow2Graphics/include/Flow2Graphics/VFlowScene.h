@@ -3,7 +3,9 @@
 #include <Flow2Graphics/IFlowRenderType.h>
 #include <MoxelGraphics/VMoxelScene.h>
 
+#include <atomic>
 #include <memory>
+#include <mutex>
 #include <vector>
 
 namespace Flow2Graphics
@@ -12,6 +14,7 @@ namespace Flow2Graphics
 class VContributions;
 class VFlowRenderCameraProvider;
 class VFlowRenderCameras;
+class VFlowRenderSubjects;
 
 /// A scene that draws frames of state. A derived scene decides where the states come from: it calls `MarkDirty` when
 /// there is something new, and answers `FetchState`.
@@ -32,7 +35,8 @@ public:
   /// Which cameras see the selection; never null. Thread: GUI.
   const std::shared_ptr< VContributions >& Contributions() const { return m_pContributions; }
   QObject* ContributionsObject() const;
-  /// "contributions": the rows of the list. Watches it from the first call on.
+  /// "contributions": the rows of the list, watched from the first call on. "subjects": by display record and kind of
+  /// subject, who is there and how much of each was drawn.
   QVariantMap SceneReport() override;
 
   /// Makes the render types in their fixed order; does nothing when they exist.
@@ -65,18 +69,37 @@ public:
   const std::shared_ptr< VFlowRenderCameraProvider >& CameraProvider() const { return m_pCameraProvider; }
   /// What draws them; null before the render types are made.
   const std::shared_ptr< VFlowRenderCameras >& Cameras() const { return m_pCameras; }
+  /// The subjects of it; null before the render types are made. Thread: any.
+  std::shared_ptr< VFlowRenderSubjects > Subjects() const;
   const std::vector< std::shared_ptr< IFlowRenderType > >& FlowRenderTypes() const { return m_FlowRenderTypes; }
+  /// The states that are kept of a stretch of time, in any order; none where nothing is kept. Thread: render thread.
+  virtual void FetchAround( const ZEK::VFlowTimeRange& /*i_rRange*/, std::vector< ZEK::VFlowStateRef >& o_rStates )
+  {
+    o_rStates.clear();
+  }
 
 protected:
   /// The newest state; null when there is none. Thread: render thread.
   virtual ZEK::VFlowStateRef FetchState() = 0;
+  /// As `MarkDirty`, and the next frame takes its state even if it has taken that one before. Thread: any.
+  void MarkStale();
 
 private:
+  void UpdateUnlessTaken( const ZEK::VFlowStateRef& i_rState );
+  void ConnectMeshCache();
+
   std::vector< std::shared_ptr< IFlowRenderType > > m_FlowRenderTypes;
   std::shared_ptr< VFlowRenderCameraProvider > m_pCameraProvider;
   std::shared_ptr< VFlowRenderCameras > m_pCameras;
   std::shared_ptr< VContributions > m_pContributions;
   bool m_bReported = false; ///< the report watches
+  mutable std::mutex m_SubjectsGuard;
+  std::shared_ptr< VFlowRenderSubjects > m_pSubjects;
+  ZEK::VConnection m_MeshCacheChanged;
+  // What the types hold; the state is kept so that no other can be taken for it.
+  ZEK::VFlowStateRef m_TakenState;
+  std::uint64_t m_TakenSelection = 0;
+  std::atomic< bool > m_bStale{ true };
 };
 
 } // namespace Flow2Graphics

@@ -50,6 +50,11 @@ public:
   const VSphereBatch& Labelled() const { return m_Labelled.Spheres; }
 
 protected:
+  /// Called before the points with a label are drawn: the place to set them by what is shown, and how they are sized.
+  virtual void FillLabelled( const VSceneOptions& /*i_rOptions*/, VSphereSizing& /*io_rSizing*/ ) {}
+  /// Whether there are points with a label, set or not.
+  virtual bool HasLabelled() const { return !m_Labelled.Spheres.IsEmpty(); }
+
   VMoxelScene& m_rScene;
 
 private:

@@ -46,6 +46,7 @@ public:
   /// The reverse: the index of an item, false when it is none of the range.
   virtual bool FindIndex( const ZEK::VSelectionItem& /*i_rItem*/, std::uint32_t& /*o_rIndex*/ ) const { return false; }
   virtual bool GetPoint( std::uint32_t /*i_Index*/, VScenePoint& /*o_rPoint*/ ) const { return false; }
+  virtual bool GetPose( std::uint32_t /*i_Index*/, VScenePose& /*o_rPose*/ ) const { return false; }
 };
 
 /// Hands out the selection ids of one frame of state, and turns ids back into items.
@@ -145,6 +146,9 @@ private:
 
   bool Take( std::uint32_t i_Count, VRange*& o_rpRange );
   void WarnOfLookalikes( const VRange& i_rRange );
+  /// The first answer of a resolver that knows the item.
+  template < typename TAsk >
+  bool AskResolvers( const ZEK::VSelectionItem& i_rItem, TAsk i_Ask ) const;
   bool FindIn( const VRange& i_rRange, const ZEK::VSelectionItem& i_rItem, std::uint32_t& o_rIndex ) const;
   void TakeMarks();
   const VRange* RangeOf( std::uint32_t i_Id ) const;
