@@ -46,9 +46,8 @@ CoreMoxelTypes::VSubject SubjectOf( const std::vector< VJoint >& i_rJoints )
                                               : CoreMoxelTypes::EJointType::Ball;
     const Rigid ParentTurn =
         rJoint.Parent < 0 ? Rigid{} : Subject.Segments[static_cast< std::size_t >( rJoint.Parent )].Post;
-    const bool bFree = Segment.Joint == CoreMoxelTypes::EJointType::Free;
-    // Back from the parent's turned segment, then the shift.
-    Segment.Pre = Inverse( ParentTurn ) * RigidOf( { 1, 0, 0, 0 }, bFree ? VVector{} : rJoint.Offset );
+    // Back from the parent's turned segment, then the shift, so that a state of zeros is the figure as it is drawn up.
+    Segment.Pre = Inverse( ParentTurn ) * RigidOf( { 1, 0, 0, 0 }, rJoint.Offset );
     Segment.Post = TurnTo( Bone );
     Segment.BoneLength = static_cast< float >( LengthOf( Bone ) );
     Subject.Segments.push_back( std::move( Segment ) );
@@ -62,13 +61,13 @@ void AppendState( const std::vector< VJoint >& i_rJoints, const double* i_pRow, 
   for ( const VJoint& rJoint : i_rJoints )
   {
     VQuaternion Turn{ 1, 0, 0, 0 };
-    VVector Place = rJoint.Offset;
+    VVector Shift{};
     for ( const EChannel Channel : rJoint.Channels )
     {
       const auto Number = static_cast< std::size_t >( Channel );
       if ( Number < 3 )
       {
-        Place[Number] = *i_pRow++;
+        Shift[Number] = *i_pRow++ - rJoint.Offset[Number];
         continue;
       }
       VVector Axis{};
@@ -83,7 +82,7 @@ void AppendState( const std::vector< VJoint >& i_rJoints, const double* i_pRow, 
     io_rStates.insert( io_rStates.end(), Vector.begin(), Vector.end() );
     if ( HasPosition( rJoint ) )
     {
-      io_rStates.insert( io_rStates.end(), Place.begin(), Place.end() );
+      io_rStates.insert( io_rStates.end(), Shift.begin(), Shift.end() );
     }
   }
 }
