@@ -3,6 +3,7 @@
 #include <CLI/CLI.hpp>
 
 #include <cmath>
+#include <limits>
 #include <sstream>
 
 namespace HostWindow
@@ -176,10 +177,24 @@ void AddActions( CLI::App& io_rApp, VRenderOptions& o_rRender )
       ->group( "Done to the view, in the order given (points are pixels of the view from its top left)" );
 }
 
+void AddPoses( CLI::App& io_rApp, VPoseOptions& o_rPoses )
+{
+  const auto Add = [&]( const char* i_pName, std::optional< int >& o_rPose, const char* i_pHelp )
+  {
+    io_rApp.add_option( i_pName, o_rPose, i_pHelp )
+        ->check( CLI::Range( 0, std::numeric_limits< int >::max() ) )
+        ->type_name( "N" );
+  };
+  Add( "--pose", o_rPoses.All, "The pose of each subject in a window of subjects, from 0; it is 0 unless given" );
+  Add( "--labelling-pose", o_rPoses.Labelling, "The same for labelled subjects alone" );
+  Add( "--solving-pose", o_rPoses.Solving, "The same for solved subjects alone" );
+}
+
 void AddRender( CLI::App& io_rApp, VRenderOptions& o_rRender )
 {
-  io_rApp.add_option( "--window", o_rRender.Window, "The kind of window, such as 3d or cameras" )
+  io_rApp.add_option( "--window", o_rRender.Window, "The kind of window, such as 3d, cameras or subject" )
       ->capture_default_str();
+  AddPoses( io_rApp, o_rRender.Poses );
   io_rApp
       .add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC, BVH, MOT, a folder of cameras)" )
       ->expected( 1, -1 )

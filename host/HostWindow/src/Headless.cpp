@@ -68,17 +68,19 @@ VRunResult OpenSource( VSession& io_rSession, const std::string& i_rSource, doub
 class VStandAloneView : public QObject
 {
 public:
-  VStandAloneView( VSession& io_rSession, const std::string& i_rWindow, QSize i_Size )
+  VStandAloneView( VSession& io_rSession, const std::string& i_rWindow, const VRenderOptions& i_rRender )
   {
     m_Toolbar.setLayout( new QHBoxLayout );
     const auto pFactory = io_rSession.Host().Factories()->Find( i_rWindow );
     pFactory->Create( m_pContent, io_rSession.Context(), QPointer< QWidget >( &m_Toolbar ) );
     if ( m_pContent )
     {
-      m_pContent->resize( i_Size );
-      m_pContent->show();
+      m_pContent->resize( i_rRender.Width, i_rRender.Height );
       m_View = VSceneView( m_pContent.get() );
       m_View.SetReporting( true );
+      const VPoseOptions& rPoses = i_rRender.Poses;
+      m_View.SetPoses( rPoses.All.value_or( 0 ), rPoses.Labelling.value_or( -1 ), rPoses.Solving.value_or( -1 ) );
+      m_pContent->show(); // draws the first frame
       if ( m_View.Widget() )
       {
         m_View.Widget()->installEventFilter( this );
@@ -158,7 +160,7 @@ std::string KindsText( const HostServices::VContentFactories& i_rFactories )
 VRunResult RenderOne( VSession& io_rSession, const VRenderOptions& i_rRender, const std::string& i_rWindow,
                       const QString& i_rOutput, const std::optional< QString >& i_rReport )
 {
-  VStandAloneView Window( io_rSession, i_rWindow, { i_rRender.Width, i_rRender.Height } );
+  VStandAloneView Window( io_rSession, i_rWindow, i_rRender );
   VViewDriver Driver( Window.View(), io_rSession.Host().Selection() );
   if ( !Driver.View().Item() )
   {
@@ -168,6 +170,10 @@ VRunResult RenderOne( VSession& io_rSession, const VRenderOptions& i_rRender, co
   if ( !Driver.WaitFrames( FirstFrames ) )
   {
     return Fail( EExitDisplay, "the window \"" + i_rWindow + "\" draws no frame: this display has no OpenGL" );
+  }
+  if ( i_rRender.Poses.IsSet() && !i_rRender.bAll && !Driver.View().FrameReport().contains( "subjectScene" ) )
+  {
+    return Fail( EExitUsage, "the window \"" + i_rWindow + "\" poses no subjects; --window subject does" );
   }
   QJsonArray Actions;
   for ( const VViewAction& rAction : i_rRender.Actions )

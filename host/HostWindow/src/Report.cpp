@@ -201,6 +201,10 @@ QJsonObject DescribeView( VSession& i_rSession, const VRenderOptions& i_rRender,
   {
     Report[pMember] = ToJson( Frame.value( pMember ) );
   }
+  if ( const QVariant Subjects = Frame.value( "subjectScene" ); Subjects.isValid() )
+  {
+    Report["subjectScene"] = ToJson( Subjects );
+  }
   if ( const QVariantList Tiles = i_rView.CameraReport(); !Tiles.isEmpty() )
   {
     Report["tiles"] = ToJson( Tiles );

@@ -142,6 +142,12 @@ int VSceneView::Tracking() const
   return Item() ? Item()->property( "tracking" ).toInt() : -1;
 }
 
+bool VSceneView::TrackingSupported() const
+{
+  const QVariant Supported = Widget() ? Widget()->property( "trackingSupported" ) : QVariant();
+  return !Supported.isValid() || Supported.toBool();
+}
+
 bool VSceneView::SelectionHasBounds() const
 {
   bool bHas = false;
@@ -166,6 +172,16 @@ bool VSceneView::ExecuteCommand( const std::string& i_rText )
 {
   auto* pCommands = dynamic_cast< HarrowPluginInterface::IHarrowExecuteCommand* >( m_pContent.data() );
   return pCommands && pCommands->ExecuteCommand( i_rText );
+}
+
+void VSceneView::SetPoses( int i_All, int i_Labelling, int i_Solving )
+{
+  if ( Widget() )
+  {
+    Widget()->setProperty( "poseIndex", i_All );
+    Widget()->setProperty( "labellingPoseIndex", i_Labelling );
+    Widget()->setProperty( "solvingPoseIndex", i_Solving );
+  }
 }
 
 void VSceneView::SetReporting( bool i_bOn )

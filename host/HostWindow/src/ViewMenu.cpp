@@ -245,6 +245,10 @@ void VViewMenu::Refresh()
   Check( m_ViewTypes, View.ViewType() );
   Check( m_CentroidColours, View.Item() ? View.Option( CentroidColours ).toInt() : -1 );
   Check( m_Tracking, View.Tracking() );
+  if ( !View.TrackingSupported() )
+  {
+    m_Tracking.setVisible( false );
+  }
   const QStringList Keys = View.OptionKeys();
   for ( const VToggle& rToggle : m_Toggles )
   {

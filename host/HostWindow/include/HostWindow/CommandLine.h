@@ -49,6 +49,14 @@ struct VCommonOptions
   HostSources::VReadOptions Reading; ///< how recordings are read
 };
 
+/// Which poses the subjects of a view of subjects stand in; those of one kind in place of those of all.
+struct VPoseOptions
+{
+  std::optional< int > All, Labelling, Solving;
+
+  bool IsSet() const { return All || Labelling || Solving; }
+};
+
 struct VRenderOptions
 {
   std::string Window = "3d";
@@ -57,6 +65,7 @@ struct VRenderOptions
   int Width = 1280;
   int Height = 720;
   double Ratio = 1;
+  VPoseOptions Poses;
   std::vector< VViewAction > Actions; ///< in the order given
   std::filesystem::path Output;
   std::filesystem::path Report;

@@ -37,6 +37,8 @@ public:
   int ViewType() const;
   /// What the camera follows: 0 nothing, 1 what was selected, 2 the selection, 3 rides on an object; -1 without a view.
   int Tracking() const;
+  /// Whether the view's camera can follow anything; true of a view that does not say.
+  bool TrackingSupported() const;
   /// Whether what is selected has a place in the view, or a pose.
   bool SelectionHasBounds() const;
   bool SelectionHasPose() const;
@@ -44,6 +46,8 @@ public:
   /// Runs a command of the window; false when it knows none of that text.
   bool ExecuteCommand( const std::string& i_rText );
 
+  /// Which poses subjects stand in, of all or of those that are labelled or solved; without effect in other views.
+  void SetPoses( int i_All, int i_Labelling, int i_Solving );
   void SetReporting( bool i_bOn );
   QVariantMap FrameReport() const;
   /// The tiles of a view of cameras with what they show; empty in other views.
