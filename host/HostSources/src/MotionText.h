@@ -23,7 +23,6 @@ public:
   std::optional< bool > Degrees() const { return m_Degrees; }             ///< none where the header does not say
   std::optional< std::int64_t > PromisedRows() const { return m_Promised; }
   std::size_t PromisedColumns() const { return m_PromisedColumns; } ///< 0 where the header does not say
-  std::size_t RowBytesLeft() const { return m_Lines.Rest().size(); }
   std::size_t Position() const { return m_Lines.Position(); }
   std::uint64_t Line() const { return m_Lines.Number(); }
 

@@ -362,7 +362,6 @@ ZEK::IResult VReader::Finish()
   rR.UnitScale = Centimetre;
   rR.UpAxis = EUpAxis::Y;
   rR.UpAxisReason = "y is up: BVH files have it so.";
-  rR.Notes.emplace_back( "Bones are not drawn yet; the recording can be played and inspected." );
   rR.Notes.emplace_back( "The format states no unit of length; centimetres were taken." );
   TakeRate( rR.RateHz, rR );
   m_Skeleton.Subject = SubjectOf( m_Joints );

@@ -219,12 +219,10 @@ void VReader::TakeRow( const std::vector< double >& i_rRow )
 ZEK::IResult VReader::ReadRows()
 {
   m_Skeleton.StateSize = m_Poser.StateSize();
-  // A number takes two bytes at least, so that no promise makes more room than there is a file for.
-  const std::size_t Rows = m_Text.RowBytesLeft() / ( 2 * m_Text.Columns().size() ) + 1;
   std::vector< double > Row( m_Text.Columns().size() );
   while ( true )
   {
-    const std::size_t Frames = static_cast< std::size_t >( m_rRecording.FrameCount );
+    const auto Frames = static_cast< std::size_t >( m_rRecording.FrameCount );
     if ( Frames % 256 == 0 )
     {
       if ( !HasRoomForPoses( Frames + 256, m_Skeleton.StateSize, m_Size + m_ModelSize, m_rMessage ) )
@@ -236,11 +234,6 @@ ZEK::IResult VReader::ReadRows()
         m_rMessage = "line " + std::to_string( m_Text.Line() ) + ": the reading was stopped, expected the rest";
         return ZEK::IResult::Canceled;
       }
-    }
-    if ( Frames == 16 )
-    {
-      const std::size_t Fitting = Rows < 4096 ? Rows : m_Text.RowBytesLeft() / ( m_Text.Position() / 16 + 1 ) + Frames;
-      m_Skeleton.States.reserve( std::min( Rows, Fitting ) * m_Skeleton.StateSize );
     }
     const VMotionText::ERow Found = m_Text.NextRow( Row );
     m_bCut = Found == VMotionText::ERow::Cut;

@@ -13,10 +13,12 @@ namespace HostSources
 {
 
 /// Reads a recording file, or a folder as `ReadFolder` does with the options; what a file is, is told by its content.
+/// A table of motion is read with its model, see `FindModel`.
 ///
 /// A failure leaves `o_rRecording` empty and says in `o_rMessage` which file it was, where (byte offset or line) and
 /// what was expected: `FileNotFound`, `FileIOFailure` (unreadable, a folder of nothing known), `InvalidFormat`,
-/// `EndOfData` (empty, cut off before the first whole frame, no frames), `AllocationFailure`, `Canceled`.
+/// `EndOfData` (empty, cut off before the first whole frame, no frames), `NotFound` (a model), `NotSupported`,
+/// `AllocationFailure`, `Canceled`.
 /// `OkButPartial` gives the frames that are there of a file that was cut off; the message says how many. What is odd
 /// but harmless is in the notes.
 ///
