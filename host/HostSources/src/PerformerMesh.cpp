@@ -43,8 +43,8 @@ struct VFlesh
 constexpr VFlesh TrunkFlesh[] = {
     { EHips, EPart::Trunk, { -12, 62, 5 }, 98, { -12, 45, 60 }, 92 },    // of both sides, as all with a y
     { EHips, EPart::Trunk, { -38, 55, -35 }, 78, { -35, 50, 0 }, 80 },   // seat
-    { ESpine, EPart::Trunk, { 0, 48, -20 }, 88, { 2, 48, 110 }, 90 },    // waist
-    { EChest, EPart::Trunk, { 12, 52, 0 }, 92, { 18, 70, 150 }, 94 },    // ribs
+    { ESpine, EPart::Trunk, { 4, 44, -20 }, 95, { 4, 44, 110 }, 98 },    // waist
+    { EChest, EPart::Trunk, { 8, 44, 0 }, 104, { 10, 60, 150 }, 109 },    // ribs
     { EChest, EPart::Trunk, { 4, 45, 200 }, 82, { 4, 105, 215 }, 66 },   // shoulder blades
     { EChest, EPart::Trunk, { -5, 25, 255 }, 55, { -5, 110, 235 }, 46 }, // neck to shoulder
     { ENeck, EPart::Trunk, { 0, 0, -10 }, 56, { 10, 0, 95 }, 54 },
@@ -52,25 +52,25 @@ constexpr VFlesh TrunkFlesh[] = {
     { EHead, EPart::Head, { 8, 0, 150 }, 88, { 36, 0, 142 }, 82 },      // skull
     { EHead, EPart::Head, { 112, 0, 100 }, 15, { 105, 0, 128 }, 11 } }; // nose
 constexpr VFlesh ArmFlesh[] = { { ELeftClavicle, EPart::Trunk, { -5, 60, 0 }, 52, { -8, 140, 12 }, 58 },
-                                { ELeftUpperArm, EPart::Arm, { 0, 4, 0 }, 60, { 0, 6, -120 }, 48 },
-                                { ELeftUpperArm, EPart::Arm, { 2, 0, -120 }, 47, { 0, 0, -285 }, 40 },
-                                { ELeftForearm, EPart::Arm, { 0, 0, 0 }, 41, { 0, 4, -80 }, 42 },
-                                { ELeftForearm, EPart::Arm, { 0, 4, -80 }, 41, { 0, 0, -245 }, 29 },
-                                { ELeftHand, EPart::Arm, { 14, 0, -15 }, 25, { 20, -2, -85 }, 23 },
-                                { ELeftHand, EPart::Arm, { -14, 0, -15 }, 25, { -20, -2, -85 }, 22 },
-                                { ELeftHand, EPart::Arm, { 14, -4, -90 }, 22, { 10, -14, -165 }, 17 },
-                                { ELeftHand, EPart::Arm, { -14, -4, -90 }, 22, { -8, -14, -158 }, 16 },
-                                { ELeftHand, EPart::Arm, { 24, 0, -30 }, 20, { 52, -12, -95 }, 17 } }; // thumb
+                                { ELeftUpperArm, EPart::Arm, { 0, 4, 0 }, 57, { 0, 6, -120 }, 46 },
+                                { ELeftUpperArm, EPart::Arm, { 2, 0, -120 }, 45, { 0, 0, -285 }, 38 },
+                                { ELeftForearm, EPart::Arm, { 0, 0, 0 }, 39, { 0, 4, -80 }, 40 },
+                                { ELeftForearm, EPart::Arm, { 0, 4, -80 }, 39, { 0, 0, -245 }, 28 },
+                                { ELeftHand, EPart::Arm, { 14, 0, -15 }, 24, { 20, -2, -85 }, 22 },
+                                { ELeftHand, EPart::Arm, { -14, 0, -15 }, 24, { -20, -2, -85 }, 21 },
+                                { ELeftHand, EPart::Arm, { 14, -4, -90 }, 21, { 10, -14, -165 }, 16 },
+                                { ELeftHand, EPart::Arm, { -14, -4, -90 }, 21, { -8, -14, -158 }, 15 },
+                                { ELeftHand, EPart::Arm, { 24, 0, -30 }, 19, { 52, -12, -95 }, 16 } }; // thumb
 constexpr VFlesh LegFlesh[] = { { ELeftThigh, EPart::Leg, { 0, 10, -20 }, 92, { 4, 2, -200 }, 76 },
-                                { ELeftThigh, EPart::Leg, { 4, 2, -200 }, 76, { 6, 0, -410 }, 55 },
-                                { ELeftShin, EPart::Leg, { 6, 0, -10 }, 55, { 0, 0, -100 }, 52 },
-                                { ELeftShin, EPart::Leg, { -16, 2, -90 }, 50, { -14, 0, -210 }, 46 }, // calf
-                                { ELeftShin, EPart::Leg, { 4, 0, -100 }, 48, { 0, 0, -400 }, 36 },
-                                { ELeftFoot, EPart::Leg, { -20, 0, -45 }, 36, { 0, 0, 0 }, 38 }, // heel
-                                { ELeftFoot, EPart::Leg, { -5, 0, -30 }, 42, { 105, -6, -52 }, 30 },
-                                { ELeftFoot, EPart::Leg, { 20, 12, -52 }, 30, { 112, 22, -58 }, 25 },
-                                { ELeftToes, EPart::Leg, { -12, -14, 6 }, 27, { 58, -12, 0 }, 20 },
-                                { ELeftToes, EPart::Leg, { -16, 20, 4 }, 25, { 38, 20, -1 }, 18 } };
+                                { ELeftThigh, EPart::Leg, { 4, 2, -200 }, 68, { 6, 0, -410 }, 50 },
+                                { ELeftShin, EPart::Leg, { 6, 0, -10 }, 50, { 0, 0, -100 }, 47 },
+                                { ELeftShin, EPart::Leg, { -16, 2, -90 }, 45, { -14, 0, -210 }, 41 }, // calf
+                                { ELeftShin, EPart::Leg, { 4, 0, -100 }, 43, { 0, 0, -400 }, 32 },
+                                { ELeftFoot, EPart::Leg, { -20, 0, -45 }, 34, { 0, 0, 0 }, 36 }, // heel
+                                { ELeftFoot, EPart::Leg, { -5, 0, -30 }, 40, { 105, -6, -52 }, 28 },
+                                { ELeftFoot, EPart::Leg, { 20, 12, -52 }, 28, { 112, 22, -58 }, 24 },
+                                { ELeftToes, EPart::Leg, { -12, -14, 6 }, 26, { 58, -12, 0 }, 19 },
+                                { ELeftToes, EPart::Leg, { -16, 20, 4 }, 24, { 38, 20, -1 }, 17 } };
 
 struct VPiece
 {

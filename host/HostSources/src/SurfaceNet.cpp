@@ -30,9 +30,18 @@ public:
     {
       for ( std::size_t Y = 0; Y < m_Corners[1]; ++Y )
       {
+        // Far outside, the next corners of the row are outside too, however the field falls.
+        double Value = 0;
+        std::size_t Skipped = 0;
         for ( std::size_t X = 0; X < m_Corners[0]; ++X )
         {
-          m_Values.push_back( m_rField( CornerAt( X, Y, Z ) ) );
+          if ( Skipped == 0 )
+          {
+            Value = m_rField( CornerAt( X, Y, Z ) );
+            Skipped = static_cast< std::size_t >( std::max( Value / ( 1.2 * m_Cell ), 1.0 ) );
+          }
+          --Skipped;
+          m_Values.push_back( Value );
         }
       }
     }

@@ -47,43 +47,43 @@ struct VMarkerRow
   double Softness; ///< of what lies between the marker and the bone
 };
 /// From the hips' middle.
-constexpr VMarkerRow TrunkMarkers[] = { { EChest, -58, 0, 560, 0.8 },                                 // C7
-                                        { EChest, -107, 0, 340, 1 },                                  // T10
-                                        { EChest, 75, 0, 505, 0.8 },                                  // CLAV
-                                        { EChest, 118, 0, 360, 1 },                                   // STRN
-                                        { EChest, -107, 90, 470, 1.3 },                               // LBAK
-                                        { EChest, -107, -90, 430, 1.3 }, { EChest, -102, 0, 460, 1 }, // T6
-                                        { EHips, 95, 125, 85, 1.4 },                                  // LASI
-                                        { EHips, 95, -125, 85, 1.4 },                                 // RASI
-                                        { EHips, -100, 50, 95, 1 },                                   // LPSI
-                                        { EHips, -100, -50, 95, 1 },                                  // RPSI
-                                        { EHips, -110, 0, 70, 1 } };                                  // SACR
+constexpr VMarkerRow TrunkMarkers[] = { { EChest, -69, 0, 563, 0.8 },                                // C7
+                                        { EChest, -110, 0, 340, 1 },                                 // T10
+                                        { EChest, 66, 0, 502, 0.8 },                                 // CLAV
+                                        { EChest, 109, 0, 360, 1 },                                  // STRN
+                                        { EChest, -92, 87, 464, 1.3 },                               // LBAK
+                                        { EChest, -105, -89, 429, 1.3 }, { EChest, -95, 0, 458, 1 }, // T6
+                                        { EHips, 83, 117, 84, 1.4 },                                 // LASI
+                                        { EHips, 83, -117, 84, 1.4 },                                // RASI
+                                        { EHips, -111, 51, 97, 1 },                                  // LPSI
+                                        { EHips, -111, -51, 97, 1 },                                 // RPSI
+                                        { EHips, -113, 0, 70, 1 } };                                 // SACR
 /// From the neck's top.
-constexpr VMarkerRow HeadMarkers[] = { { EHead, 103, 72, 190, 0.4 },  // LFHD
-                                       { EHead, 103, -72, 190, 0.4 }, // RFHD
-                                       { EHead, -62, 68, 190, 0.4 },  // LBHD
-                                       { EHead, -62, -68, 190, 0.4 }, // RBHD
-                                       { EHead, 22, 0, 255, 0.4 } };  // ARIEL
+constexpr VMarkerRow HeadMarkers[] = { { EHead, 98, 60, 169, 0.4 },   // LFHD
+                                       { EHead, 98, -60, 169, 0.4 },  // RFHD
+                                       { EHead, -64, 60, 171, 0.4 },  // LBHD
+                                       { EHead, -64, -60, 171, 0.4 }, // RBHD
+                                       { EHead, 21, 0, 246, 0.4 } };  // ARIEL
 /// From the left shoulder; on the right the y axis turns about.
-constexpr VMarkerRow ArmMarkers[] = { { ELeftClavicle, 0, 5, 50, 0.8 },      // SHO
-                                      { ELeftUpperArm, 10, 50, -140, 1.5 },  // UPA
-                                      { ELeftUpperArm, -10, 45, -290, 0.8 }, // ELB
-                                      { ELeftUpperArm, -5, -45, -290, 0.8 }, // IEL
-                                      { ELeftForearm, 15, 40, -420, 1.2 },   // FRM
-                                      { ELeftForearm, 35, 10, -540, 0.6 },   // WRA, on the side of the thumb
-                                      { ELeftForearm, -35, 10, -540, 0.6 },  // WRB
-                                      { ELeftHand, 5, 25, -630, 0.5 },       // FIN
-                                      { ELeftHand, 50, -5, -590, 0.6 } };    // THM
+constexpr VMarkerRow ArmMarkers[] = { { ELeftClavicle, -4, 6, 68, 0.8 },     // SHO
+                                      { ELeftUpperArm, 14, 61, -143, 1.5 },  // UPA
+                                      { ELeftUpperArm, -12, 54, -291, 0.8 }, // ELB
+                                      { ELeftUpperArm, -6, -55, -291, 0.8 }, // IEL
+                                      { ELeftForearm, 16, 45, -421, 1.2 },   // FRM
+                                      { ELeftForearm, 47, 13, -534, 0.6 },   // WRA, on the side of the thumb
+                                      { ELeftForearm, -46, 12, -535, 0.6 },  // WRB
+                                      { ELeftHand, 6, 39, -629, 0.5 },       // FIN
+                                      { ELeftHand, 63, -11, -585, 0.6 } };   // THM
 /// From the floor beneath the left hip joint.
-constexpr VMarkerRow LegMarkers[] = { { ELeftThigh, 20, 80, 690, 2 },  // THI
-                                      { ELeftThigh, 0, 55, 505, 1 },   // KNE
-                                      { ELeftThigh, 0, -55, 505, 1 },  // KNEM
-                                      { ELeftShin, 20, 55, 300, 1.2 }, // TIB
-                                      { ELeftShin, 0, 38, 80, 0.5 },   // ANK
-                                      { ELeftShin, 0, -38, 85, 0.5 },  // ANKM
-                                      { ELeftFoot, -55, 0, 40, 0 },    // HEE
-                                      { ELeftToes, 165, -15, 35, 0 },  // TOE
-                                      { ELeftFoot, 110, 45, 25, 0 } }; // MT5
+constexpr VMarkerRow LegMarkers[] = { { ELeftThigh, 20, 82, 689, 2 },  // THI
+                                      { ELeftThigh, -3, 65, 505, 1 },  // KNE
+                                      { ELeftThigh, -4, -66, 507, 1 }, // KNEM
+                                      { ELeftShin, 18, 51, 300, 1.2 }, // TIB
+                                      { ELeftShin, 0, 52, 82, 0.5 },   // ANK
+                                      { ELeftShin, -4, -54, 90, 0.5 }, // ANKM
+                                      { ELeftFoot, -66, 0, 41, 0 },    // HEE
+                                      { ELeftToes, 168, -22, 48, 0 },  // TOE
+                                      { ELeftFoot, 107, 62, 33, 0 } }; // MT5
 
 } // namespace
 

@@ -82,7 +82,7 @@ TEST( PerformerMesh, BodiesAreClosedSmoothAndHeldByTheBonesOfTheirSkeleton )
       const auto Back = Edges.find( { rEdge.second, rEdge.first } );
       ASSERT_TRUE( Back != Edges.end() && Back->second == Count ) << "an open edge";
     }
-    EXPECT_NEAR( Volume / 1e6, Which == EPerformerMesh::Performer ? 75 : 42, 15 ) << "litres";
+    EXPECT_NEAR( Volume / 1e6, Which == EPerformerMesh::Performer ? 66 : 35, 8 ) << "litres";
     EXPECT_LT( Inward / 2e6, 0.01 ) << "square metres whose normals point the wrong way";
     for ( std::size_t Vertex = 0; Vertex < Mesh.Positions.size(); ++Vertex )
     {
@@ -113,7 +113,7 @@ TEST( PerformerMesh, BodiesAreClosedSmoothAndHeldByTheBonesOfTheirSkeleton )
       {
         Nearest = std::min( Nearest, Length( rSkin - Place ) );
       }
-      EXPECT_LT( Nearest, 40 ) << rMarker.Name << " sits on the skin";
+      EXPECT_LT( Nearest, 25 ) << rMarker.Name << " sits on the skin";
     }
   }
 }

@@ -196,7 +196,7 @@ TEST( SimulatedSubjects, EveryItemAgreesWithItsSkeletonAndSolvedMarkersWithLabel
 TEST( SimulatedSubjects, FaultsOfLabelsComeAndGoTheSameWayInAnyOrder )
 {
   const VSimulatedCaptureOptions Options{
-      .Performers = 2, .GapProbability = 0.02, .SwapProbability = 0.05, .bSolving = true };
+      .Cameras = 0, .Performers = 2, .GapProbability = 0.02, .SwapProbability = 0.05, .bSolving = true };
   VSimulatedCapture First( Options ), Second( Options );
   std::map< std::int64_t, std::vector< double > > Rows;
   std::size_t Swapped = 0, Sick = 0, Longest = 0;
