@@ -103,6 +103,10 @@ void AddCommon( CLI::App& io_rApp, VCommonOptions& o_rCommon )
   io_rApp.add_option( "--rate", o_rCommon.Simulated.RateHz, "Frames of the simulated capture in a second" )
       ->check( CLI::Range( 25.0, 1000.0 ) )
       ->capture_default_str();
+  io_rApp.add_flag( "--solving", o_rCommon.Simulated.bSolving,
+                    "A second, fuller skeleton of each simulated performer, as for solving" );
+  io_rApp.add_flag( "--retargeting", o_rCommon.Simulated.bRetargeting,
+                    "A character of other proportions that each simulated performer drives" );
   io_rApp
       .add_option( "--world-axes", o_rCommon.Reading.WorldAxes,
                    "How the axes of a folder's 3D points become those of its cameras, such as zxy or x-zy" )
