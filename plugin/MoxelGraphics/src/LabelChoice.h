@@ -26,12 +26,13 @@ struct VLabelCandidate
 class VLabelChoice
 {
 public:
-  /// Orders the candidates, and marks those that are chosen.
+  /// Marks those that are chosen, as many as the limit allows.
   void Choose( std::vector< VLabelCandidate >& io_rCandidates, int i_Limit, QSize i_Viewport );
 
 private:
   bool Take( const VLabelCandidate& i_rCandidate );
 
+  std::vector< std::uint64_t > m_Order; ///< rank, distance and place of each candidate
   int m_Columns = 0, m_Rows = 0;
   std::vector< std::uint8_t > m_Taken; ///< by cell of the viewport
 };

@@ -126,31 +126,25 @@ const VGlyphSheet::VCell& VGlyphSheet::CellOf( const QRawFont& i_rFont, quint64 
 {
   const quint64 Key = i_FontKey << 32 | i_Glyph;
   const auto Found = m_Cells.constFind( Key );
-  return Found != m_Cells.constEnd() ? *Found : *m_Cells.insert( Key, Draw( i_rFont, i_Glyph ) );
+  if ( Found != m_Cells.constEnd() )
+  {
+    return *Found;
+  }
+  QPoint TopLeft;
+  const QImage Image = Draw( i_rFont, i_Glyph, TopLeft );
+  return *m_Cells.insert( Key, Keep( Image, TopLeft ) );
 }
 
-VGlyphSheet::VCell VGlyphSheet::Draw( const QRawFont& i_rFont, quint32 i_Glyph )
+QImage VGlyphSheet::Draw( const QRawFont& i_rFont, quint32 i_Glyph, QPoint& o_rTopLeft ) const
 {
   const QRectF Bounds = i_rFont.boundingRect( i_Glyph );
-  VCell Cell;
   if ( !( Bounds.width() > 0 ) || !( Bounds.height() > 0 ) || Bounds.width() > 8 * m_Pixels ||
        Bounds.height() > 8 * m_Pixels )
   {
-    return Cell; // a space, or what no font means
+    return {}; // a space, or what no font means
   }
-  // What antialiasing adds to the bounds, and the soft edge.
-  const int Rim = m_Soft + 2;
-  const int Left = static_cast< int >( std::floor( Bounds.left() ) ) - Rim;
-  const int Top = static_cast< int >( std::floor( Bounds.top() ) ) - Rim;
-  const int Width = static_cast< int >( std::ceil( Bounds.right() ) ) + Rim - Left;
-  const int Height = static_cast< int >( std::ceil( Bounds.bottom() ) ) + Rim - Top;
-  if ( !Reserve( Width, Height, Cell ) )
-  {
-    return Cell;
-  }
-  Cell.Left = Short( Left );
-  Cell.Top = Short( Top );
-  QImage Image( Width, Height, QImage::Format_ARGB32_Premultiplied );
+  const QRect Room = Bounds.toAlignedRect().adjusted( -2, -2, 2, 2 ); // for what antialiasing adds
+  QImage Image( Room.size(), QImage::Format_ARGB32_Premultiplied );
   Image.fill( Qt::transparent );
   QPainter Painter( &Image );
   Painter.setRenderHint( QPainter::TextAntialiasing );
@@ -159,9 +153,31 @@ VGlyphSheet::VCell VGlyphSheet::Draw( const QRawFont& i_rFont, quint32 i_Glyph )
   Run.setRawFont( i_rFont );
   Run.setGlyphIndexes( { i_Glyph } );
   Run.setPositions( { QPointF( 0, 0 ) } );
-  Painter.drawGlyphRun( QPointF( -Left, -Top ), Run );
+  Painter.drawGlyphRun( -Room.topLeft(), Run );
   Painter.end();
-  Copy( Image, Cell );
+  o_rTopLeft = Room.topLeft();
+  return Image;
+}
+
+/// Cuts off what is empty: every pixel of a cell is drawn for each letter that shows it.
+VGlyphSheet::VCell VGlyphSheet::Keep( const QImage& i_rImage, QPoint i_TopLeft )
+{
+  QRect Ink;
+  for ( int Y = 0; Y < i_rImage.height(); ++Y )
+  {
+    for ( int X = 0; X < i_rImage.width(); ++X )
+    {
+      Ink |= qAlpha( i_rImage.pixel( X, Y ) ) != 0 ? QRect( X, Y, 1, 1 ) : QRect();
+    }
+  }
+  VCell Cell;
+  const QRect Whole = Ink.adjusted( -m_Soft, -m_Soft, m_Soft, m_Soft );
+  if ( !Ink.isEmpty() && Reserve( Whole.width(), Whole.height(), Cell ) )
+  {
+    Cell.Left = Short( i_TopLeft.x() + Whole.left() );
+    Cell.Top = Short( i_TopLeft.y() + Whole.top() );
+    Copy( i_rImage.copy( Whole ), Cell ); // beyond its rims an image is transparent
+  }
   return Cell;
 }
 

@@ -3,6 +3,7 @@
 #include "VTexture.h"
 
 #include <QtCore/QHash>
+#include <QtCore/QPoint>
 #include <QtCore/QString>
 #include <QtGui/QFont>
 
@@ -11,6 +12,7 @@
 #include <vector>
 
 class QGlyphRun;
+class QImage;
 class QRawFont;
 
 namespace CoreGraphics
@@ -66,9 +68,10 @@ private:
   QString Prepare( const std::string& i_rText, const QFont& i_rFont ) const;
   void Place( const QGlyphRun& i_rRun, double i_Baseline );
   const VCell& CellOf( const QRawFont& i_rFont, quint64 i_FontKey, quint32 i_Glyph );
-  VCell Draw( const QRawFont& i_rFont, quint32 i_Glyph );
+  QImage Draw( const QRawFont& i_rFont, quint32 i_Glyph, QPoint& o_rTopLeft ) const;
+  VCell Keep( const QImage& i_rImage, QPoint i_TopLeft );
   bool Reserve( int i_Width, int i_Height, VCell& o_rCell );
-  void Copy( const class QImage& i_rImage, const VCell& i_rCell );
+  void Copy( const QImage& i_rImage, const VCell& i_rCell );
 
   const int m_Pixels;
   const int m_Soft; ///< width of the soft edge

@@ -5,7 +5,7 @@
 
 #include <CoreGraphics/VRenderContext.h>
 #include <CoreGraphics/VResources.h>
-#include <CoreGraphics/VTexelBuffer.h>
+#include <CoreGraphics/VVertexBuffer.h>
 
 #include <algorithm>
 #include <chrono>
@@ -18,7 +18,6 @@ namespace
 using namespace CoreGraphics;
 
 constexpr int SheetUnit = 0;
-constexpr int TableUnit = 1;
 constexpr int SmallestPixels = 6, LargestPixels = 128;
 constexpr std::size_t MostSheets = 3;
 
@@ -28,21 +27,19 @@ constexpr double LongestPause = 1.0;
 /// The part of the distance in which labels fade.
 constexpr float FadingPart = 0.15f;
 
-const QVector4D MarkedColour( 1.0F, 0.62F, 0.25F, 1.0F );
+constexpr std::uint32_t MarkedColour = 0xFF409EFF; // 0xAABBGGRR
 
 struct VGlyphInstance
 {
   std::int16_t Place[4];
   std::uint16_t Sheet[2];
   std::uint32_t Colour;
-  float Row;
 };
 const VVertexLayout GlyphLayout( sizeof( VGlyphInstance ), 1,
                                  { { EAttributePosition, 4, GL_SHORT, false, 0 },
                                    { EAttributeUV, 2, GL_UNSIGNED_SHORT, false, 8 },
-                                   { EAttributeColour, 4, GL_UNSIGNED_BYTE, true, 12 },
-                                   { EAttributeTile, 1, GL_FLOAT, false, 16 } } );
-static_assert( sizeof( VGlyphInstance ) == 20 );
+                                   { EAttributeColour, 4, GL_UNSIGNED_BYTE, true, 12 } } );
+static_assert( sizeof( VGlyphInstance ) == 16 );
 
 double SteadySeconds()
 {
@@ -90,21 +87,18 @@ struct VLabelBatch::VView
   bool bFading = false;
   VLabelChoice Choice;
   std::vector< VLabelCandidate > Candidates;
-  std::vector< float > Strengths;     ///< by label
-  std::vector< std::uint32_t > Shown; ///< labels, ascending
-  std::vector< std::uint32_t > Written, Order;
-  std::vector< std::array< float, 4 > > Rows; ///< by place in `Shown`
-  bool bGlyphs = false, bTable = false;       ///< the buffers hold what is shown
+  std::vector< float > Strengths; ///< by label
+  std::vector< VLabelCandidate > Shown;
+  bool bWritten = false; ///< the buffer holds what is shown
   int Instances = 0;
   VDynamicBuffer Glyphs;
-  VTexelBuffer Table{ ETexelFloats };
 };
 
 struct VLabelBatch::VGl
 {
   std::shared_ptr< VShaderProgram > pProgram;
   VRenderState State;
-  VUniform Sheet{ "t_Texture" }, Table{ "t_Labels" }, Marked{ "u_MarkedColour" };
+  VUniform Sheet{ "t_Texture" };
 };
 
 VLabelBatch::VLabelBatch( std::shared_ptr< CoreGraphics::VResources > i_pResources )
@@ -255,16 +249,10 @@ void VLabelBatch::Choose( CoreGraphics::VRenderContext& io_rContext, VView& io_r
 
 void VLabelBatch::Fade( VView& io_rView, float i_Step ) const
 {
-  std::sort( io_rView.Candidates.begin(), io_rView.Candidates.end(),
-             []( const VLabelCandidate& i_rA, const VLabelCandidate& i_rB )
-             {
-               return i_rA.Label < i_rB.Label;
-             } );
   io_rView.bFading = false;
   io_rView.Shown.clear();
-  io_rView.Rows.clear();
   std::size_t Next = 0;
-  for ( const VLabelCandidate& rCandidate : io_rView.Candidates )
+  for ( VLabelCandidate& rCandidate : io_rView.Candidates )
   {
     for ( ; Next < rCandidate.Label; ++Next )
     {
@@ -276,64 +264,45 @@ void VLabelBatch::Fade( VView& io_rView, float i_Step ) const
     io_rView.bFading = io_rView.bFading || rStrength != Goal;
     if ( rStrength > 0 )
     {
-      io_rView.Shown.push_back( rCandidate.Label );
-      io_rView.Rows.push_back(
-          { rCandidate.X, rCandidate.Y, rStrength, m_Points[rCandidate.Label].bMarked ? 1.0F : 0.0F } );
+      rCandidate.Strength = rStrength;
+      io_rView.Shown.push_back( rCandidate );
     }
   }
   std::fill( io_rView.Strengths.begin() + static_cast< std::ptrdiff_t >( Next ), io_rView.Strengths.end(), 0.0F );
 }
 
-bool VLabelBatch::WriteGlyphs( VView& io_rView, VSheet& io_rSheet ) const
+bool VLabelBatch::Write( VView& io_rView, const VSheet& i_rSheet ) const
 {
   std::size_t Count = 0;
-  for ( const std::uint32_t Label : io_rView.Shown )
+  for ( const VLabelCandidate& rShown : io_rView.Shown )
   {
-    Count += io_rSheet.Layouts[Label].Count;
+    Count += i_rSheet.Layouts[rShown.Label].Count;
   }
   auto* pInstance = static_cast< VGlyphInstance* >( io_rView.Glyphs.Map( Count * sizeof( VGlyphInstance ) ) );
   if ( !pInstance )
   {
     return false;
   }
-  for ( std::size_t Row = 0; Row < io_rView.Shown.size(); ++Row )
+  for ( const VLabelCandidate& rShown : io_rView.Shown )
   {
-    const std::size_t Label = io_rView.Shown[Row];
-    const VTextLayout& rLayout = io_rSheet.Layouts[Label];
-    const VPlacedGlyph* const pGlyphs = io_rSheet.Glyphs.Glyphs( rLayout );
-    const int X = io_rSheet.OffsetX( Label, m_Texts[Label].Place ), Y = io_rSheet.OffsetY( m_Texts[Label].Place );
-    for ( std::uint32_t Index = 0; Index < rLayout.Count; ++Index )
+    const VTextLayout& rLayout = i_rSheet.Layouts[rShown.Label];
+    const VLabelText& rText = m_Texts[rShown.Label];
+    const std::uint32_t Own = m_Points[rShown.Label].bMarked ? MarkedColour : rText.Colour;
+    const std::uint32_t Colour = ( Own & 0xFFFFFF ) | static_cast< std::uint32_t >( rShown.Strength * 255 ) << 24;
+    const int X = static_cast< int >( rShown.X ) + i_rSheet.OffsetX( rShown.Label, rText.Place );
+    const int Y = static_cast< int >( rShown.Y ) - i_rSheet.OffsetY( rText.Place );
+    const VPlacedGlyph* pGlyph = i_rSheet.Glyphs.Glyphs( rLayout );
+    for ( const VPlacedGlyph* const pEnd = pGlyph + rLayout.Count; pGlyph != pEnd; ++pGlyph )
     {
-      const VPlacedGlyph& rGlyph = pGlyphs[Index];
-      *pInstance++ = { { static_cast< std::int16_t >( rGlyph.X + X ), static_cast< std::int16_t >( rGlyph.Y + Y ),
-                         rGlyph.Width, rGlyph.Height },
-                       { static_cast< std::uint16_t >( rGlyph.SheetX ), static_cast< std::uint16_t >( rGlyph.SheetY ) },
-                       m_Texts[Label].Colour,
-                       static_cast< float >( Row ) };
+      *pInstance++ = {
+          { static_cast< std::int16_t >( X + pGlyph->X ), static_cast< std::int16_t >( Y - pGlyph->Y ), pGlyph->Width,
+            pGlyph->Height },
+          { static_cast< std::uint16_t >( pGlyph->SheetX ), static_cast< std::uint16_t >( pGlyph->SheetY ) },
+          Colour };
     }
   }
   io_rView.Instances = static_cast< int >( Count );
   return io_rView.Glyphs.Unmap();
-}
-
-bool VLabelBatch::Feed( CoreGraphics::VRenderContext& io_rContext, VView& io_rView, VSheet& io_rSheet ) const
-{
-  if ( !io_rView.bGlyphs || io_rView.Written != io_rView.Shown || !io_rView.Glyphs.Bind() )
-  {
-    io_rView.bGlyphs = WriteGlyphs( io_rView, io_rSheet );
-    io_rView.Written.assign( io_rView.Shown.begin(), io_rView.Shown.end() );
-  }
-  if ( !io_rView.bTable || !io_rView.Table.Bind( io_rContext, TableUnit ) )
-  {
-    void* const pRows = io_rView.Table.Map( io_rContext, io_rView.Rows.size() * sizeof( io_rView.Rows[0] ), false );
-    if ( !pRows )
-    {
-      return false;
-    }
-    std::copy( io_rView.Rows.begin(), io_rView.Rows.end(), static_cast< std::array< float, 4 >* >( pRows ) );
-    io_rView.bTable = io_rView.Table.Unmap( io_rContext ) && io_rView.Table.Bind( io_rContext, TableUnit );
-  }
-  return io_rView.bGlyphs && io_rView.bTable && io_rSheet.Glyphs.Bind( io_rContext, SheetUnit );
 }
 
 void VLabelBatch::Draw( CoreGraphics::VRenderContext& io_rContext, const VLabelStyle& i_rStyle, bool i_bSettled )
@@ -359,23 +328,26 @@ void VLabelBatch::Draw( CoreGraphics::VRenderContext& io_rContext, const VLabelS
     if ( bAnew )
     {
       rView.Strengths.assign( m_Texts.size(), 0 );
-      rView.bGlyphs = false;
     }
     rView.Key = Key;
-    rView.bTable = false;
+    rView.bWritten = false;
     Choose( io_rContext, rView, rSheet, i_rStyle );
     Fade( rView, bAtOnce ? 1.0F : static_cast< float >( Passed ) / FadeSeconds );
   }
   rView.Time = m_Clock();
-  if ( rView.Shown.empty() || !Feed( io_rContext, rView, rSheet ) || !io_rContext.UseProgram( m_pGl->pProgram ) ||
+  if ( rView.Shown.empty() )
+  {
+    return;
+  }
+  // A second try is for a buffer that died with its windows.
+  rView.bWritten = ( rView.bWritten && rView.Glyphs.Bind() ) || Write( rView, rSheet );
+  if ( !rView.bWritten || !rSheet.Glyphs.Bind( io_rContext, SheetUnit ) || !io_rContext.UseProgram( m_pGl->pProgram ) ||
        !io_rContext.SetVertexBuffer( { &rView.Glyphs, &GlyphLayout, 0 } ) )
   {
     return;
   }
   io_rContext.SetRenderState( m_pGl->State );
   m_pGl->Sheet.Set( *m_pGl->pProgram, SheetUnit );
-  m_pGl->Table.Set( *m_pGl->pProgram, TableUnit );
-  m_pGl->Marked.Set( *m_pGl->pProgram, MarkedColour );
   io_rContext.DrawArraysInstanced( GL_TRIANGLE_STRIP, 4, rView.Instances );
 }
 

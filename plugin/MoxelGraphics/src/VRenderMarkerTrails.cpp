@@ -16,9 +16,9 @@ constexpr float Width = 1.75F; // item pixels
 
 // Every place is the start of a stretch to the next one: the same buffer, read twice.
 const VVertexLayout StartLayout( sizeof( VTrailPoint ), 1,
-                                 { { EAttributeReconPosAndSize, 4, GL_FLOAT, false, 0 },
+                                 { { EAttributeStickA, 4, GL_FLOAT, false, 0 },
                                    { EAttributeModelColour, 4, GL_UNSIGNED_BYTE, true, 16 } } );
-const VVertexLayout EndLayout( sizeof( VTrailPoint ), 1, { { EAttributeTargetPosAndSize, 4, GL_FLOAT, false, 0 } } );
+const VVertexLayout EndLayout( sizeof( VTrailPoint ), 1, { { EAttributeStickB, 4, GL_FLOAT, false, 0 } } );
 static_assert( sizeof( VTrailPoint ) == 20 );
 
 constexpr float Ribbon[] = { 0, -1, 0, 0, 1, 0, 1, -1, 0, 1, 1, 0 };

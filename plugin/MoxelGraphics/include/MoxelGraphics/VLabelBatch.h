@@ -3,11 +3,11 @@
 // Many short texts in the picture, each beside or above a point of the world, in one draw.
 //
 // A text is laid out once for each size that a view asks for; its glyphs lie in one texture, drawn at the very pixels
-// of that size, so that they are as crisp as any other text on that screen. What a frame costs is one place in pixels
-// a label that is shown. Which labels are shown is chosen for each view: the nearest, as many as the limit allows, that
-// do not cover one another. What is no longer chosen fades out and what is chosen anew fades in, so that nothing
-// flickers while two change places; the first frame of a view, and the first after something was set otherwise, shows
-// the final state at once.
+// of that size, so that they are as crisp as any other text on that screen. A frame in which something moved writes 16
+// bytes a letter that is shown, any other frame nothing. Which labels are shown is chosen for each view: the nearest,
+// as many as the limit allows, that do not cover one another. What is no longer chosen fades out and what is chosen
+// anew fades in, so that nothing flickers while two change places; the first frame of a view, and the first after
+// something was set otherwise, shows the final state at once.
 
 #include <cstdint>
 #include <functional>
@@ -97,8 +97,7 @@ private:
                const VLabelStyle& i_rStyle ) const;
   bool IsWanted( std::size_t i_Label, std::uint32_t i_Switches ) const;
   void Fade( VView& io_rView, float i_Step ) const;
-  bool Feed( CoreGraphics::VRenderContext& io_rContext, VView& io_rView, VSheet& io_rSheet ) const;
-  bool WriteGlyphs( VView& io_rView, VSheet& io_rSheet ) const;
+  bool Write( VView& io_rView, const VSheet& i_rSheet ) const;
 
   std::vector< VLabelText > m_Texts;
   std::vector< VLabelPoint > m_Points;
