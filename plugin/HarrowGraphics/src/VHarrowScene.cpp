@@ -75,6 +75,14 @@ void VHarrowScene::OnPlaybackChanged()
   }
 }
 
+void VHarrowScene::FetchAround( const ZEK::VFlowTimeRange& i_rRange, std::vector< ZEK::VFlowStateRef >& o_rStates )
+{
+  if ( !m_pCache || !m_pCache->FetchMany( i_rRange, o_rStates, 0 ) )
+  {
+    o_rStates.clear();
+  }
+}
+
 ZEK::VFlowStateRef VHarrowScene::FetchState()
 {
   ZEK::VFlowStateRef State;
