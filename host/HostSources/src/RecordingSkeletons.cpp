@@ -40,7 +40,7 @@ void FillMarkerColours( const VSubject& i_rSubject, VSubjectApplicationData& o_r
 {
   for ( std::size_t Index = 0; Index < i_rSubject.Markers.size(); ++Index )
   {
-    o_rLook.MarkerColours.push_back( MarkerColour( i_rSubject.Id, Index ) );
+    o_rLook.MarkerColours.push_back( MarkerColour( i_rSubject.Id - 1, Index ) );
   }
 }
 
