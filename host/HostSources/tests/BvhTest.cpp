@@ -1,6 +1,7 @@
 #include "ReadHelpers.h"
 #include "RecordingPlayer.h"
 
+#include <ComputeSubjectFK/VComputeSubjectFK.h>
 #include <HostSources/VBvhReader.h>
 
 #include <cmath>
@@ -76,6 +77,41 @@ TEST( Bvh, JointsStandWhereTheHierarchyAndTheRowsPutThem )
   ASSERT_EQ( rStructure.Poses.size(), 2u );
   EXPECT_EQ( rStructure.Poses[1], Player.Value< FlowSubjectDynamicParameters >().JointState );
   EXPECT_EQ( rStructure.Poses[0].size(), 9u );
+  // Those poses are z up, the recording is y up.
+  const auto pTurned = ComputeSubject::VComputeSubjectFK::Build( rStructure.Base );
+  ASSERT_TRUE( pTurned->LoadState( rStructure.Poses[1] ).IsOk() );
+  const auto& rFirst = Player.Value< FlowSubjectDynamicParameters >().Segments;
+  for ( std::size_t Index = 0; Index < rFirst.size(); ++Index )
+  {
+    const double* const pPlace = pTurned->WorldTransforms()[Index].m_Translation;
+    EXPECT_NEAR( pPlace[0], rFirst[Index].T[0], 1e-9 );
+    EXPECT_NEAR( pPlace[1], -rFirst[Index].T[2], 1e-9 );
+    EXPECT_NEAR( pPlace[2], rFirst[Index].T[1], 1e-9 );
+  }
+}
+
+TEST( Bvh, AStateOfZerosIsTheFigureAsItIsDrawnUp )
+{
+  VOutcome Outcome = Read( "HIERARCHY\nROOT A\n{\nOFFSET 0 90 0\nCHANNELS 3 Xposition Yposition Zposition\n"
+                           "JOINT B\n{\nOFFSET 10 20 0\nCHANNELS 3 Xposition Yposition Zposition\n"
+                           "End Site\n{\nOFFSET 0 5 0\n}\n}\n}\n"
+                           "MOTION\nFrames: 1\nFrame Time: 0.1\n1 2 3 4 5 6\n" );
+  ASSERT_EQ( Outcome.Result, Ok ) << Outcome.Message;
+  const VRecordingSkeleton& rSkeleton = Outcome.Recording.Skeletons.at( 0 );
+  const auto pSubject = ComputeSubject::VComputeSubjectFK::Build( rSkeleton.Subject );
+  const auto ExpectPlace = [&]( std::size_t i_Joint, double i_X, double i_Y, double i_Z )
+  {
+    const double* const pPlace = pSubject->WorldTransforms()[i_Joint].m_Translation;
+    EXPECT_NEAR( pPlace[0], i_X, 1e-9 );
+    EXPECT_NEAR( pPlace[1], i_Y, 1e-9 );
+    EXPECT_NEAR( pPlace[2], i_Z, 1e-9 );
+  };
+  ASSERT_TRUE( pSubject->LoadState( std::vector< double >( rSkeleton.StateSize ) ).IsOk() );
+  const double Unit = pSubject->WorldTransforms()[0].m_Translation[1] / 90; // the reader guesses it
+  ExpectPlace( 1, 10 * Unit, 110 * Unit, 0 );
+  ASSERT_TRUE( pSubject->LoadState( rSkeleton.State( 0 ) ).IsOk() );
+  ExpectPlace( 0, 1 * Unit, 2 * Unit, 3 * Unit );
+  ExpectPlace( 1, 5 * Unit, 7 * Unit, 9 * Unit );
 }
 
 TEST( Bvh, RealFilesAgreeWithTheirFigures )
