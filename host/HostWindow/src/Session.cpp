@@ -1,9 +1,14 @@
 #include <HostWindow/Session.h>
 
+#include "PerformerMeshes.h"
+
+#include <CoreMoxelTypes/FlowTypes.h>
+#include <HostMeshes/ReadMesh.h>
 #include <HostQml/Modules.h>
 
 #include <QtCore/QString>
 
+#include <algorithm>
 #include <cmath>
 
 namespace HostWindow
@@ -48,9 +53,11 @@ HostServices::VHostOptions HostOptions( const VCommonOptions& i_rOptions )
 
 VSession::VSession( const VCommonOptions& i_rOptions )
   : m_Options( i_rOptions )
+  , m_pMeshes( std::make_shared< HostMeshes::VMeshCache >( HostMeshes::FindMeshReader() ) )
 {
   StartLog( i_rOptions.LogLevel );
   m_pHost = std::make_unique< HostServices::VHost >( HostOptions( i_rOptions ) );
+  m_pHost->SetMeshCache( m_pMeshes );
   HostQml::RegisterModules( *m_pHost );
   m_UpChoice = i_rOptions.Up;
   m_FrameConnection = Clock().FrameChanged().Connect(
@@ -130,6 +137,7 @@ void VSession::GoLive()
   m_bLive = true;
   if ( !m_pLive )
   {
+    AddPerformerMeshes( m_Options.Simulated, *m_pMeshes );
     m_pLive = std::make_shared< HostSources::VSimulatedCapture >( m_Options.Simulated );
     m_pLivePump =
         std::make_unique< HostSources::VSourcePump >( m_pLive, m_pHost->Contexts()->LiveCache(), Maker( LiveClock ) );
@@ -262,6 +270,29 @@ std::int64_t VSession::ShownFrame() const
   return m_LastShown;
 }
 
+namespace
+{
+/// What lies around a frame, for views that show where markers were and will be. Video is left alone: it would have to
+/// be decoded frame by frame.
+void AddAround( HostSources::IFrameSource& io_rSource, const HostSources::VStateMaker& i_rMaker,
+                const ZEK::IFlowState& i_rState, std::int64_t i_Index, ZEK::IFlowWritableStateCache& io_rCache )
+{
+  constexpr std::int64_t FramesAround = 60;
+  ZEK::VFlowItemRef Video;
+  i_rState.FindItem( Video, ZEK::FlowTag< CoreMoxelTypes::FlowVideoFrame >, ZEK::EFlowTimeMatch::Overlap );
+  const std::int64_t First = std::max< std::int64_t >( i_Index - FramesAround, 0 );
+  const std::int64_t End = std::min( i_Index + FramesAround + 1, io_rSource.FrameCount() );
+  for ( std::int64_t Index = First; !Video && Index < End; ++Index )
+  {
+    ZEK::VFlowStateRef State;
+    if ( Index != i_Index && io_rSource.MakeState( Index, i_rMaker, State ).IsOk() )
+    {
+      (void)io_rCache.Add( State );
+    }
+  }
+}
+} // namespace
+
 ZEK::IResult VSession::ShowStill( double i_Seconds, std::int64_t& o_rIndex )
 {
   // No pump may put another frame after this one.
@@ -290,6 +321,10 @@ ZEK::IResult VSession::ShowStill( double i_Seconds, std::int64_t& o_rIndex )
     Clock().SeekFrame( o_rIndex );
   }
   m_Still = o_rIndex;
+  if ( !m_bLive )
+  {
+    AddAround( *pSource, Maker( PlaybackClock ), *State, o_rIndex, *rpCache );
+  }
   return rpCache->Add( State );
 }
 

@@ -152,6 +152,53 @@ void VViewMenu::AddToggles()
   AddToggle( tr( "&Recorded Radius" ), Qt::Key_R, "ReconstructedRadius" );
   AddToggle( tr( "Residual &Colours" ), Qt::Key_C, "ReconstructionResiduals" );
   AddToggle( tr( "Camera Contri&butions" ), Qt::Key_B, "ContributionsType", AllContributions, 0 );
+  addSeparator();
+  AddNames();
+}
+
+void VViewMenu::AddNames()
+{
+  AddToggle( tr( "&Names" ), Qt::Key_N, "SubjectNames" );
+  AddToggle( tr( "Mar&ker Names" ), Qt::Key_K, "MarkerNames" );
+  AddChoices( tr( "Si&ze of Names" ), { { tr( "Small" ), { { "LabelSize", 11 } } },
+                                        { tr( "Normal" ), { { "LabelSize", 13 } } },
+                                        { tr( "Large" ), { { "LabelSize", 18 } } },
+                                        { tr( "Huge" ), { { "LabelSize", 26 } } } } );
+  AddChoices( tr( "N&umber of Names" ), { { tr( "The 50 Nearest" ), { { "LabelLimit", 50 } } },
+                                          { tr( "The 150 Nearest" ), { { "LabelLimit", 150 } } },
+                                          { tr( "The 1000 Nearest" ), { { "LabelLimit", 1000 } } } } );
+  AddChoices( tr( "&Distance of Names" ), { { tr( "Up to 5 m" ), { { "LabelDistance", 5000 } } },
+                                            { tr( "Up to 20 m" ), { { "LabelDistance", 20000 } } },
+                                            { tr( "However Far" ), { { "LabelDistance", 0 } } } } );
+  AddToggle( tr( "Marker Trail&s" ), Qt::Key_J, "MarkerTrails" );
+  const auto Length = []( int i_Length, int i_Unit )
+  {
+    return QVariantMap{ { "trialLengthPast", i_Length }, { "trialLengthFuture", i_Length }, { "TrailUnit", i_Unit } };
+  };
+  AddChoices( tr( "&Length of Trails" ), { { tr( "10 Frames to Each Side" ), Length( 10, 0 ) },
+                                           { tr( "30 Frames to Each Side" ), Length( 30, 0 ) },
+                                           { tr( "100 Frames to Each Side" ), Length( 100, 0 ) },
+                                           { tr( "1 Second to Each Side" ), Length( 1, 1 ) },
+                                           { tr( "2 Seconds to Each Side" ), Length( 2, 1 ) },
+                                           { tr( "5 Seconds to Each Side" ), Length( 5, 1 ) } } );
+  AddToggle( tr( "Ring about the Current &Marker" ), Qt::Key_A, "ActiveLabelHalo" );
+}
+
+void VViewMenu::AddChoices( const QString& i_rTitle, const QList< std::pair< QString, QVariantMap > >& i_rChoices )
+{
+  QMenu* const pMenu = addMenu( i_rTitle );
+  m_ForView << pMenu->menuAction();
+  for ( const auto& [Text, Options] : i_rChoices )
+  {
+    const qsizetype Index = m_Choices.size();
+    QAction* const pAction = pMenu->addAction( Text, this,
+                                               [this, Index]
+                                               {
+                                                 Choose( m_Choices[Index] );
+                                               } );
+    pAction->setCheckable( true );
+    m_Choices.push_back( { pAction, Options } );
+  }
 }
 
 void VViewMenu::AddCameraToggles()
@@ -226,6 +273,19 @@ void VViewMenu::Toggle( const VToggle& i_rToggle )
   Refresh();
 }
 
+void VViewMenu::Choose( const VChoice& i_rChoice )
+{
+  if ( VWorkspaceDock* const pDock = m_ActiveDock() )
+  {
+    VSceneView View = pDock->View();
+    for ( auto It = i_rChoice.Options.begin(); It != i_rChoice.Options.end(); ++It )
+    {
+      View.SetOption( It.key(), It.value() );
+    }
+  }
+  Refresh();
+}
+
 void VViewMenu::Refresh()
 {
   VWorkspaceDock* const pDock = m_ActiveDock();
@@ -255,6 +315,17 @@ void VViewMenu::Refresh()
     const bool bKnown = Keys.contains( rToggle.Key );
     rToggle.pAction->setEnabled( bKnown );
     rToggle.pAction->setChecked( bKnown && IsOn( View.Option( rToggle.Key ) ) );
+  }
+  for ( const VChoice& rChoice : m_Choices )
+  {
+    bool bKnown = true, bChosen = true;
+    for ( auto It = rChoice.Options.begin(); It != rChoice.Options.end(); ++It )
+    {
+      bKnown = bKnown && Keys.contains( It.key() );
+      bChosen = bChosen && bKnown && View.Option( It.key() ).toDouble() == It.value().toDouble();
+    }
+    rChoice.pAction->setEnabled( bKnown );
+    rChoice.pAction->setChecked( bChosen );
   }
 }
 

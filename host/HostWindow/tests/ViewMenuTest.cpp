@@ -207,6 +207,19 @@ TEST_F( ViewMenu, ShowsTheTrueStateOfTheActiveViewAndChangesIt )
   Action( "Camera Contributions" ).trigger();
   EXPECT_EQ( Fake().pItem->Map.value( "ContributionsType" ), QVariant( 0 ) );
 
+  // A choice sets all that it stands for, the unit of a length with the length.
+  QMenu* const pLengths = Action( "Length of Trails" ).menu();
+  EXPECT_FALSE( pLengths->actions()[4]->isEnabled() ) << "a view without these options";
+  for ( const char* pKey : { "trialLengthPast", "trialLengthFuture", "TrailUnit" } )
+  {
+    Fake().pItem->Map.insert( pKey, 2 );
+  }
+  m_pMenu->Refresh();
+  EXPECT_FALSE( pLengths->actions()[4]->isChecked() );
+  pLengths->actions()[4]->trigger();
+  EXPECT_TRUE( pLengths->actions()[4]->isChecked() );
+  EXPECT_EQ( Fake().pItem->Map.value( "TrailUnit" ), QVariant( 1 ) );
+
   m_pDock->Rebuild();
   m_pMenu->Refresh();
   EXPECT_TRUE( Action( "Left" ).isChecked() ) << "another recording is seen from the same side";

@@ -1,9 +1,11 @@
 #pragma once
 
+#include <QtCore/QVariantMap>
 #include <QtGui/QActionGroup>
 #include <QtWidgets/QMenu>
 
 #include <functional>
+#include <utility>
 
 namespace HostWindow
 {
@@ -35,10 +37,19 @@ private:
     QVariant Off;
   };
 
+  /// A choice of several settings at once.
+  struct VChoice
+  {
+    QAction* pAction;
+    QVariantMap Options;
+  };
+
   void AddViewTypes();
   void AddCamera();
   void AddTracking();
   void AddToggles();
+  void AddNames();
+  void AddChoices( const QString& i_rTitle, const QList< std::pair< QString, QVariantMap > >& i_rChoices );
   void AddCameraToggles();
   void AddCentroidColours();
   void AddToggle( const QString& i_rText, const QKeySequence& i_rKey, const QString& i_rOption, QVariant i_On = true,
@@ -47,6 +58,7 @@ private:
                        const QString& i_rRefusal );
   void Run( const char* i_pCommand, const QString& i_rRefusal );
   void Toggle( const VToggle& i_rToggle );
+  void Choose( const VChoice& i_rChoice );
   void ShowFor( bool i_bCameraView );
   void ShowConditions( bool i_bExact );
 
@@ -58,6 +70,7 @@ private:
   QList< QAction* > m_ForCameras; ///< shown for a view of cameras only
   QList< QAction* > m_ForView;    ///< need a view
   QList< VToggle > m_Toggles;
+  QList< VChoice > m_Choices;
   QList< QAction* > m_ForBounds; ///< need something selected that has a place
   QAction* m_pLock = nullptr;
 };
