@@ -197,7 +197,7 @@ QJsonObject DescribeView( VSession& i_rSession, const VRenderOptions& i_rRender,
   Report["preselection"] = DescribeSelection( rSelection, ZEK::ISelectionService::ESecondary );
   const QVariantMap Frame = i_rView.FrameReport();
   for ( const char* pMember :
-        { "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "notice", "contributions" } )
+        { "camera", "timings", "draw_calls", "bytes_uploaded", "gl", "frames", "notice", "contributions", "subjects" } )
   {
     Report[pMember] = ToJson( Frame.value( pMember ) );
   }
