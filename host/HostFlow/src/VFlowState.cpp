@@ -110,7 +110,7 @@ void VFlowState::Settle() const
   const std::lock_guard Lock( m_SettleGuard );
   if ( !m_bSettled.load( std::memory_order_relaxed ) )
   {
-    m_pBuilder->Settle( m_Entries, m_Tags );
+    m_pBuilder->Settle( m_Key, m_Entries, m_Tags );
     VStateBuilder::GiveBack( std::move( m_pBuilder ) );
     m_bSettled.store( true, std::memory_order_release );
   }
@@ -186,7 +186,7 @@ VFlowStateFactoryRef VFlowState::GetFactory() const
   return MakeStateFactory();
 }
 
-VFlowState::VSpan VFlowState::TagSpan( std::uint32_t i_Tag ) const
+const VTagRange* VFlowState::FindTag( std::uint32_t i_Tag ) const
 {
   Settle();
   const auto Found = std::lower_bound( m_Tags.begin(), m_Tags.end(), i_Tag,
@@ -194,12 +194,22 @@ VFlowState::VSpan VFlowState::TagSpan( std::uint32_t i_Tag ) const
                                        {
                                          return i_rRange.Tag < i_Sought;
                                        } );
-  if ( Found == m_Tags.end() || Found->Tag != i_Tag )
-  {
-    const VFlowEntry* pEnd = m_Entries.data() + m_Entries.size();
-    return { pEnd, pEnd };
-  }
-  return { m_Entries.data() + Found->First, m_Entries.data() + Found->Last };
+  return Found != m_Tags.end() && Found->Tag == i_Tag ? &*Found : nullptr;
+}
+
+VFlowState::VSpan VFlowState::TagSpan( std::uint32_t i_Tag ) const
+{
+  const VTagRange* const pTag = FindTag( i_Tag );
+  const VFlowEntry* const pEntries = m_Entries.data();
+  return pTag ? VSpan{ pEntries + pTag->First, pEntries + pTag->Last }
+              : VSpan{ pEntries + m_Entries.size(), pEntries + m_Entries.size() };
+}
+
+VFlowItemsId VFlowState::ItemsId( std::uint32_t i_Tag ) const
+{
+  constexpr VFlowItemsId NoItems{ 1, 0 };
+  const VTagRange* const pTag = FindTag( i_Tag );
+  return pTag ? pTag->Id : NoItems;
 }
 
 VFlowState::VSpan VFlowState::Range( std::uint32_t i_Tag, EFlowTimeMatch i_Match, const VFlowTimeKey& i_rKey ) const

@@ -39,6 +39,7 @@ public:
   void TagEnd( ZEK::VFlowCursor& o_rCursor, std::uint32_t i_Tag, ZEK::EFlowTimeMatch i_Match ) const override;
   void EndCursor( ZEK::VFlowCursor& o_rCursor ) const override;
   void FindItem( ZEK::VFlowItemRef& o_rItem, std::uint32_t i_Tag, ZEK::EFlowTimeMatch i_Match ) const override;
+  ZEK::VFlowItemsId ItemsId( std::uint32_t i_Tag ) const override;
   void AddItem( const ZEK::VFlowItemRef& i_rItem ) override { AddItemAt( i_rItem, m_Key ); }
   void AddItemAt( const ZEK::VFlowItemRef& i_rItem, const ZEK::VFlowTimeKey& i_rKey ) override;
   void CopyItems( const ZEK::IFlowState& i_rFrom, std::span< const std::uint32_t > i_Tags ) override;
@@ -60,6 +61,7 @@ private:
   bool Open();
   void Put( const ZEK::VFlowTimeKey& i_rKey, ZEK::IFlowItem& i_rItem );
   void Settle() const;
+  const VTagRange* FindTag( std::uint32_t i_Tag ) const;
   VSpan TagSpan( std::uint32_t i_Tag ) const;
   VSpan Range( std::uint32_t i_Tag, ZEK::EFlowTimeMatch i_Match, const ZEK::VFlowTimeKey& i_rKey ) const;
   void Recycle();

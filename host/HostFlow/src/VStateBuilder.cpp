@@ -1,8 +1,10 @@
 #include "VStateBuilder.h"
 
 #include <algorithm>
+#include <bit>
 #include <compare>
 #include <mutex>
+#include <span>
 
 namespace HostFlow
 {
@@ -65,6 +67,29 @@ std::uint32_t EntryHash( const ZEK::VFlowEntry& i_rEntry, std::uint64_t i_NameHa
   Hash ^= Hash >> 32;
   Hash *= 0x9e3779b97f4a7c15u;
   return static_cast< std::uint32_t >( Hash >> 32 );
+}
+
+/// A digest of 128 bits over who the items are and in what order. An item is another one where it lies elsewhere or has
+/// another id: memory that was given back holds a new id.
+ZEK::VFlowItemsId ItemsId( const ZEK::VFlowTimeKey& i_rKey, std::span< const ZEK::VFlowEntry > i_Entries )
+{
+  ZEK::VFlowItemsId Id{ 0x9e3779b97f4a7c15u, i_Entries.size() + 1 };
+  for ( const ZEK::VFlowEntry& rEntry : i_Entries )
+  {
+    if ( rEntry.Key != i_rKey )
+    {
+      return {};
+    }
+    const ZEK::VFlowValueId& rValue = rEntry.pItem->Id();
+    const auto Place = reinterpret_cast< std::uintptr_t >( rEntry.pItem );
+    const std::uint64_t Number =
+        static_cast< std::uint64_t >( rValue.Number ) + ( static_cast< std::uint64_t >( rValue.Salt ) << 32 );
+    Id.A = ( std::rotl( Id.A, 29 ) ^ Place ) * 0xff51afd7ed558ccdu;
+    Id.A = ( std::rotl( Id.A, 31 ) ^ Number ) * 0xc4ceb9fe1a85ec53u;
+    Id.B = ( std::rotl( Id.B, 23 ) ^ Number ) * 0x9e3779b97f4a7c15u;
+    Id.B = ( std::rotl( Id.B, 37 ) ^ Place ) * 0xd6e8feb86659fd93u;
+  }
+  return { Id.A | 1, Id.B };
 }
 
 } // namespace
@@ -224,12 +249,13 @@ void VStateBuilder::Load( std::vector< ZEK::VFlowEntry >& io_rEntries )
   io_rEntries.clear();
 }
 
-void VStateBuilder::Settle( std::vector< ZEK::VFlowEntry >& o_rEntries, std::vector< VTagRange >& o_rTags )
+void VStateBuilder::Settle( const ZEK::VFlowTimeKey& i_rKey, std::vector< ZEK::VFlowEntry >& o_rEntries,
+                            std::vector< VTagRange >& o_rTags )
 {
   o_rTags.clear();
   for ( std::uint32_t Tag = 0; Tag < m_Tags.size(); ++Tag )
   {
-    o_rTags.push_back( { m_Tags[Tag].Tag, Tag, m_Tags[Tag].Count } );
+    o_rTags.push_back( { m_Tags[Tag].Tag, Tag, m_Tags[Tag].Count, {} } );
   }
   std::sort( o_rTags.begin(), o_rTags.end(),
              []( const VTagRange& i_rA, const VTagRange& i_rB )
@@ -248,9 +274,10 @@ void VStateBuilder::Settle( std::vector< ZEK::VFlowEntry >& o_rEntries, std::vec
   {
     o_rEntries[m_Tags[m_TagOf[Entry]].Next++] = m_Entries[Entry];
   }
-  for ( const VTagRange& rRange : o_rTags )
+  for ( VTagRange& rRange : o_rTags )
   {
     SortByKey( o_rEntries.data() + rRange.First, o_rEntries.data() + rRange.Last );
+    rRange.Id = ItemsId( i_rKey, std::span( o_rEntries ).subspan( rRange.First, rRange.Last - rRange.First ) );
   }
   Forget();
 }

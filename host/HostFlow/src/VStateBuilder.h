@@ -17,6 +17,7 @@ struct VTagRange
   std::uint32_t Tag = 0;
   std::uint32_t First = 0;
   std::uint32_t Last = 0; ///< one past the last
+  ZEK::VFlowItemsId Id;
 };
 
 /// What a state needs while it grows: the entries in the order they came, and the table that finds the entry which a
@@ -35,8 +36,9 @@ public:
   void Add( const ZEK::VFlowTimeKey& i_rKey, ZEK::IFlowItem& i_rItem );
   /// Takes the entries of a settled state over, with the references that they hold.
   void Load( std::vector< ZEK::VFlowEntry >& io_rEntries );
-  /// Hands the entries and their references over, in the order of a state.
-  void Settle( std::vector< ZEK::VFlowEntry >& o_rEntries, std::vector< VTagRange >& o_rTags );
+  /// Hands the entries and their references over, in the order of a state. The key is the state's.
+  void Settle( const ZEK::VFlowTimeKey& i_rKey, std::vector< ZEK::VFlowEntry >& o_rEntries,
+               std::vector< VTagRange >& o_rTags );
   std::size_t Count() const { return m_Entries.size(); }
 
 private:

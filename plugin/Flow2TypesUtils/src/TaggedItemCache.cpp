@@ -77,10 +77,18 @@ VItemCache::VRange VItemCache::RangeOf( const VJoinQuery& i_rQuery ) const
   return { { Begin.operator->(), End.operator->() }, i_rQuery.Match, i_rQuery.Key, {} };
 }
 
+ZEK::VFlowItemsId VItemCache::ItemsIdOf( const VJoinQuery& i_rQuery ) const
+{
+  const bool bAllPass =
+      i_rQuery.Key == i_rQuery.rState.GetKey() && ZEK::FlowTimeMatches( i_rQuery.Match, i_rQuery.Key, i_rQuery.Key );
+  return bAllPass ? i_rQuery.rState.ItemsId( m_Tag ) : ZEK::VFlowItemsId();
+}
+
 bool VItemCache::Collect( const VJoinQuery& i_rQuery, std::uint32_t i_CacheNumber, VNameTable& io_rTable,
                           bool& o_rbRequired )
 {
   bool bAnyHit = false;
+  m_ItemsId = ItemsIdOf( i_rQuery );
   m_Range = RangeOf( i_rQuery );
   VWalk Walk( m_Range.Entries, i_rQuery.Match, i_rQuery.Key );
   while ( const ZEK::VFlowEntry* pEntry = Walk.Next() )
@@ -135,15 +143,26 @@ void VItemCache::Clear( bool i_bKeepAsPrevious )
   m_Ids.clear();
   m_bValuesTaken = false;
   m_bEntriesTaken = false;
+  m_ItemsId = {};
   m_Range = {};
+  m_pState = nullptr;
   m_Seen.clear();
 }
 
 bool VItemCache::Keep( const VJoinQuery& i_rQuery, ZEK::VFlowCursor i_EndEntry, VNameTable& io_rTable )
 {
+  const ZEK::VFlowItemsId Id = ItemsIdOf( i_rQuery );
+  m_bEntriesTaken = false;
+  if ( Id.IsKnown() && Id == m_ItemsId )
+  {
+    m_Range = { {}, i_rQuery.Match, i_rQuery.Key, i_EndEntry };
+    m_pState = &i_rQuery.rState;
+    return true;
+  }
+  m_ItemsId = Id;
+  m_pState = nullptr;
   m_Range = RangeOf( i_rQuery );
   m_Range.EndEntry = i_EndEntry;
-  m_bEntriesTaken = false;
   VWalk Walk( m_Range.Entries, i_rQuery.Match, i_rQuery.Key );
   VSeen* pSeen = m_Seen.data();
   VSeen* const pEnd = pSeen + m_Seen.size();
@@ -206,6 +225,10 @@ const std::vector< ZEK::VFlowCursor >& VItemCache::Entries() const
 {
   if ( !std::exchange( m_bEntriesTaken, true ) )
   {
+    if ( m_pState )
+    {
+      m_Range.Entries = RangeOf( { *m_pState, 0, m_Range.Match, m_Range.Key } ).Entries;
+    }
     m_Entries.assign( m_Ids.size(), m_Range.EndEntry );
     VWalk Walk( m_Range.Entries, m_Range.Match, m_Range.Key );
     for ( const VSeen& rSeen : m_Seen )

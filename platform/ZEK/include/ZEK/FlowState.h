@@ -47,6 +47,17 @@ struct VFlowEntry
   IFlowItem* pItem = nullptr; ///< the state holds the reference
 };
 
+/// What tells the items of one tag in a state from those in another: where it is the same known one, the same items
+/// stand in the same order, each under the key of its state. Slow items, which are in state after state, are then
+/// recognised by one comparison.
+struct VFlowItemsId
+{
+  std::uint64_t A = 0, B = 0;
+
+  friend constexpr bool operator==( const VFlowItemsId&, const VFlowItemsId& ) = default;
+  constexpr bool IsKnown() const { return A != 0 || B != 0; }
+};
+
 /// Steps through the entries of one state without allocation; stable while the state lives.
 class VFlowCursor
 {
@@ -91,6 +102,8 @@ public:
   virtual void EndCursor( VFlowCursor& o_rCursor ) const = 0;
   /// The first entry of the tag that passes the match against the state's own key, or null.
   virtual void FindItem( VFlowItemRef& o_rItem, std::uint32_t i_Tag, EFlowTimeMatch i_Match ) const = 0;
+  /// Unknown where an item stands under another key than the state's, or where the maker of states does not tell.
+  virtual VFlowItemsId ItemsId( std::uint32_t /*i_Tag*/ ) const { return {}; }
   /// Adds to a state that is being built. An item of the same tag, key and names as an entry replaces that entry.
   /// The item takes the state's key; `AddItemAt` gives it its own.
   virtual void AddItem( const VFlowItemRef& i_rItem ) = 0;

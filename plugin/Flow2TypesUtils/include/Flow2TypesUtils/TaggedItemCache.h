@@ -92,6 +92,8 @@ private:
     ZEK::VFlowCursor EndEntry;
   };
   VRange RangeOf( const VJoinQuery& i_rQuery ) const;
+  /// What tells whether another state has the same items; unknown where not all of them pass.
+  ZEK::VFlowItemsId ItemsIdOf( const VJoinQuery& i_rQuery ) const;
   /// The rest of `Keep`, from the first entry that holds another item than before.
   template < typename TWalk >
   bool KeepOthers( VSeen* i_pSeen, const ZEK::VFlowEntry* i_pEntry, TWalk i_Walk, std::uint32_t i_NameSelector,
@@ -100,7 +102,9 @@ private:
   std::uint32_t m_Tag;
   ETagRequirement m_Requirement;
   std::vector< VSeen > m_Seen;
-  VRange m_Range;
+  ZEK::VFlowItemsId m_ItemsId; ///< of those that are joined
+  mutable VRange m_Range;
+  const ZEK::IFlowState* m_pState = nullptr; ///< where the range is still to be looked up
   mutable std::vector< ZEK::VFlowCursor > m_Entries;
   std::vector< ZEK::VFlowValueId > m_Ids;
   std::vector< ZEK::VFlowValueId > m_PreviousIds; ///< not kept up while `m_bSameIds`
