@@ -17,7 +17,7 @@ std::atomic< std::uint64_t > s_Uploaded{ 0 };
 constexpr std::size_t WritesPerRing = 4;
 constexpr std::size_t SmallestRing = 4096;
 // From this size on a write has the whole buffer: fresh memory for several such writes costs more than what it saves.
-constexpr std::size_t LargeWrite = 1u << 18;
+constexpr std::size_t LargeWrite = 1u << 14;
 // Parts begin where any attribute type is aligned, and where mapping is cheap.
 constexpr std::size_t PartAlignment = 64;
 
