@@ -16,6 +16,7 @@ struct VFlowRenderSubject::VOwn
 {
   std::size_t Slot = 0; ///< in the extractor
   bool bOneBone = false;
+  bool bModelled = true;           ///< the model may have a place for a marker; else all of its places are nowhere
   std::uint32_t RootBone = NoBone; ///< by its place in the group
   /// Made when a joint state is first to be posed; null after that for a skeleton that cannot be.
   std::unique_ptr< ComputeSubject::VComputeSubjectFK > pKinematics;

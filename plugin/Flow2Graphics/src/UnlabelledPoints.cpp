@@ -1,5 +1,7 @@
 #include <Flow2Graphics/UnlabelledPoints.h>
 
+#include <CoreMoxelTypes/Reconstruction.h>
+
 #include <algorithm>
 
 namespace Flow2Graphics
@@ -7,12 +9,13 @@ namespace Flow2Graphics
 
 bool VUnlabelledPoints::ResolveIndex( std::uint32_t i_Index, ZEK::VSelectionItem& o_rItem, std::string& o_rLabel ) const
 {
-  if ( i_Index >= Points.size() )
+  const auto* const pSet = ZEK::FlowPayload< CoreMoxelTypes::VReconstructionSet >( Set.Get() );
+  if ( !pSet || i_Index >= Points.size() )
   {
     return false;
   }
   o_rItem = { ZEK::ESelectReconstruction, {}, 0, Reconstruction[i_Index] };
-  o_rLabel = "Reconstruction " + std::to_string( Ids[i_Index] );
+  o_rLabel = "Reconstruction " + std::to_string( pSet->Items[Reconstruction[i_Index]].Id );
   return true;
 }
 
@@ -39,14 +42,6 @@ bool VUnlabelledPoints::GetPoint( std::uint32_t i_Index, MoxelGraphics::VScenePo
   }
   o_rPoint = Points[i_Index];
   return true;
-}
-
-void VUnlabelledPoints::Clear()
-{
-  Points.clear();
-  Reconstruction.clear();
-  Ids.clear();
-  Residuals.clear();
 }
 
 } // namespace Flow2Graphics

@@ -174,31 +174,34 @@ ZEK::VRenderCameraRef VFlowRenderCameraProvider::GetCamera( const std::string& i
 
 void VFlowRenderCameraProvider::Update( const ZEK::IFlowState& i_rState )
 {
-  ++m_Generation;
-  TakeSubjects( i_rState );
+  const bool bSubjects = TakeSubjects( i_rState );
   CameraExtractor.Update( i_rState, ZEK::EFlowNameDevice, EFlowTimeMatch::Overlap, i_rState.GetKey() );
   const bool bNames = CameraExtractor.NamesChanged();
-  TakeReconstructionLabels( i_rState );
+  const bool bLabels = TakeReconstructionLabels( i_rState );
   if ( bNames )
   {
     TakeNames();
   }
-  GiveMarks( bNames );
-  const bool bChanged = GiveItems( i_rState, bNames );
-  GiveIds( bNames );
+  const bool bMarks = GiveMarks( bNames );
+  const bool bItems = bNames || bLabels || CameraExtractor.Changed();
+  const bool bChanged = bItems && GiveItems( i_rState, bNames );
+  const bool bIds = GiveIds( bNames );
+  if ( bItems || bSubjects || bMarks || bIds || m_Generation == 0 )
+  {
+    ++m_Generation;
+  }
   if ( bNames || bChanged )
   {
     TellScene();
   }
 }
 
-void VFlowRenderCameraProvider::TakeSubjects( const ZEK::IFlowState& i_rState )
+bool VFlowRenderCameraProvider::TakeSubjects( const ZEK::IFlowState& i_rState )
 {
   SubjectExtractor.Update( i_rState, ZEK::EFlowNameObject, EFlowTimeMatch::Overlap, i_rState.GetKey() );
-  if ( !SubjectExtractor.NamesChanged() && !SubjectExtractor.Changed( ZEK::FlowTag< FlowSubject > ) &&
-       !SubjectExtractor.Changed( ZEK::FlowTag< FlowSubjectApplicationData > ) )
+  if ( !SubjectExtractor.Changed() )
   {
-    return;
+    return false;
   }
   m_pColours->Clear();
   const auto& rSubjects = SubjectExtractor.Values< FlowSubject >();
@@ -210,18 +213,24 @@ void VFlowRenderCameraProvider::TakeSubjects( const ZEK::IFlowState& i_rState )
       m_pColours->AddSubject( *rSubjects[Slot], *rData[Slot] );
     }
   }
+  return true;
 }
 
-void VFlowRenderCameraProvider::TakeReconstructionLabels( const ZEK::IFlowState& i_rState )
+bool VFlowRenderCameraProvider::TakeReconstructionLabels( const ZEK::IFlowState& i_rState )
 {
   ZEK::VFlowItemRef New;
-  i_rState.FindItem( New, ZEK::FlowTag< FlowReconstructionLabelSet >, EFlowTimeMatch::Overlap );
+  // They are new in every frame, and only tell centroids apart that are assigned to a reconstruction.
+  if ( CameraExtractor.Occurs( ZEK::FlowTag< FlowCentroidAssignmentSet > ) )
+  {
+    i_rState.FindItem( New, ZEK::FlowTag< FlowReconstructionLabelSet >, EFlowTimeMatch::Overlap );
+  }
   m_bOtherLabels = IsOtherValue( m_ReconstructionLabels, New );
   if ( m_bOtherLabels )
   {
     m_pColours->SetReconstructionLabels( ZEK::FlowPayload< VReconstructionLabelSet >( New.Get() ) );
   }
   m_ReconstructionLabels = std::move( New );
+  return m_bOtherLabels;
 }
 
 void VFlowRenderCameraProvider::TakeNames()
@@ -248,13 +257,11 @@ void VFlowRenderCameraProvider::TakeNames()
 bool VFlowRenderCameraProvider::GiveItems( const ZEK::IFlowState& i_rState, bool i_bAll )
 {
   std::array< const std::vector< ZEK::VFlowCursor >*, ECameraItemCount > Entries{};
-  bool bAny = i_bAll || m_bOtherLabels;
   for ( const VCameraTag& rTag : CameraTags )
   {
     if ( i_bAll || CameraExtractor.Changed( rTag.Tag ) )
     {
       Entries[rTag.Item] = &CameraExtractor.Entries( rTag.Tag );
-      bAny = true;
     }
   }
   ZEK::VFlowCursor End;
@@ -264,8 +271,7 @@ bool VFlowRenderCameraProvider::GiveItems( const ZEK::IFlowState& i_rState, bool
   {
     VFlowRenderCamera& rCamera = *m_Slots[Slot];
     const std::int32_t Before = rCamera.GetInfo().ChangeCount;
-    rCamera.SetKey( i_rState.GetKey() );
-    for ( std::uint32_t Item = 0; bAny && Item < ECameraItemCount; ++Item )
+    for ( std::uint32_t Item = 0; Item < ECameraItemCount; ++Item )
     {
       if ( Item == ECameraReconstructionLabels )
       {
@@ -282,12 +288,12 @@ bool VFlowRenderCameraProvider::GiveItems( const ZEK::IFlowState& i_rState, bool
   return bChanged;
 }
 
-void VFlowRenderCameraProvider::GiveMarks( bool i_bAll )
+bool VFlowRenderCameraProvider::GiveMarks( bool i_bAll )
 {
   const MoxelGraphics::VSelectionRegistry& rRegistry = m_rScene.Registry();
   if ( !i_bAll && m_MarksGeneration == rRegistry.MarksGeneration() )
   {
-    return;
+    return false;
   }
   m_MarksGeneration = rRegistry.MarksGeneration();
   m_Marks.resize( m_Slots.size() );
@@ -316,9 +322,10 @@ void VFlowRenderCameraProvider::GiveMarks( bool i_bAll )
   {
     m_Slots[Slot]->SetMarks( m_Marks[Slot] );
   }
+  return true;
 }
 
-void VFlowRenderCameraProvider::GiveIds( bool i_bAll )
+bool VFlowRenderCameraProvider::GiveIds( bool i_bAll )
 {
   const bool bOthers = i_bAll || CameraExtractor.Changed( ZEK::FlowTag< FlowCentroidSet > ) ||
                        CameraExtractor.Changed( ZEK::FlowTag< FlowGreyscaleBlobSet > );
@@ -340,7 +347,7 @@ void VFlowRenderCameraProvider::GiveIds( bool i_bAll )
   const std::uint32_t FirstBlob = Allocate( m_Blobs );
   if ( !bOthers && FirstCentroid == m_FirstCentroid && FirstBlob == m_FirstBlob )
   {
-    return;
+    return false;
   }
   m_FirstCentroid = FirstCentroid;
   m_FirstBlob = FirstBlob;
@@ -357,6 +364,7 @@ void VFlowRenderCameraProvider::GiveIds( bool i_bAll )
     rPart.pCamera->SetFirstIds( FirstCentroid == 0 ? 0 : FirstCentroid + rPart.First,
                                 rPart.pCamera->GetInfo().FirstBlobId );
   }
+  return true;
 }
 
 void VFlowRenderCameraProvider::TellScene()

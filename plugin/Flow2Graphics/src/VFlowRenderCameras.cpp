@@ -88,6 +88,17 @@ bool VCameraBodyMembers::GetPoint( std::uint32_t i_Index, MoxelGraphics::VSceneP
   return true;
 }
 
+bool VCameraBodyMembers::GetPose( std::uint32_t i_Index, MoxelGraphics::VScenePose& o_rPose ) const
+{
+  if ( i_Index >= Cameras.size() )
+  {
+    return false;
+  }
+  o_rPose.Matrix = Cameras[i_Index]->GetModel().WorldFromCamera;
+  o_rPose.Index = Cameras[i_Index]->GetInfo().UserId;
+  return true;
+}
+
 VFlowRenderCameras::VFlowRenderCameras( MoxelGraphics::VMoxelScene& i_rScene,
                                         std::shared_ptr< const VFlowRenderCameraProvider > i_pProvider )
   : VRenderCameras( i_rScene, i_pProvider )
@@ -98,15 +109,28 @@ VFlowRenderCameras::VFlowRenderCameras( MoxelGraphics::VMoxelScene& i_rScene,
 
 void VFlowRenderCameras::Update( const ZEK::IFlowState& i_rState )
 {
-  if ( TakeCameras() )
+  const bool bCameras =
+      std::exchange( m_CamerasGeneration, m_pCameras->GetGeneration() ) != m_pCameras->GetGeneration();
+  if ( bCameras && TakeCameras() )
   {
     m_Members.Cameras.assign( Bodies().begin(), Bodies().end() );
   }
   GiveBodyIds();
-  TakePictures();
+  m_Seen = {};
+  if ( bCameras )
+  {
+    TakePictures();
+  }
   SettleWand( i_rState.GetKey() );
-  GiveCellIds();
-  SetPictures( m_Pictures, m_NewestWand + m_WandAge );
+  const double Frame = m_NewestWand + m_WandAge;
+  if ( GiveCellIds() || bCameras )
+  {
+    SetPictures( m_Pictures, Frame );
+  }
+  else
+  {
+    SetPicturesFrame( Frame );
+  }
 }
 
 void VFlowRenderCameras::GiveBodyIds()
@@ -114,15 +138,6 @@ void VFlowRenderCameras::GiveBodyIds()
   MoxelGraphics::VSelectionRegistry& rRegistry = m_rScene.Registry();
   const auto Count = static_cast< std::uint32_t >( m_Members.Cameras.size() );
   const std::uint32_t First = Count != 0 ? rRegistry.AllocateRange( Count, m_Members ) : 0;
-  ZEK::VSelectionItem Item{ ZEK::ESelectDevice, {}, 0, 0 };
-  MoxelGraphics::VScenePose Pose;
-  for ( const ZEK::VRenderCameraRef& rpCamera : m_Members.Cameras )
-  {
-    Item.Device = rpCamera->GetName();
-    Pose.Matrix = rpCamera->GetModel().WorldFromCamera;
-    Pose.Index = rpCamera->GetInfo().UserId;
-    rRegistry.SetPose( Item, Pose );
-  }
   m_Flags.clear();
   for ( const MoxelGraphics::VSelectionRegistry::VMark& rMark : rRegistry.Marks() )
   {
@@ -141,7 +156,6 @@ void VFlowRenderCameras::TakePictures()
   const auto& rCameras = m_pCameras->FlowCameras();
   const std::uint64_t Generation = m_rScene.Registry().MarksGeneration();
   const bool bMarks = std::exchange( m_MarksGeneration, Generation ) != Generation;
-  m_Seen = {};
   m_Kept.resize( rCameras.size() );
   m_Pictures.resize( rCameras.size() );
   for ( std::size_t Index = 0; Index < rCameras.size(); ++Index )
@@ -289,12 +303,16 @@ std::shared_ptr< VFlowRenderCamera > VFlowRenderCameras::EditedCamera() const
   return WithCells == 1 ? pWithCells : nullptr;
 }
 
-void VFlowRenderCameras::GiveCellIds()
+bool VFlowRenderCameras::GiveCellIds()
 {
-  m_Cells.Clear();
-  for ( VCameraPictures& rPictures : m_Pictures )
+  const std::uint32_t Before = m_Cells.Count;
+  if ( Before != 0 )
   {
-    rPictures.FirstCellId = 0;
+    m_Cells.Clear();
+    for ( VCameraPictures& rPictures : m_Pictures )
+    {
+      rPictures.FirstCellId = 0;
+    }
   }
   if ( const std::shared_ptr< VFlowRenderCamera > pCamera = EditedCamera() )
   {
@@ -305,6 +323,7 @@ void VFlowRenderCameras::GiveCellIds()
     const std::uint32_t Number = m_Cells.Parts.front().pCamera->GetInfo().Number;
     m_Pictures[Number].FirstCellId = m_rScene.Registry().AllocateRange( m_Cells.Count, m_Cells );
   }
+  return Before != 0 || m_Cells.Count != 0;
 }
 
 } // namespace Flow2Graphics

@@ -55,6 +55,10 @@ void VFlowRenderCentroidAssignments::FillRecords()
 /// Whether a camera has other assignments than it had, or stands elsewhere.
 bool VFlowRenderCentroidAssignments::TakeCameras()
 {
+  if ( std::exchange( m_CamerasGeneration, m_pProvider->GetGeneration() ) == m_pProvider->GetGeneration() )
+  {
+    return false;
+  }
   const auto& rCameras = m_pProvider->FlowCameras();
   bool bChanged = m_Taken.size() != rCameras.size();
   m_Taken.resize( rCameras.size() );

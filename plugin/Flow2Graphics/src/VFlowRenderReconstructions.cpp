@@ -20,6 +20,8 @@ using ZEK::EFlowTimeMatch;
 /// Of points that were recorded without one, mm.
 constexpr float UsualRadius = 7.0F;
 constexpr unsigned FlagShift = 21;
+/// How many points ahead the memory is asked for one.
+constexpr std::size_t Ahead = 32;
 /// How much larger than a marker the sphere is that shows its residual.
 constexpr float CoverScale = 1.1F;
 
@@ -77,25 +79,43 @@ void VFlowRenderReconstructions::Update( const ZEK::IFlowState& i_rState )
 
 void VFlowRenderReconstructions::Rebuild()
 {
-  m_UnlabelledPoints.Clear();
-  m_bLabelledStale = true;
+  m_bLabelledStale = m_bResidualsStale = true;
+  m_UnlabelledPoints.Set = m_Set;
   const std::span< const std::uint8_t > Taken = m_pSubjects->TakenReconstructions();
-  if ( const auto* const pSet = ZEK::FlowPayload< VReconstructionSet >( m_Set.Get() ) )
+  const auto* const pSet = ZEK::FlowPayload< VReconstructionSet >( m_Set.Get() );
+  const std::size_t Count =
+      pSet ? static_cast< std::size_t >( std::count( Taken.begin(), Taken.end(), std::uint8_t{ 0 } ) ) : 0;
+  m_UnlabelledPoints.Points.resize( Count );
+  m_UnlabelledPoints.Reconstruction.resize( Count );
+  const VReconstruction* const pItems = pSet ? pSet->Items.data() : nullptr;
+  VScenePoint* pPoint = m_UnlabelledPoints.Points.data();
+  std::uint32_t* pReconstruction = m_UnlabelledPoints.Reconstruction.data();
+  for ( std::uint32_t Index = 0; Count != 0 && Index < Taken.size(); ++Index )
   {
-    const std::vector< VReconstruction >& rItems = pSet->Items;
-    for ( std::size_t Index = 0; Index < rItems.size(); ++Index )
+    if ( Taken[Index] == 0 )
     {
-      if ( Taken[Index] == 0 )
-      {
-        m_UnlabelledPoints.Points.push_back( PointOf( rItems[Index] ) );
-        m_UnlabelledPoints.Reconstruction.push_back( static_cast< std::uint32_t >( Index ) );
-        m_UnlabelledPoints.Ids.push_back( rItems[Index].Id );
-        m_UnlabelledPoints.Residuals.push_back( rItems[Index].Residual );
-      }
+      // A new state lies in the memory, not in a cache.
+      __builtin_prefetch( pItems + std::min< std::size_t >( Index + Ahead, Taken.size() ) );
+      *pPoint++ = PointOf( pItems[Index] );
+      *pReconstruction++ = Index;
     }
   }
   SetReconstructions( m_UnlabelledPoints.Points );
-  SetResiduals( m_UnlabelledPoints.Residuals );
+}
+
+void VFlowRenderReconstructions::FillResiduals()
+{
+  if ( !std::exchange( m_bResidualsStale, false ) )
+  {
+    return;
+  }
+  m_Residuals.clear();
+  const auto* const pSet = ZEK::FlowPayload< VReconstructionSet >( m_Set.Get() );
+  for ( const std::uint32_t Index : m_UnlabelledPoints.Reconstruction )
+  {
+    m_Residuals.push_back( pSet->Items[Index].Residual );
+  }
+  SetResiduals( m_Residuals );
 }
 
 bool VFlowRenderReconstructions::HasLabelled() const

@@ -3,6 +3,8 @@
 #include "SubjectOwn.h"
 
 #include <algorithm>
+#include <cstring>
+#include <utility>
 
 namespace Flow2Graphics
 {
@@ -16,24 +18,42 @@ using MoxelGraphics::VSubjectRecord;
 /// Of points that were recorded without one, mm.
 constexpr float UsualRadius = 7.0F;
 constexpr unsigned FlagShift = 21;
+/// How many points ahead the memory is asked for one.
+constexpr std::size_t Ahead = 32;
+constexpr VScenePoint Nowhere{ NoPlace, NoPlace, NoPlace, 0 };
+
+using VLabel = VReconstructionLabelSet::L;
+
+/// A row in one register.
+using VFour = float __attribute__( ( vector_size( 16 ) ) );
+using VFourDoubles = double __attribute__( ( vector_size( 32 ) ) );
 
 /// Rotation row by row and translation, as a pose; none unless all of it is finite.
-void WritePose( const double* i_pRotation, const double* i_pTranslation, VBonePose& o_rPose )
+inline void WritePose( const double* i_pRotation, const double* i_pTranslation, VBonePose& o_rPose )
 {
-  float Sum = 0;
+  VFour Excess{}; // 0 for numbers, else NaN
   for ( std::size_t Row = 0; Row < 3; ++Row )
   {
-    for ( std::size_t Column = 0; Column < 3; ++Column )
-    {
-      o_rPose[4 * Row + Column] = static_cast< float >( i_pRotation[3 * Row + Column] );
-      Sum += 0 * o_rPose[4 * Row + Column];
-    }
-    o_rPose[4 * Row + 3] = static_cast< float >( i_pTranslation[Row] );
-    Sum += 0 * o_rPose[4 * Row + 3];
+    const double* const pRow = i_pRotation + 3 * Row;
+    const auto New =
+        __builtin_convertvector( ( VFourDoubles{ pRow[0], pRow[1], pRow[2], i_pTranslation[Row] } ), VFour );
+    Excess += New - New;
+    std::memcpy( o_rPose.data() + 4 * Row, &New, sizeof( New ) );
   }
-  if ( Sum != 0 )
+  if ( ( Excess[0] + Excess[1] ) + ( Excess[2] + Excess[3] ) != 0 )
   {
     o_rPose = NoPose;
+  }
+}
+
+/// Poses and points of a new state lie in the memory, not in a cache: asked for ahead, they are there when their turn
+/// comes.
+void Prefetch( std::span< const std::byte > i_Memory )
+{
+  constexpr std::size_t Line = 64;
+  for ( std::size_t At = 0; At < i_Memory.size(); At += Line )
+  {
+    __builtin_prefetch( i_Memory.data() + At );
   }
 }
 
@@ -108,6 +128,7 @@ void VFlowRenderSubject::Take( const ZEK::IFlowState& i_rState )
   {
     Rebuild();
   }
+  m_bMotionsRead = false;
   m_bMoved = bStructure || m_pMaker->MotionChanged( m_Extractor );
   if ( m_bMoved )
   {
@@ -115,32 +136,49 @@ void VFlowRenderSubject::Take( const ZEK::IFlowState& i_rState )
   }
 }
 
+/// Read once an update: poses and markers both ask.
+const VSubjectMotion& VFlowRenderSubject::MotionOf( std::size_t i_Record )
+{
+  if ( !std::exchange( m_bMotionsRead, true ) )
+  {
+    m_Motions.resize( m_Own.size() );
+    for ( std::size_t Index = 0; Index < m_Own.size(); ++Index )
+    {
+      m_pMaker->Motion( m_Extractor, m_Own[Index].Slot, m_Motions[Index] );
+    }
+  }
+  return m_Motions[i_Record];
+}
+
 void VFlowRenderSubject::Move()
 {
-  VSubjectMotion Motion;
   for ( std::size_t Index = 0; Index < m_Own.size(); ++Index )
   {
     VOwn& rOwn = m_Own[Index];
     VSubjectRecord& rRecord = m_Group.Records[Index];
-    m_pMaker->Motion( m_Extractor, rOwn.Slot, Motion );
+    const VSubjectMotion& rMotion = MotionOf( Index );
+    if ( Index + 1 < m_Own.size() )
+    {
+      Prefetch( std::as_bytes( MotionOf( Index + 1 ).Segments ) );
+    }
     if ( rRecord.Bones.Count != 0 && !rOwn.bOneBone )
     {
-      MoveBones( Motion, rOwn, rRecord );
+      MoveBones( rMotion, rOwn, rRecord );
       rRecord.Root = rOwn.RootBone != VOwn::NoBone ? m_Group.Poses[rOwn.RootBone] : NoPose;
     }
     else
     {
-      WritePose( Motion.pRoot, rRecord.Root );
+      WritePose( rMotion.pRoot, rRecord.Root );
     }
     if ( rOwn.bOneBone )
     {
       m_Group.Poses[rRecord.Bones.First] = rRecord.Root;
     }
-    rRecord.Mesh.AnimationTime = std::isfinite( Motion.AnimationTime ) ? Motion.AnimationTime : 0;
-    rRecord.Mesh.Bones.resize( Motion.MeshBones.size() );
-    for ( std::size_t Bone = 0; Bone < Motion.MeshBones.size(); ++Bone )
+    rRecord.Mesh.AnimationTime = std::isfinite( rMotion.AnimationTime ) ? rMotion.AnimationTime : 0;
+    rRecord.Mesh.Bones.resize( rMotion.MeshBones.size() );
+    for ( std::size_t Bone = 0; Bone < rMotion.MeshBones.size(); ++Bone )
     {
-      WritePose( &Motion.MeshBones[Bone], rRecord.Mesh.Bones[Bone] );
+      WritePose( &rMotion.MeshBones[Bone], rRecord.Mesh.Bones[Bone] );
     }
   }
   ++m_Group.PoseGeneration;
@@ -214,27 +252,32 @@ void VFlowRenderSubject::PlaceMarkers( const VLabelledSet& i_rSet )
 
 void VFlowRenderSubject::PlaceByModel( bool i_bSet )
 {
-  VSubjectMotion Motion;
   for ( std::size_t Index = 0; Index < m_Own.size(); ++Index )
   {
-    m_pMaker->Motion( m_Extractor, m_Own[Index].Slot, Motion );
-    PlaceRecord( Motion, m_Own[Index], m_Group.Records[Index], i_bSet );
+    PlaceRecord( MotionOf( Index ), m_Own[Index], m_Group.Records[Index], i_bSet );
   }
 }
 
 /// Where the model has the markers of an object. They are seen there when nothing else tells where they are: in a
-/// frame without reconstructions, where none is missing, and of objects that are tracked as one.
-void VFlowRenderSubject::PlaceRecord( const VSubjectMotion& i_rMotion, const VOwn& i_rOwn,
-                                      const VSubjectRecord& i_rRecord, bool i_bSet )
+/// frame without reconstructions, where none is missing, and of objects that are tracked as one. Else they are left as
+/// they are, for whoever places them by their labels.
+void VFlowRenderSubject::PlaceRecord( const VSubjectMotion& i_rMotion, VOwn& io_rOwn, const VSubjectRecord& i_rRecord,
+                                      bool i_bSet )
 {
-  constexpr VScenePoint Nowhere{ NoPlace, NoPlace, NoPlace, 0 };
+  const bool bSeen = !i_bSet || io_rOwn.bOneBone;
+  const bool bModel = io_rOwn.bOneBone || !i_rMotion.Solved.empty();
+  if ( !bModel && !bSeen && !std::exchange( io_rOwn.bModelled, false ) )
+  {
+    return;
+  }
+  io_rOwn.bModelled = bModel;
   for ( std::uint32_t Number = 0; Number < i_rRecord.Markers.Count; ++Number )
   {
     const std::uint32_t Index = i_rRecord.Markers.First + Number;
     const float Radius = m_Radii[Index] > 0 ? m_Radii[Index] : UsualRadius;
     const bool bVisible = Number >= i_rMotion.Visible.size() || i_rMotion.Visible[Number] != 0;
     VScenePoint Place = Nowhere;
-    if ( i_rOwn.bOneBone )
+    if ( io_rOwn.bOneBone )
     {
       Place = Placed( i_rRecord.Root, m_Locals[Index], Radius );
     }
@@ -243,7 +286,10 @@ void VFlowRenderSubject::PlaceRecord( const VSubjectMotion& i_rMotion, const VOw
       Place = Placed( i_rMotion.Solved[Number], Radius );
     }
     m_Group.Solved[Index] = i_bSet || bVisible ? Place : Nowhere;
-    m_Group.Markers[Index] = bVisible && ( !i_bSet || i_rOwn.bOneBone ) ? Place : Nowhere;
+    if ( bSeen )
+    {
+      m_Group.Markers[Index] = bVisible ? Place : Nowhere;
+    }
   }
 }
 
@@ -252,33 +298,54 @@ void VFlowRenderSubject::PlaceByLabels( const VLabelledSet& i_rSet )
   const std::vector< VReconstruction >& rItems = i_rSet.pSet->Items;
   m_Used.assign( rItems.size(), 0 );
   m_Reconstructions.assign( m_Group.Markers.size(), NoReconstruction );
-  if ( !i_rSet.pLabels )
+  // Through pointers: a byte that is written might else be part of any list.
+  std::uint8_t* const pUsed = m_Used.data();
+  std::uint32_t* const pReconstructions = m_Reconstructions.data();
+  VScenePoint* const pMarkers = m_Group.Markers.data();
+  const float* const pRadii = m_Radii.data();
+  MoxelGraphics::VSubjectRange Markers;
+  std::uint32_t Subject = 0;
+  bool bFirst = true;
+  const auto Labels = i_rSet.pLabels ? std::span( i_rSet.pLabels->Labels ) : std::span< const VLabel >();
+  for ( std::size_t Number = 0; Number < Labels.size(); ++Number )
   {
-    return;
-  }
-  const VSubjectRecord* pRecord = nullptr;
-  for ( const VReconstructionLabelSet::L& rLabel : i_rSet.pLabels->Labels )
-  {
+    const VLabel& rLabel = Labels[Number];
+    if ( Number + Ahead < Labels.size() )
+    {
+      __builtin_prefetch( rItems.data() +
+                          std::min( std::size_t{ Labels[Number + Ahead].Reconstruction }, rItems.size() ) );
+    }
     // Labels of one object mostly stand together.
-    if ( !pRecord || pRecord->Item.Object != rLabel.SubjectId )
+    if ( bFirst || Subject != rLabel.SubjectId )
     {
+      bFirst = false;
+      Subject = rLabel.SubjectId;
       std::uint32_t Record = 0;
-      pRecord = m_Directory.Find( rLabel.SubjectId, Record ) ? &m_Group.Records[Record] : nullptr;
+      Markers = m_Directory.Find( Subject, Record ) ? m_Group.Records[Record].Markers : MoxelGraphics::VSubjectRange();
     }
-    if ( !pRecord || rLabel.MarkerId >= pRecord->Markers.Count || rLabel.Reconstruction >= rItems.size() )
+    const std::uint32_t Reconstruction = rLabel.Reconstruction;
+    const std::uint32_t Index = Markers.First + rLabel.MarkerId;
+    if ( rLabel.MarkerId >= Markers.Count || Reconstruction >= rItems.size() || pUsed[Reconstruction] != 0 ||
+         pReconstructions[Index] != NoReconstruction )
     {
       continue;
     }
-    const std::uint32_t Index = pRecord->Markers.First + rLabel.MarkerId;
-    if ( m_Reconstructions[Index] != NoReconstruction || m_Used[rLabel.Reconstruction] != 0 )
+    pUsed[Reconstruction] = 1;
+    pReconstructions[Index] = Reconstruction;
+    const VReconstruction& rItem = rItems[Reconstruction];
+    const float Own = pRadii[Index];
+    pMarkers[Index] = Placed( rItem.Position, Own > 0 ? Own : rItem.Radius > 0 ? rItem.Radius : UsualRadius );
+  }
+  for ( std::size_t Record = 0; Record < m_Own.size(); ++Record )
+  {
+    const MoxelGraphics::VSubjectRange& rRange = m_Group.Records[Record].Markers;
+    for ( std::uint32_t Index = rRange.First; !m_Own[Record].bOneBone && Index < rRange.First + rRange.Count; ++Index )
     {
-      continue;
+      if ( pReconstructions[Index] == NoReconstruction )
+      {
+        pMarkers[Index] = Nowhere;
+      }
     }
-    m_Used[rLabel.Reconstruction] = 1;
-    m_Reconstructions[Index] = rLabel.Reconstruction;
-    const VReconstruction& rItem = rItems[rLabel.Reconstruction];
-    const float Own = m_Radii[Index];
-    m_Group.Markers[Index] = Placed( rItem.Position, Own > 0 ? Own : rItem.Radius > 0 ? rItem.Radius : UsualRadius );
   }
 }
 

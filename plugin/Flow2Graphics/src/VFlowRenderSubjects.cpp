@@ -6,6 +6,9 @@
 #include <MoxelGraphics/VRenderSubjectDynamics.h>
 #include <MoxelGraphics/VRenderSubjectMarkers.h>
 
+#include <algorithm>
+#include <functional>
+
 namespace Flow2Graphics
 {
 namespace
@@ -147,10 +150,8 @@ void VFlowRenderSubjects::CollectTaken()
     {
       continue;
     }
-    for ( std::size_t Item = 0; Item < Used.size(); ++Item )
-    {
-      m_Found[Item] |= Used[Item];
-    }
+    // Through pointers of its own, as bytes might else be those of the vector itself.
+    std::transform( Used.begin(), Used.end(), m_Found.data(), m_Found.data(), std::bit_or<>() );
   }
   if ( m_Found != m_Taken )
   {

@@ -10,7 +10,12 @@ using Flow2TypesUtils::ETagRequirement;
 template < typename TFlow >
 const auto* ValueAt( const ISubjectSelectionMaker::VExtractor& i_rExtractor, std::size_t i_Slot )
 {
+  constexpr std::size_t Ahead = 4;
   const auto& rValues = i_rExtractor.Values< TFlow >();
+  if ( i_Slot + Ahead < rValues.size() )
+  {
+    __builtin_prefetch( rValues[i_Slot + Ahead] ); // slots are asked for one after another
+  }
   return i_Slot < rValues.size() ? rValues[i_Slot] : nullptr;
 }
 

@@ -110,6 +110,10 @@ void VRenderReconstructions::Render( CoreGraphics::VRenderContext& io_rContext, 
   };
   if ( i_rOptions.Reconstructions )
   {
+    if ( i_rOptions.ReconstructionResiduals )
+    {
+      FillResiduals();
+    }
     Draw( m_Unlabelled );
   }
   const VDisplayRecord& rMarkers = i_rOptions.LabellingSubject;

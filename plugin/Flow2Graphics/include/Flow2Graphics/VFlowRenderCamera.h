@@ -75,8 +75,6 @@ public:
                       ZEK::ECentroidColourScheme i_Colours ) const override;
   const ZEK::VRenderCameraInfo& GetInfo() const override { return m_Info; }
 
-  /// Of the newest state that had the camera.
-  const ZEK::VFlowTimeKey& GetKey() const { return m_Key; }
   const VCameraMarks& GetMarks() const { return m_Marks; }
   /// Null when the camera has none.
   const ZEK::IFlowItem* GetItem( ECameraItem i_Which ) const { return m_Items[i_Which].Get(); }
@@ -89,7 +87,6 @@ public:
   std::size_t BlobCount() const;
 
   // What its provider gives it.
-  void SetKey( const ZEK::VFlowTimeKey& i_rKey ) { m_Key = i_rKey; }
   /// Does nothing for the value that is held; null takes the item away.
   void SetItem( ECameraItem i_Which, ZEK::IFlowItem* i_pNew );
   /// Swaps; does nothing when they are equal.
@@ -110,7 +107,6 @@ private:
   std::string m_DisplayName;
   std::array< ZEK::VFlowItemRef, ECameraItemCount > m_Items;
   VCameraMarks m_Marks;
-  ZEK::VFlowTimeKey m_Key;
   std::unique_ptr< VCameraDrawData > m_pDrawData;
 };
 

@@ -55,7 +55,8 @@ private:
 ///
 /// Draws nothing. It stands in a scene's list before whatever draws cameras, and takes the selection ids of their
 /// centroids and grey blobs. An unchanged frame costs a few comparisons for each tag; a camera of a changed frame
-/// fourteen; neither allocates. Thread: render thread.
+/// fourteen; neither allocates. The generation stays the same as long as all of what cameras give does.
+/// Thread: render thread.
 class VFlowRenderCameraProvider : public ZEK::IRenderCameraProvider, public IFlowRenderType
 {
 public:
@@ -88,13 +89,14 @@ private:
   };
   using VCameraMap = std::unordered_map< std::string, std::shared_ptr< VFlowRenderCamera >, VNameHash >;
 
-  void TakeSubjects( const ZEK::IFlowState& i_rState );
+  // Each true for a change.
+  bool TakeSubjects( const ZEK::IFlowState& i_rState );
+  bool TakeReconstructionLabels( const ZEK::IFlowState& i_rState );
+  bool GiveMarks( bool i_bAll );
+  bool GiveIds( bool i_bAll );
   void TakeNames();
   /// True when a camera changed in a way that a viewer can see.
   bool GiveItems( const ZEK::IFlowState& i_rState, bool i_bAll );
-  void TakeReconstructionLabels( const ZEK::IFlowState& i_rState );
-  void GiveMarks( bool i_bAll );
-  void GiveIds( bool i_bAll );
   void TellScene();
 
   MoxelGraphics::VMoxelScene& m_rScene;
@@ -108,7 +110,7 @@ private:
   bool m_bOtherLabels = false;         ///< than in the update before
   std::vector< VCameraMarks > m_Marks; ///< by slot, while marks are given
   std::uint64_t m_MarksGeneration = 0;
-  std::uint64_t m_Generation = 0; ///< grows with each update
+  std::uint64_t m_Generation = 0; ///< grows with each change
   VCameraMembers m_Centroids, m_Blobs;
   std::uint32_t m_FirstCentroid = 0, m_FirstBlob = 0;
 };

@@ -23,12 +23,14 @@ public:
   bool ResolveIndex( std::uint32_t i_Index, ZEK::VSelectionItem& o_rItem, std::string& o_rLabel ) const override;
   bool FindIndex( const ZEK::VSelectionItem& i_rItem, std::uint32_t& o_rIndex ) const override;
   bool GetPoint( std::uint32_t i_Index, MoxelGraphics::VScenePoint& o_rPoint ) const override;
+  bool GetPose( std::uint32_t i_Index, MoxelGraphics::VScenePose& o_rPose ) const override;
 };
 
 /// Feeds the cameras of the provider, with the ids of their bodies and, of the one camera whose mask can be edited,
 /// those of its cells: the only one that is selected or, where none is, the only one with cells that are. What a wand
 /// leaves in a camera's view is kept for its newest 500 frames; it ages with the frames in which a camera saw the wand
-/// and, while none does, with those of the states. A frame in which nothing changed costs a few comparisons a camera.
+/// and, while none does, with those of the states. A frame in which no camera changed costs the same for any number of
+/// cameras.
 class VFlowRenderCameras : public MoxelGraphics::VRenderCameras, public IFlowRenderType
 {
 public:
@@ -66,7 +68,8 @@ private:
   void TakeWand( VKept& io_rKept, MoxelGraphics::VCameraPictures& io_rPictures );
   /// After all cameras gave what they saw of the wand: what its age is counted from.
   void SettleWand( const ZEK::VFlowTimeKey& i_rKey );
-  void GiveCellIds();
+  /// False while there are none.
+  bool GiveCellIds();
   /// Null for none and for several.
   std::shared_ptr< VFlowRenderCamera > EditedCamera() const;
 
@@ -77,7 +80,7 @@ private:
   std::vector< VKept > m_Kept; ///< by number
   std::vector< MoxelGraphics::VCameraPictures > m_Pictures;
   std::uint64_t m_Generation = 0;
-  std::uint64_t m_MarksGeneration = 0;
+  std::uint64_t m_MarksGeneration = 0, m_CamerasGeneration = 0;
   VSeen m_Seen;
   double m_NewestWand = 0;      ///< the newest frame in which a camera saw the wand
   double m_WandAge = 0;         ///< states since then

@@ -41,7 +41,7 @@ private:
   ZEK::VFlowItemRef m_Set, m_Labels;
   std::vector< VTaken > m_Taken; ///< by camera
   std::vector< MoxelGraphics::VAssignedReconstruction > m_Reconstructions;
-  std::uint64_t m_MarksGeneration = 0;
+  std::uint64_t m_MarksGeneration = 0, m_CamerasGeneration = 0;
   bool m_bCamerasStale = false; ///< what is held differs from the records
   bool m_bReconstructionsStale = false;
 };

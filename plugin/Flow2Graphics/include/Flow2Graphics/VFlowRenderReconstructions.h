@@ -30,6 +30,7 @@ protected:
   void FillLabelled( const MoxelGraphics::VSceneOptions& i_rOptions,
                      MoxelGraphics::VSphereSizing& io_rSizing ) override;
   bool HasLabelled() const override;
+  void FillResiduals() override;
 
 private:
   void Rebuild();
@@ -42,7 +43,9 @@ private:
   std::vector< std::uint8_t > m_UnlabelledFlags;
   std::vector< MoxelGraphics::VScenePoint > m_LabelledPoints;
   std::vector< float > m_LabelledResiduals;
+  std::vector< float > m_Residuals; ///< of the points without a label
   bool m_bLabelledStale = true;
+  bool m_bResidualsStale = true;
   bool m_bLabelledShown = false;
 };
 

@@ -76,8 +76,9 @@ private:
   void Move();
   void MoveBones( const VSubjectMotion& i_rMotion, VOwn& io_rOwn, MoxelGraphics::VSubjectRecord& io_rRecord );
   void PlaceByModel( bool i_bSet );
-  void PlaceRecord( const VSubjectMotion& i_rMotion, const VOwn& i_rOwn, const MoxelGraphics::VSubjectRecord& i_rRecord,
+  void PlaceRecord( const VSubjectMotion& i_rMotion, VOwn& io_rOwn, const MoxelGraphics::VSubjectRecord& i_rRecord,
                     bool i_bSet );
+  const VSubjectMotion& MotionOf( std::size_t i_Record );
   void PlaceByLabels( const VLabelledSet& i_rSet );
   void GiveFlags( const MoxelGraphics::VSelectionRegistry& i_rRegistry );
   bool FindFlags( const MoxelGraphics::VSelectionRegistry& i_rRegistry, const VSubjectMembers& i_rMembers,
@@ -86,7 +87,8 @@ private:
   std::unique_ptr< ISubjectSelectionMaker > m_pMaker;
   Flow2TypesUtils::VTaggedCoreTypeExtractor m_Extractor;
   MoxelGraphics::VSubjectGroup m_Group;
-  std::vector< VOwn > m_Own; ///< by record
+  std::vector< VOwn > m_Own;               ///< by record
+  std::vector< VSubjectMotion > m_Motions; ///< by record, while they are read
   VSubjectDirectory m_Directory;
   VSubjectMembers m_Records, m_Markers, m_Sticks, m_Bones;
   std::vector< float > m_Radii;                   ///< by marker; 0: none of its own
@@ -94,8 +96,9 @@ private:
   std::vector< std::uint32_t > m_Reconstructions; ///< by marker
   std::vector< std::uint8_t > m_Used, m_Flags;
   std::uint64_t m_MarksGeneration = 0, m_FlaggedStructure = 0;
-  bool m_bMoved = false;  ///< the last `Take` changed poses or structure
-  bool m_bHadSet = false; ///< markers were last placed with a set
+  bool m_bMotionsRead = false; ///< since the last `Take`
+  bool m_bMoved = false;       ///< the last `Take` changed poses or structure
+  bool m_bHadSet = false;      ///< markers were last placed with a set
   bool m_bPlaced = false;
   std::atomic< bool > m_bRebuild{ true };
   mutable std::mutex m_NamesGuard;

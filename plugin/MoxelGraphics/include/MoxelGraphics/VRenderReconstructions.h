@@ -52,6 +52,8 @@ public:
 protected:
   /// Called before the points with a label are drawn: the place to set them by what is shown, and how they are sized.
   virtual void FillLabelled( const VSceneOptions& /*i_rOptions*/, VSphereSizing& /*io_rSizing*/ ) {}
+  /// Called before residuals are shown: the place to set those of the points without a label.
+  virtual void FillResiduals() {}
   /// Whether there are points with a label, set or not.
   virtual bool HasLabelled() const { return !m_Labelled.Spheres.IsEmpty(); }
 
