@@ -188,13 +188,13 @@ TEST_F( VRenderCameras, FramesAllocateNothing )
   Tile.CameraView = Tile.CameraBorder = Tile.CameraWandSmear = true;
   Tile.OverlayCamera = QString::fromStdString( Name( 1 ) );
   MoxelGraphics::VRenderCameras& rCameras = *pScene->Cameras();
-  const auto DrawAll = [&]
+  const auto DrawAll = [&]( std::initializer_list< int > i_Modes )
   {
     pScene->Registry().Reset();
     pScene->CameraProvider()->Update( *pScene->State );
     pScene->Cameras()->Update( *pScene->State );
     rContext.ResetState();
-    for ( const int Mode : { 0, 1, 2 } )
+    for ( const int Mode : i_Modes )
     {
       rContext.SetRenderMode( Mode );
       for ( const std::uint32_t Pass : { 0u, 1u, 2u } )
@@ -205,15 +205,20 @@ TEST_F( VRenderCameras, FramesAllocateNothing )
       rCameras.RenderTiles( rContext, Tile );
     }
   };
-  DrawAll();
-  DrawAll();
-  rContext.ResetCounters();
-  const std::uint64_t Before = TestSupport::AllocationCount();
-  for ( int Times = 0; Times < 5; ++Times )
+  const auto Repeat = [&]( std::initializer_list< int > i_Modes )
   {
-    DrawAll();
-  }
+    for ( int Times = 0; Times < 5; ++Times )
+    {
+      DrawAll( i_Modes );
+    }
+  };
+  Repeat( { 0, 1, 2 } );
+  const std::uint64_t Before = TestSupport::AllocationCount();
+  Repeat( { 0, 1, 2 } );
   EXPECT_EQ( TestSupport::AllocationCount(), Before );
+  // A pick writes what reaches into its window.
+  rContext.ResetCounters();
+  Repeat( { 0, 2 } );
   EXPECT_EQ( rContext.BytesUploaded(), 0u );
-  EXPECT_GT( rContext.DrawCalls(), 5u * 9 );
+  EXPECT_GT( rContext.DrawCalls(), 5u * 6 );
 }

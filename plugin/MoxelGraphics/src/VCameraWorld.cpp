@@ -1,5 +1,7 @@
 #include "VCameraWorld.h"
 
+#include "VPickWindow.h"
+
 #include <MoxelGraphics/VMoxelScene.h>
 
 #include <CoreGraphics/VResources.h>
@@ -26,6 +28,19 @@ const VVertexLayout FlagsLayout( 1, 1, { { EAttributeInstanceFlags, 1, GL_UNSIGN
 const VVertexLayout
     RayLayout( 28, 0, { { EAttributePosition, 3, GL_FLOAT, false, 0 }, { EAttributeColour, 4, GL_FLOAT, false, 12 } } );
 constexpr std::size_t RayFloats = 7;
+const VVertexLayout PickedLayout( 68, 1,
+                                  { { EAttributeModelTransform, 16, GL_FLOAT, false, 0 },
+                                    { EAttributeInstanceFlags, 1, GL_UNSIGNED_INT, false, 64 } } );
+constexpr std::uint32_t SkippedShift = 8;
+/// So many can be counted in what the shift leaves.
+constexpr std::size_t MostPicked = 0x4000;
+
+/// What a body lies within, mm; as its vertex program has it.
+const std::array< QVector3D, 8 > BodyCorners{
+    QVector3D( -40, -40, -100 ), QVector3D( 40, -40, -100 ), QVector3D( 40, 40, -100 ), QVector3D( -40, 40, -100 ),
+    QVector3D( -40, -40, 0 ),    QVector3D( 40, -40, 0 ),    QVector3D( 40, 40, 0 ),    QVector3D( -40, 40, 0 ) };
+const std::array< QVector3D, 5 > FrustumCorners{ QVector3D( 0, 0, 0 ), QVector3D( -1, -1, 1 ), QVector3D( 1, -1, 1 ),
+                                                 QVector3D( 1, 1, 1 ), QVector3D( -1, 1, 1 ) };
 
 int Fill( VStaticBuffer& o_rBuffer, const std::vector< VLineVertex >& i_rVertices )
 {
@@ -85,38 +100,56 @@ void VCameraWorld::SetIds( std::uint32_t i_FirstId, std::span< const std::uint8_
                            } );
 }
 
-bool VCameraWorld::FeedFlags( const CoreGraphics::VRenderContext& i_rContext )
+bool VCameraWorld::FeedFlags()
 {
-  const bool bHiding = i_rContext.RenderMode() == ERenderModeSelection && !m_rScene.IgnoredIds().empty();
-  if ( !bHiding )
+  return m_FlagsBuffer.Feed( m_Flags, m_FlagsGeneration );
+}
+
+void VCameraWorld::DrawPicked( CoreGraphics::VRenderContext& io_rContext, VInstancedProgramPair& io_rPair,
+                               const std::vector< ZEK::VMatrix4 >& i_rPlaces, std::span< const QVector3D > i_Corners,
+                               const VVertexStream& i_rShape, VMesh* i_pMesh )
+{
+  const VPickWindow Window( io_rContext );
+  std::array< VScenePoint, 8 > Hull;
+  m_Picked.clear();
+  const std::size_t Count = std::min( i_rPlaces.size(), MostPicked );
+  for ( std::size_t Index = 0; Index < Count; ++Index )
   {
-    return m_FlagsBuffer.Feed( m_Flags, m_FlagsGeneration );
-  }
-  // What a band has found already gives way to what lies behind it.
-  const auto Hide = [&]( bool i_bHide )
-  {
-    for ( std::uint32_t Index = 0; Index < m_Flags.size(); ++Index )
+    const ZEK::VMatrix4& rPlace = i_rPlaces[Index];
+    for ( std::size_t Corner = 0; Corner < i_Corners.size(); ++Corner )
     {
-      const bool bHidden = i_bHide && m_rScene.IgnoreId( m_FirstId + Index, ERenderModeSelection );
-      m_Flags[Index] =
-          static_cast< std::uint8_t >( ( m_Flags[Index] & ~EInstanceHidden ) | ( bHidden ? EInstanceHidden : 0 ) );
+      const QVector3D& rCorner = i_Corners[Corner];
+      const auto At = [&]( std::size_t i_Row )
+      {
+        return rPlace[i_Row] * rCorner.x() + rPlace[4 + i_Row] * rCorner.y() + rPlace[8 + i_Row] * rCorner.z() +
+               rPlace[12 + i_Row];
+      };
+      Hull[Corner] = { At( 0 ), At( 1 ), At( 2 ), 0 };
+      Hull[Corner].Radius = Window.Drawn( 0, Window.Depth( Hull[Corner].X, Hull[Corner].Y, Hull[Corner].Z ) );
     }
-  };
-  Hide( true );
-  const bool bFed = m_FlagsBuffer.Buffer.Write( std::span( std::as_const( m_Flags ) ) );
-  m_FlagsBuffer.Generation = 0;
-  Hide( false );
-  return bFed;
+    // What a band has found already gives way to what lies behind it.
+    if ( Window.MeetsHull( std::span( Hull ).first( i_Corners.size() ) ) &&
+         !m_rScene.IsIgnored( m_FirstId + static_cast< std::uint32_t >( Index ) ) )
+    {
+      const auto Skipped = static_cast< std::uint32_t >( Index - m_Picked.size() );
+      m_Picked.push_back( { rPlace, m_Flags[Index] | Skipped << SkippedShift } );
+    }
+  }
+  if ( !m_Picked.empty() && m_PickedBuffer.Write( std::span( std::as_const( m_Picked ) ) ) )
+  {
+    const VVertexStream Streams[] = { i_rShape, { &m_PickedBuffer, &PickedLayout, 0 } };
+    DrawIds( io_rContext, io_rPair, Streams, i_pMesh, m_Picked.size() );
+  }
 }
 
 void VCameraWorld::DrawIds( CoreGraphics::VRenderContext& io_rContext, VInstancedProgramPair& io_rPair,
-                            std::span< const VVertexStream > i_Streams, VMesh* i_pMesh )
+                            std::span< const VVertexStream > i_Streams, VMesh* i_pMesh, std::size_t i_Count )
 {
   if ( !io_rPair.Use( io_rContext, m_FirstId ) || !io_rContext.SetVertexStreams( i_Streams ) )
   {
     return;
   }
-  const int Instances = static_cast< int >( Count() );
+  const int Instances = static_cast< int >( i_Count );
   if ( i_pMesh )
   {
     io_rContext.SetConstantAttribute( EAttributeModelColour, BodyColour );
@@ -132,25 +165,33 @@ void VCameraWorld::DrawIds( CoreGraphics::VRenderContext& io_rContext, VInstance
 
 void VCameraWorld::DrawBodies( CoreGraphics::VRenderContext& io_rContext )
 {
+  if ( io_rContext.RenderMode() == ERenderModeSelection )
+  {
+    DrawPicked( io_rContext, m_BodyPair, m_Places.Bodies, BodyCorners, m_Body.Stream(), &m_Body );
+    return;
+  }
   const bool bVisible = io_rContext.RenderMode() == ERenderModeNormal;
-  if ( Count() == 0 || !m_BodyBuffer.Feed( m_Places.Bodies, m_PlacesGeneration ) ||
-       ( !bVisible && !FeedFlags( io_rContext ) ) )
+  if ( Count() == 0 || !m_BodyBuffer.Feed( m_Places.Bodies, m_PlacesGeneration ) || ( !bVisible && !FeedFlags() ) )
   {
     return;
   }
   const VVertexStream Streams[] = {
       m_Body.Stream(), { &m_BodyBuffer.Buffer, &PlaceLayout, 0 }, { &m_FlagsBuffer.Buffer, &FlagsLayout, 0 } };
-  DrawIds( io_rContext, m_BodyPair, std::span( Streams ).first( bVisible ? 2 : 3 ), &m_Body );
+  DrawIds( io_rContext, m_BodyPair, std::span( Streams ).first( bVisible ? 2 : 3 ), &m_Body, Count() );
 }
 
 void VCameraWorld::DrawFrustumIds( CoreGraphics::VRenderContext& io_rContext )
 {
-  if ( Count() != 0 && m_FrustumBuffer.Feed( m_Places.Frustums, m_PlacesGeneration ) && FeedFlags( io_rContext ) )
+  const VVertexStream Lines{ &m_Lines, &LineLayout(), 0 };
+  if ( io_rContext.RenderMode() == ERenderModeSelection )
   {
-    const VVertexStream Streams[] = { { &m_Lines, &LineLayout(), 0 },
-                                      { &m_FrustumBuffer.Buffer, &PlaceLayout, 0 },
-                                      { &m_FlagsBuffer.Buffer, &FlagsLayout, 0 } };
-    DrawIds( io_rContext, m_LinePair, Streams, nullptr );
+    DrawPicked( io_rContext, m_LinePair, m_Places.Frustums, FrustumCorners, Lines, nullptr );
+  }
+  else if ( Count() != 0 && m_FrustumBuffer.Feed( m_Places.Frustums, m_PlacesGeneration ) && FeedFlags() )
+  {
+    const VVertexStream Streams[] = {
+        Lines, { &m_FrustumBuffer.Buffer, &PlaceLayout, 0 }, { &m_FlagsBuffer.Buffer, &FlagsLayout, 0 } };
+    DrawIds( io_rContext, m_LinePair, Streams, nullptr, Count() );
   }
 }
 

@@ -60,10 +60,22 @@ private:
     std::size_t First = 0, Count = 0;
   };
 
-  bool FeedFlags( const CoreGraphics::VRenderContext& i_rContext );
+  /// A camera as a pick draws it; the flags are as those of VPickedSphere.
+  struct VPicked
+  {
+    ZEK::VMatrix4 Place;
+    std::uint32_t Flags = 0;
+  };
+
+  /// Draws those of the cameras that reach into a pick's window. The corners are those of what stands in each place.
+  void DrawPicked( CoreGraphics::VRenderContext& io_rContext, CoreGraphics::VInstancedProgramPair& io_rPair,
+                   const std::vector< ZEK::VMatrix4 >& i_rPlaces, std::span< const QVector3D > i_Corners,
+                   const CoreGraphics::VVertexStream& i_rShape, CoreGraphics::VMesh* i_pMesh );
+  bool FeedFlags();
   void Sort();
   void DrawIds( CoreGraphics::VRenderContext& io_rContext, CoreGraphics::VInstancedProgramPair& io_rPair,
-                std::span< const CoreGraphics::VVertexStream > i_Streams, CoreGraphics::VMesh* i_pMesh );
+                std::span< const CoreGraphics::VVertexStream > i_Streams, CoreGraphics::VMesh* i_pMesh,
+                std::size_t i_Count );
   void DrawRun( CoreGraphics::VRenderContext& io_rContext, CoreGraphics::VStaticBuffer& io_rShape, GLenum i_Mode,
                 int i_Vertices, const VRun& i_rRun, const QVector4D& i_rColour );
   void MakeRays();
@@ -87,6 +99,8 @@ private:
   CoreGraphics::VMesh m_Body = MakeCameraMesh();
   CoreGraphics::VStaticBuffer m_Lines, m_Faces, m_Axes;
   int m_LineVertices = 0, m_FaceVertices = 0, m_AxisVertices = 0;
+  std::vector< VPicked > m_Picked;
+  CoreGraphics::VDynamicBuffer m_PickedBuffer;
   VHeldBuffer m_BodyBuffer, m_FrustumBuffer, m_SortedBuffer, m_FlagsBuffer, m_RayBuffer;
   CoreGraphics::VRenderState m_BodyState, m_LineState, m_VeilState;
 };

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <array>
+#include <span>
 
 namespace CoreGraphics
 {
@@ -46,6 +47,20 @@ public:
       return std::max( At( i_rPlane, i_rA.X, i_rA.Y, i_rA.Z ), At( i_rPlane, i_rB.X, i_rB.Y, i_rB.Z ) ) >= -Radius;
     };
     return Inside( m_Planes[0] ) && Inside( m_Planes[1] ) && Inside( m_Planes[2] ) && Inside( m_Planes[3] );
+  }
+  /// Whether something does that lies between points, each with a radius; sure to say yes when it does.
+  bool MeetsHull( std::span< const VScenePoint > i_Points ) const
+  {
+    return std::all_of( m_Planes.begin(), m_Planes.end(),
+                        [&]( const QVector4D& i_rPlane )
+                        {
+                          return std::any_of( i_Points.begin(), i_Points.end(),
+                                              [&]( const VScenePoint& i_rPoint )
+                                              {
+                                                return At( i_rPlane, i_rPoint.X, i_rPoint.Y, i_rPoint.Z ) >=
+                                                       -i_rPoint.Radius;
+                                              } );
+                        } );
   }
   float PixelsAtOne() const { return m_PixelsAtOne; }
 
