@@ -13,6 +13,7 @@
 #include <QtGui/QOpenGLFunctions>
 
 #include <algorithm>
+#include <chrono>
 #include <sstream>
 
 namespace
@@ -41,28 +42,53 @@ void Play( VStandardView& io_rView, int i_Frame )
   Draw( io_rView );
 }
 
-void Run( benchmark::State& io_rState, int i_Scale, EMotion i_Motion )
+/// What is drawn in one repetition after another: a repetition is one frame, so that the median is that of frames.
+struct VRun
 {
-  VStandardView& rView = StandardView( i_Scale );
-  rView.Frame.Input().PickMode = MoxelGraphics::EPickNone;
-  rView.Frame.Input().bReporting = false;
+  VStandardView* pView = nullptr;
   int Frame = 0;
-  for ( ; Frame < FrameCount; ++Frame )
+  double Frames = 0, Allocations = 0, Uploaded = 0;
+
+  /// The view, after two rounds of frames in its first repetition.
+  VStandardView& Warm( int i_Scale )
   {
-    Play( rView, Frame );
+    if ( !std::exchange( pView, &StandardView( i_Scale ) ) )
+    {
+      pView->Frame.Input().bReporting = false;
+      for ( ; Frame < 2 * FrameCount; ++Frame )
+      {
+        Play( *pView, Frame );
+      }
+      Play( *pView, Frame );
+    }
+    return *pView;
   }
-  Play( rView, Frame );
-  const std::uint64_t Before = SceneBench::AllocationCount();
-  std::uint64_t Uploaded = 0;
+};
+
+using VClock = std::chrono::steady_clock;
+
+double Since( VClock::time_point i_Start )
+{
+  return std::chrono::duration< double >( VClock::now() - i_Start ).count();
+}
+
+void Run( benchmark::State& io_rState, const std::shared_ptr< VRun >& i_rpRun, int i_Scale, EMotion i_Motion )
+{
+  VRun& rRun = *i_rpRun;
+  VStandardView& rView = rRun.Warm( i_Scale );
   for ( auto _ : io_rState )
   {
-    Frame += i_Motion;
-    Play( rView, Frame );
-    Uploaded += rView.Frame.Figures().BytesUploaded;
+    const std::uint64_t Before = SceneBench::AllocationCount();
+    rRun.Frame += i_Motion;
+    const VClock::time_point Start = VClock::now();
+    Play( rView, rRun.Frame );
+    io_rState.SetIterationTime( Since( Start ) );
+    rRun.Frames += 1;
+    rRun.Allocations += static_cast< double >( SceneBench::AllocationCount() - Before );
+    rRun.Uploaded += static_cast< double >( rView.Frame.Figures().BytesUploaded );
   }
-  const auto Frames = static_cast< double >( io_rState.iterations() );
-  io_rState.counters["allocations"] = static_cast< double >( SceneBench::AllocationCount() - Before ) / Frames;
-  io_rState.counters["bytes_uploaded"] = static_cast< double >( Uploaded ) / Frames;
+  io_rState.counters["allocations"] = rRun.Allocations / rRun.Frames;
+  io_rState.counters["bytes_uploaded"] = rRun.Uploaded / rRun.Frames;
   io_rState.counters["draw_calls"] = static_cast< double >( rView.Frame.Figures().DrawCalls );
   io_rState.counters["ids"] = rView.pScene->Registry().NextId() - 1;
 }
@@ -124,68 +150,63 @@ std::string CompareBand( VStandardView& io_rView, int i_Frame )
   return Text.str();
 }
 
-void RunPick( benchmark::State& io_rState, double ( *i_pPick )( VStandardView&, int ), bool i_bCompare )
+using VPick = double ( * )( VStandardView&, int );
+
+void RunPick( benchmark::State& io_rState, const std::shared_ptr< VRun >& i_rpRun, VPick i_pPick )
 {
-  VStandardView& rView = StandardView( 1 );
-  int Frame = 0;
-  const auto Once = [&]
+  VRun& rRun = *i_rpRun;
+  const bool bFirst = !rRun.pView;
+  VStandardView& rView = rRun.Warm( 1 );
+  if ( bFirst && i_pPick == PickBand )
   {
-    rView.Frame.Input().bReporting = false;
-    Play( rView, Frame );
-    return i_pPick( rView, Frame++ );
-  };
-  while ( Frame < FrameCount )
-  {
-    Once();
-  }
-  std::size_t Ids = 0, Hits = 0, Layers = 0;
-  for ( auto _ : io_rState )
-  {
-    io_rState.SetIterationTime( Once() );
-    const MoxelGraphics::VPickResult& rResult = rView.Frame.Result();
-    Ids += rResult.Ids.size();
-    Hits += rResult.Selection.empty() ? 0 : 1;
-    Layers += static_cast< std::size_t >( rResult.Layers );
-  }
-  const auto Frames = static_cast< double >( io_rState.iterations() );
-  io_rState.counters["ids"] = static_cast< double >( Ids ) / Frames;
-  io_rState.counters["hits"] = static_cast< double >( Hits ) / Frames;
-  io_rState.counters["layers"] = static_cast< double >( Layers ) / Frames;
-  for ( int Compared = 0; i_bCompare && Compared < FrameCount; Compared += 20 )
-  {
-    if ( const std::string Text = CompareBand( rView, Compared ); !Text.empty() )
+    for ( int Compared = 0; Compared < FrameCount; Compared += 20 )
     {
-      io_rState.SkipWithError( Text.c_str() );
-      return;
+      if ( const std::string Text = CompareBand( rView, Compared ); !Text.empty() )
+      {
+        io_rState.SkipWithError( Text.c_str() );
+        return;
+      }
     }
   }
+  for ( auto _ : io_rState )
+  {
+    rView.Frame.Input().bReporting = false;
+    Play( rView, rRun.Frame );
+    io_rState.SetIterationTime( i_pPick( rView, rRun.Frame++ ) );
+  }
+  const MoxelGraphics::VPickResult& rResult = rView.Frame.Result();
+  io_rState.counters["ids"] = static_cast< double >( rResult.Ids.size() );
+  io_rState.counters["layers"] = rResult.Layers;
 }
 
 template < typename... TArguments >
-benchmark::internal::Benchmark* Add( const std::string& i_rName, int i_Iterations, int i_Repetitions,
-                                     TArguments... i_Arguments )
+benchmark::internal::Benchmark* Add( const std::string& i_rName, int i_Frames, TArguments... i_Arguments )
 {
   return benchmark::RegisterBenchmark( i_rName.c_str(), i_Arguments... )
-      ->Iterations( i_Iterations )
-      ->Repetitions( i_Repetitions )
+      ->Iterations( 1 )
+      ->Repetitions( i_Frames )
+      ->UseManualTime()
       ->ReportAggregatesOnly();
 }
 
-/// A figure is the median of several runs of whole rounds through the frames.
 void AddAll()
 {
+  const auto New = []
+  {
+    return std::make_shared< VRun >();
+  };
   for ( const int Scale : { 1, 10 } )
   {
     const std::string End = std::string( "S" ).append( std::to_string( Scale ) );
-    Add( std::string( "scene/submit/" ).append( End ), 10 * FrameCount, 9, Run, Scale, EMoving )
+    Add( std::string( "scene/submit/" ).append( End ), 10 * FrameCount, Run, New(), Scale, EMoving )
         ->Unit( benchmark::kMicrosecond );
-    Add( std::string( "scene/still/" ).append( End ), 10 * FrameCount, 9, Run, Scale, EStill )
+    Add( std::string( "scene/still/" ).append( End ), 10 * FrameCount, Run, New(), Scale, EStill )
         ->Unit( benchmark::kMicrosecond );
-    Add( std::string( "scene/frame/" ).append( End ), FrameCount, 3, Run, Scale, EMoving )
+    Add( std::string( "scene/frame/" ).append( End ), FrameCount, Run, New(), Scale, EMoving )
         ->Unit( benchmark::kMillisecond );
   }
-  Add( "pick/point", FrameCount, 9, RunPick, PickPoint, false )->UseManualTime()->Unit( benchmark::kMicrosecond );
-  Add( "pick/band", FrameCount, 5, RunPick, PickBand, true )->UseManualTime()->Unit( benchmark::kMicrosecond );
+  Add( "pick/point", FrameCount, RunPick, New(), PickPoint )->Unit( benchmark::kMicrosecond );
+  Add( "pick/band", FrameCount, RunPick, New(), PickBand )->Unit( benchmark::kMicrosecond );
 }
 } // namespace
 
