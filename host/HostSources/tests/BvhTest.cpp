@@ -107,7 +107,7 @@ TEST( Bvh, AStateOfZerosIsTheFigureAsItIsDrawnUp )
     EXPECT_NEAR( pPlace[2], i_Z, 1e-9 );
   };
   ASSERT_TRUE( pSubject->LoadState( std::vector< double >( rSkeleton.StateSize ) ).IsOk() );
-  const double Unit = pSubject->WorldTransforms()[0].m_Translation[1] / 90; // the reader guesses it
+  constexpr double Unit = 10; // mm in one of the file's
   ExpectPlace( 1, 10 * Unit, 110 * Unit, 0 );
   ASSERT_TRUE( pSubject->LoadState( rSkeleton.State( 0 ) ).IsOk() );
   ExpectPlace( 0, 1 * Unit, 2 * Unit, 3 * Unit );
