@@ -40,6 +40,8 @@ public:
   void Update() { ProcessPending(); }
   /// True unless something is played back and its time lies outside the range.
   bool currentTimeWithinRange() const { return m_bWithinRange; }
+  /// What the context's cache has of it.
+  void FetchAround( const ZEK::VFlowTimeRange& i_rRange, std::vector< ZEK::VFlowStateRef >& o_rStates ) override;
 
 signals:
   void CurrentTimeWithinRangeChanged();
