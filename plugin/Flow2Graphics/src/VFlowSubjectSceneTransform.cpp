@@ -81,15 +81,17 @@ ZEK::VFlowStateRef& VFlowSubjectSceneTransform::Transform( ZEK::VFlowStateRef& o
     return o_rState;
   }
   State->CopyItems( rInput, PassedTags );
-  m_pExtractor->Update( *State, ZEK::EFlowNameObject, ZEK::EFlowTimeMatch::Overlap, Key );
+  // The input, which stays as it is, has the same items; the new state is still being built.
+  m_pExtractor->Update( rInput, ZEK::EFlowNameObject, ZEK::EFlowTimeMatch::Overlap, Key );
 
   const std::int32_t Pose = ReadIndex( i_rParameters, "PoseIndex", 0 );
   m_LabellingPose.SetPose( ReadIndex( i_rParameters, "LabellingPoseIndex", Pose ) );
   m_SolvingPose.SetPose( ReadIndex( i_rParameters, "SolvingPoseIndex", Pose ) );
 
+  const bool bYUp = IsYUp( rInput, false );
   const bool bArranged = m_pArrangement->Update( *m_pExtractor );
-  ApplyPose< FlowSubjectParametrised, FlowSubjectDynamicParameters >( m_LabellingPose, *State );
-  ApplyPose< FlowSubjectParametrisedForSolving, FlowSubjectDynamicParametersForSolving >( m_SolvingPose, *State );
+  ApplyPose< FlowSubjectParametrised, FlowSubjectDynamicParameters >( m_LabellingPose, bYUp, *State );
+  ApplyPose< FlowSubjectParametrisedForSolving, FlowSubjectDynamicParametersForSolving >( m_SolvingPose, bYUp, *State );
   if ( bArranged )
   {
     UpdateVolume();
@@ -114,13 +116,12 @@ void VFlowSubjectSceneTransform::VPoseRecord::SetPose( std::int32_t i_Index )
 }
 
 template < typename TParametrised, typename TDynamics >
-void VFlowSubjectSceneTransform::ApplyPose( VPoseRecord& io_rRecord, ZEK::IFlowState& io_rState )
+void VFlowSubjectSceneTransform::ApplyPose( VPoseRecord& io_rRecord, bool i_bYUp, ZEK::IFlowState& io_rState )
 {
   m_pExtractor->Items< TParametrised >( m_Sources );
   TakeSources( io_rRecord );
   m_Sources.clear();
-  const bool bYUp = IsYUp( io_rState, false );
-  const bool bTurned = std::exchange( io_rRecord.bYUp, bYUp ) != bYUp;
+  const bool bTurned = std::exchange( io_rRecord.bYUp, i_bYUp ) != i_bYUp;
   const std::vector< VSubjectPlace >& rPlaces = m_pArrangement->Places();
   for ( std::size_t Slot = 0; Slot < io_rRecord.Sources.size(); ++Slot )
   {

@@ -43,7 +43,7 @@ private:
   };
 
   template < typename TParametrised, typename TDynamics >
-  void ApplyPose( VPoseRecord& io_rRecord, ZEK::IFlowState& io_rState );
+  void ApplyPose( VPoseRecord& io_rRecord, bool i_bYUp, ZEK::IFlowState& io_rState );
   /// Brings the record to the slots of the join, as `m_Sources` has them; what was posed moves to its slot.
   void TakeSources( VPoseRecord& io_rRecord );
   ZEK::VFlowItemRef Posed( const ZEK::VFlowItemType& i_rType, const ZEK::IFlowItem& i_rSource,
