@@ -1,7 +1,6 @@
 #include <HostMeshes/ReadMesh.h>
 
 #include "MeshImport.h"
-#include "MeshLog.h"
 #include "SceneBuilder.h"
 
 #include <assimp/scene.h>
@@ -50,11 +49,6 @@ ZEK::IResult Read( std::span< const std::byte > i_Bytes, const std::string& i_rN
     {
       o_rMesh.Name = i_rName;
       o_rMessage = Builder.Repairs();
-      if ( !o_rMessage.empty() )
-      {
-        ZEK::Log( MeshLog(), ZEK::ELogWarning, "Of mesh \"%1%\" was left out, being broken: %2%", i_rName, o_rMessage );
-        o_rMessage.clear();
-      }
       return ZEK::IResult::Ok;
     }
   }

@@ -51,6 +51,10 @@ struct VMeshCache::VState
     std::string Category, Name;
   };
 
+  explicit VState( std::filesystem::path i_Reader )
+    : Reader( std::move( i_Reader ) )
+  {
+  }
   ~VState()
   {
     {
@@ -65,6 +69,7 @@ struct VMeshCache::VState
   VMeshRef Find( const std::string& i_rName, const std::vector< std::filesystem::path >& i_rFolders );
   VMeshRef ReadFile( const std::filesystem::path& i_rPath );
 
+  const std::filesystem::path Reader;
   mutable std::mutex Guard;
   mutable std::condition_variable Wake;
   std::map< std::string, VMeshRef > BuiltIns;
@@ -72,6 +77,7 @@ struct VMeshCache::VState
   std::deque< VJob > Jobs;
   bool bStopping = false;
   bool bBusy = false;
+  std::uint64_t ReadCount = 0;
   bool bForgetFailures = false;
   ZEK::VMultiCallback< void() > Changed;
 
@@ -99,6 +105,7 @@ void VMeshCache::VState::Run()
     const VJob Job = std::move( Jobs.front() );
     Jobs.pop_front();
     bBusy = true;
+    ++ReadCount;
     const std::vector< std::filesystem::path > Folders = Categories[Job.Category].Folders;
     const bool bForget = std::exchange( bForgetFailures, false );
     Categories[Job.Category].Entries[Job.Name].bQueued = false;
@@ -160,8 +167,15 @@ VMeshCache::VMeshRef VMeshCache::VState::ReadFile( const std::filesystem::path& 
   try
   {
     auto pMesh = std::make_shared< VMeshScene >();
-    if ( ReadMesh( i_rPath, *pMesh, Message ).IsOk() )
+    const ZEK::IResult Read =
+        Reader.empty() ? ReadMesh( i_rPath, *pMesh, Message ) : ReadMeshApart( Reader, i_rPath, *pMesh, Message );
+    if ( Read.IsOk() )
     {
+      if ( !Message.empty() )
+      {
+        ZEK::Log( MeshLog(), ZEK::ELogWarning, "Of mesh \"%1%\" was left out, being broken: %2%", i_rPath.string(),
+                  Message );
+      }
       return It->second = std::move( pMesh );
     }
   }
@@ -173,8 +187,8 @@ VMeshCache::VMeshRef VMeshCache::VState::ReadFile( const std::filesystem::path& 
   return nullptr;
 }
 
-VMeshCache::VMeshCache()
-  : m_pState( std::make_unique< VState >() )
+VMeshCache::VMeshCache( std::filesystem::path i_Reader )
+  : m_pState( std::make_unique< VState >( std::move( i_Reader ) ) )
 {
 }
 
@@ -253,6 +267,12 @@ bool VMeshCache::CanRead( const std::filesystem::path& i_rPath ) const
 {
   std::error_code Error;
   return IsMeshName( i_rPath ) && std::filesystem::is_regular_file( i_rPath, Error );
+}
+
+std::uint64_t VMeshCache::ReadCount() const
+{
+  const std::lock_guard Lock( m_pState->Guard );
+  return m_pState->ReadCount + m_pState->Jobs.size();
 }
 
 bool VMeshCache::WaitUntilRead( std::chrono::milliseconds i_Longest ) const

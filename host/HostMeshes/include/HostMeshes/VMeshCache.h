@@ -19,7 +19,9 @@ class VMeshCache final : public HarrowPluginInterface::VMeshSceneCache
 public:
   using VMeshRef = std::shared_ptr< const HarrowPluginInterface::VMeshScene >;
 
-  VMeshCache();
+  /// `i_Reader` is the program that reads files, "harrow-mesh-reader". Without it they are read in this process, which
+  /// a file made to do harm may end.
+  explicit VMeshCache( std::filesystem::path i_Reader = {} );
   ~VMeshCache() override;
   VMeshCache( const VMeshCache& ) = delete;
   VMeshCache& operator=( const VMeshCache& ) = delete;
@@ -32,6 +34,8 @@ public:
   VMeshRef Request( const std::string& i_rCategory, const std::string& i_rName ) override;
   bool CanRead( const std::filesystem::path& i_rPath ) const override;
 
+  /// How often a file was looked for or read so far.
+  std::uint64_t ReadCount() const;
   /// Waits until all that was asked for is read or has failed, and `Changed` has fired. False when it takes longer.
   bool WaitUntilRead( std::chrono::milliseconds i_Longest ) const;
 
