@@ -172,6 +172,13 @@ CoreGraphics::VMesh MakeStickMesh()
   return VMesh( PositionLayout(), Points, Indices );
 }
 
+CoreGraphics::VMesh MakeStickLine()
+{
+  const std::vector< QVector3D > Points{ QVector3D( 0, 0, 0 ), QVector3D( 0, 0, 1 ) };
+  const std::vector< std::uint32_t > Indices{ 0, 1 };
+  return VMesh( PositionLayout(), Points, Indices );
+}
+
 const CoreGraphics::VVertexLayout& SphereNormalLayout()
 {
   static constexpr VVertexLayout Layout(

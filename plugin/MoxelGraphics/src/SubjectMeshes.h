@@ -22,6 +22,8 @@ std::unique_ptr< CoreGraphics::VMesh > MakeBoneMesh( const HarrowPluginInterface
 CoreGraphics::VMesh MakeAxesMesh();
 /// A closed cylinder of radius 1 from z = 0 to 1. Positions alone.
 CoreGraphics::VMesh MakeStickMesh();
+/// Its axis alone.
+CoreGraphics::VMesh MakeStickLine();
 /// Reads a sphere's places as its normals, too.
 const CoreGraphics::VVertexLayout& SphereNormalLayout();
 
