@@ -84,6 +84,7 @@ struct VSubjectLook
 {
   CoreGraphics::VInstancedProgramPair Programs;
   CoreGraphics::VMesh* pMesh = nullptr;
+  GLenum Mode = GL_TRIANGLES;                               ///< what the mesh is made of
   const CoreGraphics::VVertexLayout* pMeshLayout = nullptr; ///< null: the mesh's own
   const CoreGraphics::VVertexLayout* pSeen = nullptr;       ///< of VInstance with colours
   const CoreGraphics::VVertexLayout* pPicked = nullptr;     ///< of VInstance with flags
@@ -144,7 +145,7 @@ public:
         return;
       }
       i_rPrepare( *io_rLook.Programs.Current() );
-      io_rContext.DrawElementsInstanced( GL_TRIANGLES, *io_rLook.pMesh, static_cast< int >( End - Begin ) );
+      io_rContext.DrawElementsInstanced( io_rLook.Mode, *io_rLook.pMesh, static_cast< int >( End - Begin ) );
     }
   }
 
@@ -162,7 +163,8 @@ private:
 
 inline bool Reaches( const VPickWindow& i_rWindow, const VScenePoint& i_rSphere )
 {
-  return i_rWindow.Meets( i_rSphere.X, i_rSphere.Y, i_rSphere.Z, i_rSphere.Radius );
+  const float Depth = i_rWindow.Depth( i_rSphere.X, i_rSphere.Y, i_rSphere.Z );
+  return i_rWindow.Meets( i_rSphere.X, i_rSphere.Y, i_rSphere.Z, i_rWindow.Drawn( i_rSphere.Radius, Depth ) );
 }
 inline bool Reaches( const VPickWindow& i_rWindow, const VColumns& i_rColumns )
 {
@@ -212,7 +214,15 @@ void DrawMarked( CoreGraphics::VRenderContext& io_rContext, const VMoxelScene& i
     for ( std::size_t Index = 0; Index < Count; ++Index )
     {
       const std::uint32_t Id = i_rShapes.Id( Index );
-      if ( Id != 0 && i_rShapes.Make( Index, Geometry ) && Reaches( Window, Geometry ) && !i_rScene.IsIgnored( Id ) )
+      if ( Id == 0 || !i_rShapes.Make( Index, Geometry ) )
+      {
+        continue;
+      }
+      if constexpr ( requires { TShapes::Widen( Geometry, 0.0F ); } )
+      {
+        TShapes::Widen( Geometry, Window.Drawn( 0, Window.Depth( Geometry[9], Geometry[10], Geometry[11] ) ) );
+      }
+      if ( Reaches( Window, Geometry ) && !i_rScene.IsIgnored( Id ) )
       {
         io_rPicked.Add( Id, i_rShapes.Flags( Index ), Geometry );
       }

@@ -8,6 +8,7 @@
 #include <algorithm>
 #include <array>
 #include <bit>
+#include <cmath>
 #include <cstddef>
 #include <cstdint>
 #include <vector>
@@ -18,7 +19,7 @@ namespace MoxelGraphics
 constexpr float BoneJointRadius = 5.0F; // mm
 constexpr float TargetRadius = 5.0F;    // mm
 constexpr float AxisLength = 50.0F;     // mm
-constexpr float StickRadius = 4.0F;     // mm
+constexpr float StickRadius = 3.5F;     // mm
 constexpr float MarkerRadius = 7.0F;    // mm, of a marker that brings none
 constexpr float EllipsoidSigmas = 2.0F;
 
@@ -42,12 +43,16 @@ inline bool IsPlace( const VScenePoint& i_rPoint )
 }
 inline bool IsPose( const VBonePose& i_rPose )
 {
-  float Sum = 0;
-  for ( const float Value : i_rPose )
+  // Four sums side by side: one alone would be a chain of waiting.
+  std::array< float, 4 > Sums{};
+  for ( std::size_t Row = 0; Row < 12; Row += 4 )
   {
-    Sum += Value * 0;
+    for ( std::size_t Column = 0; Column < 4; ++Column )
+    {
+      Sums[Column] += i_rPose[Row + Column] * 0;
+    }
   }
-  return Sum == 0.0F;
+  return ( Sums[0] + Sums[1] ) + ( Sums[2] + Sums[3] ) == 0.0F;
 }
 /// The pose as columns, its axes scaled.
 inline VColumns ToColumns( const VBonePose& i_rPose, float i_X, float i_YZ )
@@ -93,6 +98,19 @@ struct VStickShapes
   bool bDuringGaps = false;
 
   std::size_t Count() const { return rGroup.Sticks.size(); }
+  /// What `Make` does for a stick whose ends were both seen, at less cost; false for any other.
+  bool MakeWhole( std::size_t i_Index, VEnds& o_rEnds ) const
+  {
+    const VSubjectStick& rStick = rGroup.Sticks[i_Index];
+    if ( rStick.A >= rGroup.Markers.size() || rStick.B >= rGroup.Markers.size() )
+    {
+      return false;
+    }
+    const VScenePoint& rA = rGroup.Markers[rStick.A];
+    const VScenePoint& rB = rGroup.Markers[rStick.B];
+    o_rEnds = { { rA.X, rA.Y, rA.Z }, { rB.X, rB.Y, rB.Z } };
+    return ( ( rA.X + rA.Y ) + ( rA.Z + rB.X ) + ( rB.Y + rB.Z ) ) * 0 == 0;
+  }
   bool Make( std::size_t i_Index, VEnds& o_rEnds ) const
   {
     const VSubjectStick& rStick = rGroup.Sticks[i_Index];
@@ -141,6 +159,22 @@ struct VBoneShapes
     }
     o_rColumns = ToColumns( rPose, Length, std::clamp( Length, Thinnest, Thickest ) );
     return true;
+  }
+  /// Makes a bone no thinner than a radius, so that it can be hit.
+  static void Widen( VColumns& io_rColumns, float i_Radius )
+  {
+    constexpr float HalfWidth = 0.07F;
+    const float Square =
+        io_rColumns[3] * io_rColumns[3] + io_rColumns[4] * io_rColumns[4] + io_rColumns[5] * io_rColumns[5];
+    const float Wanted = i_Radius / HalfWidth;
+    if ( Square > 0 && Square < Wanted * Wanted )
+    {
+      const float Factor = Wanted / std::sqrt( Square );
+      for ( std::size_t Index = 3; Index < 9; ++Index )
+      {
+        io_rColumns[Index] *= Factor;
+      }
+    }
   }
   std::uint32_t Id( std::size_t i_Index ) const { return rFlags.Id( i_Index ); }
   std::uint8_t Flags( std::size_t i_Index ) const { return rFlags.At( i_Index ); }
@@ -247,8 +281,8 @@ struct VMissingShapes
   /// What these depend on; the last part is free.
   std::array< std::uint64_t, 4 > Key() const
   {
-    const std::uint64_t Size = std::uint64_t{ std::bit_cast< std::uint32_t >( Scale ) } << 1;
-    return { rGroup.StructureGeneration, rGroup.MarkerGeneration, Size | ( bOwnRadius ? 1U : 0U ), 0 };
+    const std::uint64_t Sizing = std::uint64_t{ std::bit_cast< std::uint32_t >( Scale ) } << 1;
+    return { rGroup.StructureGeneration, rGroup.MarkerGeneration, Sizing | ( bOwnRadius ? 1U : 0U ), 0 };
   }
   /// At most how many there are.
   std::size_t Missing() const

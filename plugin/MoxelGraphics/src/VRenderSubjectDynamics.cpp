@@ -201,11 +201,13 @@ void VRenderSubjectDynamics::Render( CoreGraphics::VRenderContext& io_rContext, 
                                      std::uint32_t i_Pass )
 {
   TakeBoneMesh();
-  const auto Shows = []( const VDisplayRecord& i_rRecord )
+  // Bones of both kinds lie in each other: those that are labelled let the solved ones through.
+  const auto Shows = [&]( EGroup i_Group )
   {
-    return i_rRecord.Enabled && i_rRecord.Bones;
+    const VDisplayRecord& rRecord = Record( i_rOptions, i_Group );
+    return rRecord.Enabled && rRecord.Bones && m_Groups[i_Group] && !m_Groups[i_Group]->rGroup.Bones.empty();
   };
-  const bool bBoth = Shows( i_rOptions.LabellingSubject ) && Shows( i_rOptions.SolvingSubject );
+  const bool bBoth = Shows( ESubjects ) && Shows( ESolved );
   for ( std::size_t Group = 0; Group < GroupCount; ++Group )
   {
     if ( !m_Groups[Group] )
@@ -370,11 +372,13 @@ std::size_t VRenderSubjectDynamics::DrawBones( const VPass& i_rPass, bool i_bTra
                                              [&]( VColumns* o_pColumns )
                                              {
                                                std::size_t Shown = 0;
-                                               VColumns Columns;
                                                for ( std::size_t Index = 0; Index < Count; ++Index )
                                                {
-                                                 const bool bShown = Shapes.Make( Index, Columns );
-                                                 o_pColumns[Index] = bShown ? Columns : NowhereColumns;
+                                                 const bool bShown = Shapes.Make( Index, o_pColumns[Index] );
+                                                 if ( !bShown )
+                                                 {
+                                                   o_pColumns[Index] = NowhereColumns;
+                                                 }
                                                  Shown += bShown ? 1 : 0;
                                                }
                                                return VFilled{ Count, Shown };

@@ -25,6 +25,8 @@ constexpr float ThinPixels = 1.5F;
 constexpr std::size_t ThickShare = 16;
 /// A round stick in the distance is no thinner than this.
 constexpr float SmallestStickPixels = 0.6F; // radius
+/// A pointer at a marker means the marker, not the stick that comes out of it towards the eye.
+constexpr float PickRetreat = 6.0F; // radii of the stick
 
 struct VStickColours
 {
@@ -50,13 +52,14 @@ VSphereSizing Sizing( const VSceneOptions& i_rOptions )
 struct VRenderSubjectMarkers::VGl
 {
   VMesh Sphere = MakeSphereMesh( 1 );
-  VMesh Stick = MakeStickMesh();
+  VMesh Stick = MakeStickMesh(), StickLine = MakeStickLine();
   VSubjectLook Targets;
-  VSubjectLook Sticks;
+  VSubjectLook Sticks, ThinSticks; ///< the thin ones are for picks
   std::shared_ptr< VShaderProgram > pLines;
   VRenderState LineState;
   VUniform StickWidth{ "u_StickRadius" };
   VUniform SmallestRadius{ "u_SmallestRadius" };
+  VUniform Retreat{ "u_Retreat" };
   VGatheredInstances< VScenePoint > PickedTargets;
   VGatheredInstances< VEnds > PickedSticks;
 };
@@ -110,6 +113,11 @@ VRenderSubjectMarkers::VRenderSubjectMarkers( VMoxelScene& i_rScene )
   rGl.Sticks.pMesh = &rGl.Stick;
   rGl.Sticks.pPicked = &PickedEndsLayout();
   rGl.Sticks.State = SolidState();
+  rGl.ThinSticks.Programs.Load( rResources, "StickBetween", "Colour" );
+  rGl.ThinSticks.pMesh = &rGl.StickLine;
+  rGl.ThinSticks.Mode = GL_LINES;
+  rGl.ThinSticks.pPicked = &PickedEndsLayout();
+  rGl.ThinSticks.State = SolidState();
   rGl.pLines = rResources.GetProgram( "Simple3DVertexColour", "Colour" );
   rGl.LineState.depthFunction = EDepthLessOrEqual;
 }
@@ -240,13 +248,16 @@ std::size_t VRenderSubjectMarkers::RenderSticks( CoreGraphics::VRenderContext& i
   io_rDraw.StickFlags.Update( rGroup, rGroup.StickIds, rGroup.Sticks.size(), &VSubjectRecord::Sticks,
                               i_rOptions.HighlightCurrentSubject );
   const VStickShapes Shapes{ rGroup, io_rDraw.StickFlags, i_bDuringGaps };
-  DrawMarked( io_rContext, m_rScene, rGl.Sticks, io_rDraw.Sticks, rGl.PickedSticks, Shapes,
+  // A pick looks for thin ones as they are seen: a band full of them is a matter of pixels.
+  const bool bThin = io_rContext.RenderMode() == ERenderModeSelection && io_rDraw.AreSticksThin( io_rContext );
+  DrawMarked( io_rContext, m_rScene, bThin ? rGl.ThinSticks : rGl.Sticks, io_rDraw.Sticks, rGl.PickedSticks, Shapes,
               { rGroup.StructureGeneration, rGroup.MarkerGeneration, io_rDraw.StickFlags.Generation(),
                 i_bDuringGaps ? 1U : 0U },
               [&]( VShaderProgram& io_rProgram )
               {
                 rGl.StickWidth.Set( io_rProgram, StickRadius );
                 rGl.SmallestRadius.Set( io_rProgram, SmallestPixels );
+                rGl.Retreat.Set( io_rProgram, io_rContext.RenderMode() == ERenderModeSelection ? PickRetreat : 0.0F );
               } );
   return 0;
 }
@@ -260,11 +271,13 @@ bool VRenderSubjectMarkers::VGroupDraw::FeedSticks( bool i_bDuringGaps )
       [&]( VEnds* o_pEnds )
       {
         std::size_t Shown = 0;
-        VEnds Ends;
         for ( std::size_t Index = 0; Index < Count; ++Index )
         {
-          const bool bShown = Shapes.Make( Index, Ends );
-          o_pEnds[Index] = bShown ? Ends : NowhereEnds;
+          const bool bShown = Shapes.MakeWhole( Index, o_pEnds[Index] ) || Shapes.Make( Index, o_pEnds[Index] );
+          if ( !bShown )
+          {
+            o_pEnds[Index] = NowhereEnds;
+          }
           Shown += bShown ? 1 : 0;
         }
         return VFilled{ Count, Shown };
@@ -336,6 +349,7 @@ void VRenderSubjectMarkers::DrawRound( CoreGraphics::VRenderContext& io_rContext
   }
   m_pGl->StickWidth.Set( *rLook.Programs.Current(), StickRadius );
   m_pGl->SmallestRadius.Set( *rLook.Programs.Current(), SmallestStickPixels );
+  m_pGl->Retreat.Set( *rLook.Programs.Current(), 0.0F );
   io_rContext.SetRenderState( rLook.State );
   io_rContext.DrawElementsInstanced( GL_TRIANGLES, *rLook.pMesh, static_cast< int >( io_rDraw.Sticks.Seen.Count() ) );
 }

@@ -11,6 +11,8 @@ uniform mat4 u_Projection;
 uniform vec2 u_ViewportSize;
 uniform float u_StickRadius;
 uniform float u_SmallestRadius; // pixels
+uniform float u_Retreat;        // how far behind its place it stands, in radii: what it ends in goes first
+uniform vec3 u_CameraPosition;
 
 attribute vec3 a_position;
 
@@ -28,6 +30,7 @@ void main()
   float smallest = 2.0 * u_SmallestRadius * w / ( u_Projection[1][1] * u_ViewportSize.y );
   float radius = max( u_StickRadius, smallest );
   v_colour = mix( u_StickColourA, u_StickColourB, a_position.z );
-  gl_Position =
-      u_ViewProjection * vec4( end + radius * ( a_position.x * side + a_position.y * cross( axis, side ) ), 1.0 );
+  vec3 place = end + radius * ( a_position.x * side + a_position.y * cross( axis, side ) );
+  vec3 away = u_Projection[3][3] == 0.0 ? normalize( place - u_CameraPosition ) : vec3( 0.0 );
+  gl_Position = u_ViewProjection * vec4( place + u_Retreat * radius * away, 1.0 );
 }
