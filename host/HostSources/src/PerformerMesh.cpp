@@ -44,7 +44,7 @@ constexpr VFlesh TrunkFlesh[] = {
     { EHips, EPart::Trunk, { -12, 62, 5 }, 98, { -12, 45, 60 }, 92 },    // of both sides, as all with a y
     { EHips, EPart::Trunk, { -38, 55, -35 }, 78, { -35, 50, 0 }, 80 },   // seat
     { ESpine, EPart::Trunk, { 4, 44, -20 }, 95, { 4, 44, 110 }, 98 },    // waist
-    { EChest, EPart::Trunk, { 8, 44, 0 }, 104, { 10, 60, 150 }, 109 },    // ribs
+    { EChest, EPart::Trunk, { 8, 44, 0 }, 104, { 10, 60, 150 }, 109 },   // ribs
     { EChest, EPart::Trunk, { 4, 45, 200 }, 82, { 4, 105, 215 }, 66 },   // shoulder blades
     { EChest, EPart::Trunk, { -5, 25, 255 }, 55, { -5, 110, 235 }, 46 }, // neck to shoulder
     { ENeck, EPart::Trunk, { 0, 0, -10 }, 56, { 10, 0, 95 }, 54 },
@@ -61,8 +61,8 @@ constexpr VFlesh ArmFlesh[] = { { ELeftClavicle, EPart::Trunk, { -5, 60, 0 }, 52
                                 { ELeftHand, EPart::Arm, { 14, -4, -90 }, 21, { 10, -14, -165 }, 16 },
                                 { ELeftHand, EPart::Arm, { -14, -4, -90 }, 21, { -8, -14, -158 }, 15 },
                                 { ELeftHand, EPart::Arm, { 24, 0, -30 }, 19, { 52, -12, -95 }, 16 } }; // thumb
-constexpr VFlesh LegFlesh[] = { { ELeftThigh, EPart::Leg, { 0, 10, -20 }, 92, { 4, 2, -200 }, 76 },
-                                { ELeftThigh, EPart::Leg, { 4, 2, -200 }, 68, { 6, 0, -410 }, 50 },
+constexpr VFlesh LegFlesh[] = { { ELeftThigh, EPart::Leg, { 0, 10, -20 }, 90, { 4, 2, -200 }, 70 },
+                                { ELeftThigh, EPart::Leg, { 4, 2, -200 }, 70, { 6, 0, -410 }, 50 },
                                 { ELeftShin, EPart::Leg, { 6, 0, -10 }, 50, { 0, 0, -100 }, 47 },
                                 { ELeftShin, EPart::Leg, { -16, 2, -90 }, 45, { -14, 0, -210 }, 41 }, // calf
                                 { ELeftShin, EPart::Leg, { 4, 0, -100 }, 43, { 0, 0, -400 }, 32 },

@@ -39,7 +39,7 @@ struct VPerformerMesh
   std::vector< std::uint32_t > Triangles; ///< three vertices each, counter-clockwise from outside
 };
 
-/// Takes some hundredths of a second. Thread: any.
+/// Takes about a twentieth of a second. Thread: any.
 VPerformerMesh MakePerformerMesh( EPerformerMesh i_Mesh );
 
 } // namespace HostSources
