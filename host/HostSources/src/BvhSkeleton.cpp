@@ -18,26 +18,57 @@ bool HasPosition( const VJoint& i_rJoint )
                       } );
 }
 
+/// Which joint's shift each joint's own bone follows; -1 where no joint below is away from it.
+std::vector< std::int32_t > BoneEnds( const std::vector< VJoint >& i_rJoints )
+{
+  std::vector< std::int32_t > Ends( i_rJoints.size(), -1 );
+  for ( std::size_t Index = 0; Index < i_rJoints.size(); ++Index )
+  {
+    const VJoint& rJoint = i_rJoints[Index];
+    if ( rJoint.Parent >= 0 && LengthOf( rJoint.Offset ) > ShortestBone )
+    {
+      std::int32_t& rEnd = Ends[static_cast< std::size_t >( rJoint.Parent )];
+      rEnd = rEnd < 0 ? static_cast< std::int32_t >( Index ) : rEnd;
+    }
+  }
+  return Ends;
+}
+
+/// The bones to joints that are not at the end of their parent's own one.
+void AddFurtherBones( const std::vector< VJoint >& i_rJoints, const std::vector< std::int32_t >& i_rEnds,
+                      CoreMoxelTypes::VSubject& io_rSubject )
+{
+  for ( std::size_t Index = 0; Index < i_rJoints.size(); ++Index )
+  {
+    const VJoint& rJoint = i_rJoints[Index];
+    const double Length = LengthOf( rJoint.Offset );
+    if ( rJoint.Parent < 0 || !( Length > ShortestBone ) ||
+         i_rEnds[static_cast< std::size_t >( rJoint.Parent )] == static_cast< std::int32_t >( Index ) )
+    {
+      continue;
+    }
+    const CoreMoxelTypes::VSegment& rParent = io_rSubject.Segments[static_cast< std::size_t >( rJoint.Parent )];
+    CoreMoxelTypes::VSegment Bone;
+    Bone.Name = std::string( rParent.Name ).append( " to " ).append( rJoint.Name );
+    Bone.Parent = rJoint.Parent;
+    Bone.Joint = CoreMoxelTypes::EJointType::Dummy;
+    Bone.Pre = Inverse( rParent.Post ) * TurnTo( rJoint.Offset );
+    Bone.BoneLength = static_cast< float >( Length );
+    io_rSubject.Segments.push_back( std::move( Bone ) );
+  }
+}
+
 } // namespace
 
 CoreMoxelTypes::VSubject SubjectOf( const std::vector< VJoint >& i_rJoints )
 {
-  std::vector< VVector > Bones( i_rJoints.size() );
-  std::vector< bool > Known( i_rJoints.size(), false );
-  for ( const VJoint& rJoint : i_rJoints )
-  {
-    const auto Parent = static_cast< std::size_t >( rJoint.Parent );
-    if ( rJoint.Parent >= 0 && !Known[Parent] )
-    {
-      Bones[Parent] = rJoint.Offset;
-      Known[Parent] = true;
-    }
-  }
+  const std::vector< std::int32_t > Ends = BoneEnds( i_rJoints );
   CoreMoxelTypes::VSubject Subject;
   for ( std::size_t Index = 0; Index < i_rJoints.size(); ++Index )
   {
     const VJoint& rJoint = i_rJoints[Index];
-    const VVector Bone = Known[Index] ? Bones[Index] : rJoint.End.value_or( VVector{} );
+    const VVector Bone = Ends[Index] < 0 ? rJoint.End.value_or( VVector{} )
+                                         : i_rJoints[static_cast< std::size_t >( Ends[Index] )].Offset;
     CoreMoxelTypes::VSegment Segment;
     Segment.Name = rJoint.Name;
     Segment.Parent = rJoint.Parent;
@@ -52,6 +83,7 @@ CoreMoxelTypes::VSubject SubjectOf( const std::vector< VJoint >& i_rJoints )
     Segment.BoneLength = static_cast< float >( LengthOf( Bone ) );
     Subject.Segments.push_back( std::move( Segment ) );
   }
+  AddFurtherBones( i_rJoints, Ends, Subject );
   return Subject;
 }
 

@@ -32,8 +32,9 @@ struct VJoint
   std::optional< VVector > End; ///< mm; where the bone ends that has no joint below
 };
 
-/// Segments in the order of the joints: Free with a position, Ball with a rotation alone, Dummy without a channel. Each
-/// is turned so that its x axis points to the first joint below or to the end site.
+/// First the joints in their order: Free with a position, Ball with a rotation alone, Dummy without a channel. Each is
+/// turned so that its x axis points to the first joint below that is away from it, or else to the end site. Behind them
+/// stand the bones to further joints below: Dummy segments of the parent whose x axis points there.
 CoreMoxelTypes::VSubject SubjectOf( const std::vector< VJoint >& i_rJoints );
 
 /// Appends the joint state of a row, which has one number a channel, degrees and mm.

@@ -68,10 +68,9 @@ double LengthOf( const VVector& i_rVector )
 
 Rigid TurnTo( const VVector& i_rVector )
 {
-  constexpr double Shortest = 1e-6; // mm
   Rigid Turn;
   const double Length = LengthOf( i_rVector );
-  if ( !( Length > Shortest ) )
+  if ( !( Length > ShortestBone ) )
   {
     return Turn;
   }

@@ -24,7 +24,9 @@ CoreMoxelTypes::Rigid RigidOf( const VQuaternion& i_rTurn, const VVector& i_rShi
 CoreMoxelTypes::Rigid operator*( const CoreMoxelTypes::Rigid& i_rA, const CoreMoxelTypes::Rigid& i_rB );
 CoreMoxelTypes::Rigid Inverse( const CoreMoxelTypes::Rigid& i_rRigid );
 double LengthOf( const VVector& i_rVector );
-/// The turn that lays x along the vector; none for a vector that is too short to have a direction.
+/// A bone up to this length has no direction, mm.
+inline constexpr double ShortestBone = 1e-6;
+/// The turn that lays x along the vector; none for one of at most `ShortestBone`.
 CoreMoxelTypes::Rigid TurnTo( const VVector& i_rVector );
 
 /// Farther from the origin nothing of a recording stands, mm.

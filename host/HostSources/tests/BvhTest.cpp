@@ -6,6 +6,7 @@
 
 #include <cmath>
 #include <fstream>
+#include <set>
 
 namespace HostSources
 {
@@ -114,6 +115,52 @@ TEST( Bvh, AStateOfZerosIsTheFigureAsItIsDrawnUp )
   ExpectPlace( 1, 5 * Unit, 7 * Unit, 9 * Unit );
 }
 
+TEST( Bvh, EveryJointIsJoinedToItsParentWhereverThatTurns )
+{
+  const std::string Leg = "CHANNELS 3 Zrotation Xrotation Yrotation\nEnd Site { OFFSET 0 -40 3 } }\n";
+  VOutcome Outcome = Read( "HIERARCHY ROOT Hips\n{ OFFSET 0 90 0 CHANNELS 3 Zrotation Xrotation Yrotation\n"
+                           "JOINT Sacrum\n{ OFFSET 0 0 0 CHANNELS 1 Xrotation\n"
+                           "JOINT Spine\n{ OFFSET 0 15 2 " +
+                           Leg + "JOINT Tail\n{ OFFSET 0 1 -9 " + Leg + "}\nJOINT Left\n{ OFFSET 9 -2 0 " + Leg +
+                           "JOINT Right\n{ OFFSET -9 -2 0 " + Leg +
+                           "} MOTION Frames: 1 Frame Time: 0.1\n"
+                           "10 20 30 40 5 6 7 8 9 10 11 12 13 14 15 16\n" );
+  ASSERT_EQ( Outcome.Result, Ok ) << Outcome.Message;
+  const VRecordingSkeleton& rSkeleton = Outcome.Recording.Skeletons.at( 0 );
+  const std::vector< VSegment >& rSegments = rSkeleton.Subject.Segments;
+  EXPECT_EQ( rSkeleton.JointCount, 6u );
+  EXPECT_EQ( rSkeleton.StateSize, 18u ) << "bones take no state";
+  ASSERT_EQ( rSegments.size(), 8u ) << "the sacrum is where the hips are, and needs no bone";
+  EXPECT_EQ( rSegments[6].Name, "Sacrum to Tail" );
+  EXPECT_EQ( rSegments[7].Name, "Hips to Right" );
+  EXPECT_EQ( rSegments[4].Name, "Left" );
+  const auto pSubject = ComputeSubject::VComputeSubjectFK::Build( rSkeleton.Subject );
+  ASSERT_TRUE( pSubject->LoadState( rSkeleton.State( 0 ) ).IsOk() );
+  const auto Poses = pSubject->WorldTransforms();
+  std::set< std::size_t > Joined;
+  for ( std::size_t Bone = 0; Bone < rSegments.size(); ++Bone )
+  {
+    const ComputeSubject::VRigidTransform& rPose = Poses[Bone];
+    for ( std::size_t Joint = 1; Joint < rSkeleton.JointCount; ++Joint )
+    {
+      const auto Parent = static_cast< std::size_t >( rSegments[Joint].Parent );
+      const auto From = Bone < rSkeleton.JointCount ? Bone : static_cast< std::size_t >( rSegments[Bone].Parent );
+      double Off = 0;
+      for ( std::size_t Axis = 0; Axis < 3; ++Axis )
+      {
+        Off += std::abs( rPose.m_Translation[Axis] + rPose.m_Rotation[3 * Axis] * rSegments[Bone].BoneLength -
+                         Poses[Joint].m_Translation[Axis] ) +
+               std::abs( rPose.m_Translation[Axis] - Poses[From].m_Translation[Axis] );
+      }
+      if ( From == Parent && rSegments[Bone].BoneLength > 0 && Off < 1e-3 )
+      {
+        EXPECT_TRUE( Joined.insert( Joint ).second ) << "twice " << Joint;
+      }
+    }
+  }
+  EXPECT_EQ( Joined, ( std::set< std::size_t >{ 2, 3, 4, 5 } ) );
+}
+
 TEST( Bvh, RealFilesAgreeWithTheirFigures )
 {
   HARROW_NEEDS_RECORDINGS();
@@ -121,7 +168,7 @@ TEST( Bvh, RealFilesAgreeWithTheirFigures )
   EXPECT_EQ( Louise.FrameCount, 2998 );
   EXPECT_EQ( Louise.RateHz, 100 );
   ASSERT_EQ( Louise.Skeletons.size(), 1u );
-  EXPECT_EQ( Louise.Skeletons[0].Subject.Segments.size(), 18u );
+  EXPECT_EQ( Louise.Skeletons[0].JointCount, 18u );
   EXPECT_EQ( Louise.Skeletons[0].EndSiteCount, 5u );
   EXPECT_EQ( Louise.Skeletons[0].ChannelCount, 57u );
   VRecordingPlayer Player( Louise );
@@ -137,7 +184,7 @@ TEST( Bvh, RealFilesAgreeWithTheirFigures )
   const VRecording Milad = Real( "bvh/milad.bvh" );
   EXPECT_EQ( Milad.FrameCount, 422 );
   EXPECT_EQ( Milad.RateHz, 125 );
-  EXPECT_EQ( Milad.Skeletons.at( 0 ).Subject.Segments.size(), 59u );
+  EXPECT_EQ( Milad.Skeletons.at( 0 ).JointCount, 59u );
   EXPECT_EQ( Milad.Skeletons[0].EndSiteCount, 13u );
   EXPECT_EQ( Milad.Skeletons[0].ChannelCount, 354u );
   VRecordingPlayer Suit( Milad );
@@ -150,7 +197,7 @@ TEST( Bvh, RealFilesAgreeWithTheirFigures )
   Suit.ExpectJoint( "LeftHand", 36.9983, 97.5083, -15.7936 );
   const VRecordingInfo Info = DescribeRecording( Milad );
   EXPECT_THAT( Info.Text(),
-               testing::HasSubstr( "59 joints, 59 bones, 13 end sites, 354 channels, 354 degrees of freedom, "
+               testing::HasSubstr( "59 joints, 71 bones, 13 end sites, 354 channels, 354 degrees of freedom, "
                                    "0 markers, 422 poses" ) );
   EXPECT_THAT( Info.Json(), testing::HasSubstr( "\"format\": \"BVH\"" ) );
 }
