@@ -185,6 +185,40 @@ TEST( FlowState, CopiesTagsAndMergesWithTheirKeys )
   EXPECT_EQ( Next->GetInfoB().Standard, 8 );
 }
 
+TEST( FlowState, TellsWhetherATagHasTheItemsOfAnotherState )
+{
+  using VItems = std::vector< VFlowItemRef >;
+  const auto Id = []( std::int64_t i_Frame, const VItems& i_rItems, std::int64_t i_KeyOfLast )
+  {
+    const VFlowStateRef State = NewState( { i_Frame, 10, 1 } );
+    State->AddItem( NewItem< FlowReconstructionSet >() ); // of another tag, and new each time
+    for ( const VFlowItemRef& rItem : i_rItems )
+    {
+      State->AddItemAt( rItem, { &rItem == &i_rItems.back() ? i_KeyOfLast : i_Frame, 10, 1 } );
+    }
+    return State->ItemsId( FlowTag< FlowSubject > );
+  };
+  VFlowItemRef Ada = NewItem< FlowSubject >( 3, "Ada" );
+  const VFlowItemRef Ben = NewItem< FlowSubject >( 3, "Ben" ), Other = NewItem< FlowSubject >( 3, "Ada" );
+  const VFlowItemsId Both = Id( 1, { Ada, Ben }, 1 );
+  EXPECT_TRUE( Both.IsKnown() );
+  EXPECT_EQ( Id( 2, { Ada, Ben }, 2 ), Both ) << "each under the key of its state";
+  EXPECT_FALSE( Id( 1, { Ada, Ben }, 2 ).IsKnown() ) << "under another key";
+  for ( const VItems& rItems : { VItems{ Ben, Ada }, VItems{ Ada }, VItems{ Other, Ben }, VItems{} } )
+  {
+    EXPECT_TRUE( Id( 1, rItems, 1 ).IsKnown() );
+    EXPECT_NE( Id( 1, rItems, 1 ), Both );
+  }
+  EXPECT_EQ( Id( 1, {}, 1 ), Id( 2, {}, 2 ) );
+  // The memory of an item that went away is that of the next one.
+  const VFlowItemsId Alone = Id( 1, { Ada }, 1 );
+  const IFlowItem* const pPlace = Ada.Get();
+  Ada.Reset();
+  Ada = NewItem< FlowSubject >( 3, "Ada" );
+  ASSERT_EQ( Ada.Get(), pPlace );
+  EXPECT_NE( Id( 1, { Ada }, 1 ), Alone );
+}
+
 TEST( FlowState, AFrozenStateAndANullItemAreAssertionsAndChangeNothing )
 {
   const VFlowStateRef State = NewState( Now );
