@@ -1,6 +1,7 @@
 #include "SceneBuilder.h"
 
 #include "MeshPictures.h"
+#include "RestNormals.h"
 #include "SurfaceBuilder.h"
 
 #include <HarrowPluginInterface/MeshMath.h>
@@ -251,6 +252,7 @@ void VSceneBuilder::AddSurface( const aiMesh& i_rMesh, std::uint32_t i_Node )
   }
   Surface.Bone = Surface.Influences.empty() ? BoneOf( i_Node, Up ) : 0;
   Surface.Material = i_rMesh.mMaterialIndex;
+  BindRestNormals( m_Mesh, m_RestWorlds, Surface );
   m_Mesh.Surfaces.push_back( std::move( Surface ) );
 }
 

@@ -47,9 +47,9 @@ protected:
     const auto pMesh = m_pCache->Request( i_pCategory, i_rName );
     return pMesh ? static_cast< int >( pMesh->Surfaces[0].Positions[0][0] ) : -1;
   }
-  std::size_t Said( const char* i_pText ) const
+  std::size_t Said( const char* i_pText, int i_Level = ZEK::ELogWarning ) const
   {
-    const auto Texts = TestSupport::LogTexts( "Meshes", ZEK::ELogWarning );
+    const auto Texts = TestSupport::LogTexts( "Meshes", i_Level );
     return static_cast< std::size_t >( std::count_if( Texts.begin(), Texts.end(),
                                                       [&]( const std::string& i_rText )
                                                       {
@@ -103,7 +103,7 @@ TEST_F( VMeshCacheTest, WhatFailedIsSaidOnceAndTriedAgainInOtherFolders )
   WriteMesh( First / "bad.obj", 7 );
   EXPECT_EQ( Which( "bad.obj" ), -1 );
   EXPECT_EQ( Which( "none.obj" ), -1 );
-  EXPECT_EQ( Said( "\"none.obj\" is in none of its 1 folders" ), 1u );
+  EXPECT_EQ( Said( "\"none.obj\" is in none of its 1 folders", ZEK::ELogDetail ), 1u );
   EXPECT_EQ( TestSupport::LogTexts( "Meshes", ZEK::ELogFailure ).size(), 1u );
   EXPECT_EQ( m_Changes, 0 );
   m_pCache->SetSearchFolders( "Subject", { First, Second } );

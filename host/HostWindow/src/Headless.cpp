@@ -28,6 +28,7 @@ using VContentRef = std::shared_ptr< HarrowPluginInterface::VWindowFrameContent 
 
 /// The frames in which resources are made, the state arrives and what is asked for late is drawn.
 constexpr int FirstFrames = 4;
+constexpr std::chrono::seconds LongestMesh( 60 );
 
 VRunResult Fail( int i_Exit, std::string i_Message )
 {
@@ -184,6 +185,12 @@ VRunResult RenderOne( VSession& io_rSession, const VRenderOptions& i_rRender, co
       return Fail( EExitUsage, rAction.Option + " \"" + rAction.Text + "\": " + Wrong.toStdString() );
     }
     Actions.append( DescribeAction( rAction, io_rSession, Driver.View() ) );
+  }
+  // Meshes are read while frames are drawn; a picture shows those that were asked for.
+  if ( io_rSession.Meshes().ReadCount() > 0 &&
+       !( io_rSession.Meshes().WaitUntilRead( LongestMesh ) && Driver.WaitFrames( FirstFrames ) ) )
+  {
+    return Fail( EExitFile, "a mesh takes too long to be read" );
   }
   const QImage Picture = Driver.View().Widget()->grabFramebuffer();
   std::string Wrong = i_rOutput.isEmpty() ? std::string() : WritePicture( i_rOutput, Picture );

@@ -2,6 +2,7 @@
 
 #include <HostWindow/CommandLine.h>
 
+#include <HostMeshes/VMeshCache.h>
 #include <HostServices/VHost.h>
 #include <HostServices/VPluginModule.h>
 #include <HostSources/VRecordingSource.h>
@@ -33,6 +34,8 @@ public:
   std::string StartPlugin();
 
   HostServices::VHost& Host() { return *m_pHost; }
+  /// The meshes that all views draw from.
+  HostMeshes::VMeshCache& Meshes() { return *m_pMeshes; }
   HostServices::VPlaybackClock& Clock() { return *m_pHost->Playback(); }
   /// The lines of levels 2 and 3, and of those that --log asks for.
   const std::shared_ptr< ZEK::VLogRing >& LogRing() const { return m_pLogRing; }
@@ -84,6 +87,7 @@ private:
   VCommonOptions m_Options;
   std::shared_ptr< ZEK::VLogRing > m_pLogRing;
   std::shared_ptr< ZEK::ILogSink > m_pStderr;
+  const std::shared_ptr< HostMeshes::VMeshCache > m_pMeshes;
   std::unique_ptr< HostServices::VHost > m_pHost;
   HostServices::VPluginModule m_Module;
   std::shared_ptr< HostSources::VSimulatedCapture > m_pLive;
