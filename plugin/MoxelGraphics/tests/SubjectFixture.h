@@ -194,4 +194,104 @@ inline void HideSubjects( VSceneOptions& io_rOptions )
       io_rOptions.SceneMesh = Nothing;
 }
 
+inline constexpr std::size_t Subjects = VRenderSubjectDynamics::ESubjects, Solved = VRenderSubjectDynamics::ESolved;
+
+inline void Lose( VSubjectGroup& io_rGroup, std::size_t i_Marker )
+{
+  io_rGroup.Markers[i_Marker] = { VSubjectGroup::None, 0, 0, 0 };
+  ++io_rGroup.MarkerGeneration;
+}
+
+class VSubjectTest : public VSceneTest< VSubjectScene >
+{
+protected:
+  VSubjectTest()
+  {
+    HideSubjects( Options() );
+    Options().FloorGrid = Options().GlobalAxis = false;
+  }
+  VSubjectGroup& Group( std::size_t i_Index = Subjects ) { return pScene->Groups[i_Index]; }
+  VDisplayRecord& Labelling() { return Options().LabellingSubject; }
+  /// Where all of a group lies on the screen, and a little more.
+  QRect Around( std::size_t i_Group )
+  {
+    QRectF Rect;
+    for ( const VScenePoint& rPoint : Group( i_Group ).Solved )
+    {
+      Rect |= QRectF( ScreenPoint( rPoint ), QSizeF( 1, 1 ) );
+    }
+    // From the root and the joints to the markers.
+    return Rect.toAlignedRect().adjusted( -8, -8, 8, 8 );
+  }
+  std::vector< std::uint32_t > Counts( std::size_t i_Group ) const
+  {
+    std::vector< std::uint32_t > All;
+    for ( std::uint32_t Kind = 0; Kind < ESubjectKindCount; ++Kind )
+    {
+      All.push_back( pScene->Count( i_Group, ESubjectKind( Kind ) ) );
+    }
+    return All;
+  }
+  /// Three bones, sticks and markers so far apart that none hides another.
+  void SpreadOut()
+  {
+    VSubjectGroup& rGroup = Group();
+    VSubjectRecord Record;
+    Record.Item = { ZEK::ESelectSubject, "spread", 1, 0 };
+    Record.Markers = { 0, 6 };
+    Record.Sticks = Record.Bones = { 0, 3 };
+    for ( int Index = 0; Index < 3; ++Index )
+    {
+      const float Along = -1500.0f + 1300.0f * static_cast< float >( Index );
+      rGroup.Markers.push_back( { Along, -600, 200, 30 } );
+      rGroup.Markers.push_back( { Along + 300, -1500, 700, 30 } );
+      rGroup.Bones.push_back( { -1, 0xFF40C0FF, 900 } );
+      rGroup.Poses.push_back( PoseAlong( { Along, 300, 100 }, { Along + 200, 1000, 500 } ) );
+      const auto First = static_cast< std::uint32_t >( 2 * Index );
+      rGroup.Sticks.push_back( { First, First + 1 } );
+    }
+    rGroup.Solved = rGroup.Markers;
+    rGroup.Records.push_back( Record );
+    pScene->Touch( rGroup );
+    pScene->MarkDirty();
+    Labelling().Markers = Labelling().Sticks = Labelling().Bones = true;
+    Draw();
+  }
+  /// Points of an object on the screen, from one end to the other.
+  std::vector< QPointF > Along( std::uint32_t i_Id )
+  {
+    const VSubjectGroup& rGroup = Group();
+    QVector3D A, B;
+    const auto Place = []( const VScenePoint& i_rPoint )
+    {
+      return QVector3D( i_rPoint.X, i_rPoint.Y, i_rPoint.Z );
+    };
+    if ( i_Id < rGroup.StickIds.First )
+    {
+      A = B = Place( rGroup.Markers[i_Id - rGroup.MarkerIds.First] );
+    }
+    else if ( i_Id < rGroup.BoneIds.First )
+    {
+      const VSubjectStick& rStick = rGroup.Sticks[i_Id - rGroup.StickIds.First];
+      A = Place( rGroup.Markers[rStick.A] );
+      B = Place( rGroup.Markers[rStick.B] );
+    }
+    else
+    {
+      const VBonePose& rPose = rGroup.Poses[i_Id - rGroup.BoneIds.First];
+      A = { rPose[3], rPose[7], rPose[11] };
+      B = A + 900 * QVector3D( rPose[0], rPose[4], rPose[8] );
+    }
+    std::vector< QPointF > Points;
+    for ( int Step = 0; Step <= 100; ++Step )
+    {
+      const QVector3D At = A + ( B - A ) * ( static_cast< float >( Step ) / 100 );
+      Points.push_back( ScreenPoint( { At.x(), At.y(), At.z(), 0 } ) );
+    }
+    return Points;
+  }
+  /// As each of the three blocks of ids stands.
+  std::uint32_t End() { return Group().BoneIds.First + 3; }
+};
+
 } // namespace MoxelGraphics
