@@ -63,7 +63,7 @@ ZEK::IResult ReadMotionFile( VFileSource& io_rSource, const std::filesystem::pat
   std::filesystem::path Model;
   ZEK::IResult Result = FindModel( i_rPath, i_rModel, Model, o_rMessage );
   VFileSource ModelSource;
-  Result = Result.IsOk() ? ModelSource.Open( Model, o_rMessage ) : Result;
+  Result = Result.IsOk() ? ModelSource.Open( Model, o_rMessage, "a model (.osim)" ) : Result;
   if ( Result.IsError() )
   {
     return Result;

@@ -35,24 +35,24 @@ void VFileSource::Close()
   m_Size = 0;
 }
 
-ZEK::IResult VFileSource::Open( const std::filesystem::path& i_rPath, std::string& o_rMessage )
+ZEK::IResult VFileSource::Open( const std::filesystem::path& i_rPath, std::string& o_rMessage, const char* i_pExpected )
 {
   Close();
   const std::string Name = i_rPath.string();
+  const std::string Begin = std::string( Name ).append( ": expected " ).append( i_pExpected ).append( ", found " );
   // A pipe without a writer would make a plain open wait for ever.
   m_File = open( Name.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK );
   if ( m_File < 0 )
   {
     const int Error = errno;
     const bool bMissing = Error == ENOENT || Error == ENOTDIR;
-    o_rMessage = Name + ": expected a recording, found " + ( bMissing ? "no such file" : std::strerror( Error ) );
+    o_rMessage = Begin + ( bMissing ? "no such file" : std::strerror( Error ) );
     return bMissing ? ZEK::IResult::FileNotFound : ZEK::IResult::FileIOFailure;
   }
   struct stat Status = {};
   if ( fstat( m_File, &Status ) != 0 || !S_ISREG( Status.st_mode ) )
   {
-    o_rMessage = Name + ": expected a recording, found " +
-                 ( S_ISDIR( Status.st_mode ) ? "a folder" : "something that is no plain file" );
+    o_rMessage = Begin + ( S_ISDIR( Status.st_mode ) ? "a folder" : "something that is no plain file" );
     return ZEK::IResult::FileIOFailure;
   }
   m_Size = static_cast< std::uint64_t >( Status.st_size );

@@ -46,8 +46,10 @@ public:
   VFileSource( const VFileSource& ) = delete;
   VFileSource& operator=( const VFileSource& ) = delete;
 
-  /// `FileNotFound`, or `FileIOFailure` for what cannot be read, folders included; the message names the file.
-  ZEK::IResult Open( const std::filesystem::path& i_rPath, std::string& o_rMessage );
+  /// `FileNotFound`, or `FileIOFailure` for what cannot be read, folders included; the message names the file and what
+  /// was expected there.
+  ZEK::IResult Open( const std::filesystem::path& i_rPath, std::string& o_rMessage,
+                     const char* i_pExpected = "a recording" );
   std::uint64_t Size() const override { return m_Size; }
   std::span< const std::byte > Read( std::uint64_t i_Offset, std::size_t i_Count ) override;
 
