@@ -2,6 +2,7 @@
 
 #include <HostMeshes/ReadMesh.h>
 
+#include "BoneMesh.h"
 #include "MeshLog.h"
 
 #include <condition_variable>
@@ -191,6 +192,7 @@ VMeshCache::VMeshRef VMeshCache::VState::ReadFile( const std::filesystem::path& 
 VMeshCache::VMeshCache( std::filesystem::path i_Reader )
   : m_pState( std::make_unique< VState >( std::move( i_Reader ) ) )
 {
+  m_pState->BuiltIns[BoneMeshName] = MakeBoneMesh();
 }
 
 VMeshCache::~VMeshCache() = default;

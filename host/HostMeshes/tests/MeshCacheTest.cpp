@@ -146,6 +146,22 @@ TEST_F( VMeshCacheTest, ABuiltInMeshIsThereAtOnceAndBeforeFiles )
   m_pCache->AddBuiltIn( "own.obj", nullptr );
   EXPECT_EQ( Which( "own.obj" ), 1 );
   EXPECT_EQ( m_Changes, Changes + 2 );
+  // The bone is one from the beginning: closed, its faces outwards, a unit long.
+  const auto pBone = VMeshCache().Request( "Subject", "tetra_stripe.fbx" );
+  ASSERT_TRUE( pBone && pBone->Surfaces.size() == 1 );
+  const auto& rBone = pBone->Surfaces[0];
+  double Volume = 0;
+  for ( std::size_t Index = 0; Index + 2 < rBone.Triangles.size(); Index += 3 )
+  {
+    const auto &rA = rBone.Positions[rBone.Triangles[Index]], &rNormal = rBone.Normals[rBone.Triangles[Index]];
+    const auto &rB = rBone.Positions[rBone.Triangles[Index + 1]], &rC = rBone.Positions[rBone.Triangles[Index + 2]];
+    Volume += ( rA[0] * ( rB[1] * rC[2] - rB[2] * rC[1] ) + rA[1] * ( rB[2] * rC[0] - rB[0] * rC[2] ) +
+                rA[2] * ( rB[0] * rC[1] - rB[1] * rC[0] ) ) /
+              6;
+    const double FromAxis = rA[1] * rNormal[1] + rA[2] * rNormal[2] + ( rA[0] - 0.15 ) * rNormal[0];
+    EXPECT_GT( FromAxis, 0 ) << "face " << Index / 3;
+  }
+  EXPECT_NEAR( Volume, 0.14 * 0.14 / 3, 1e-6 );
 }
 
 TEST_F( VMeshCacheTest, ManyThreadsAskWhileFoldersChangeAndTheCacheGoesInTheMiddleOfIt )

@@ -8,7 +8,8 @@
 namespace HostMeshes
 {
 
-/// The meshes of the search folders, read on a thread of its own, and meshes that come with the program.
+/// The meshes of the search folders, read on a thread of its own, and meshes that come with the program: the bone of
+/// skeletons, "tetra_stripe.fbx", from the beginning.
 ///
 /// A name is a file's, with its extension, below one of its category's folders; the first folder that has it wins. One
 /// that is absolute or leaves the folder stands for nothing. A file that cannot be read is told of once in the log and
