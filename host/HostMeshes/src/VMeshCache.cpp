@@ -153,8 +153,7 @@ VMeshCache::VMeshRef VMeshCache::VState::Find( const std::string& i_rName,
       return ReadFile( Path );
     }
   }
-  // No warning: a mesh that need not be there is asked for as well, such as one in place of a built-in shape.
-  ZEK::Log( MeshLog(), ZEK::ELogDetail, "Mesh \"%1%\" is in none of its %2% folders", i_rName, i_rFolders.size() );
+  ZEK::Log( MeshLog(), ZEK::ELogWarning, "Mesh \"%1%\" is in none of its %2% folders", i_rName, i_rFolders.size() );
   return nullptr;
 }
 

@@ -103,7 +103,7 @@ TEST_F( VMeshCacheTest, WhatFailedIsSaidOnceAndTriedAgainInOtherFolders )
   WriteMesh( First / "bad.obj", 7 );
   EXPECT_EQ( Which( "bad.obj" ), -1 );
   EXPECT_EQ( Which( "none.obj" ), -1 );
-  EXPECT_EQ( Said( "\"none.obj\" is in none of its 1 folders", ZEK::ELogDetail ), 1u );
+  EXPECT_EQ( Said( "\"none.obj\" is in none of its 1 folders" ), 1u );
   EXPECT_EQ( TestSupport::LogTexts( "Meshes", ZEK::ELogFailure ).size(), 1u );
   EXPECT_EQ( m_Changes, 0 );
   m_pCache->SetSearchFolders( "Subject", { First, Second } );

@@ -95,7 +95,7 @@ TEST_F( VLabelTest, ThousandsAreOneDrawAndCostNothingWhileNothingChanges )
   std::vector< VLabelText > Texts( 2000 );
   for ( std::size_t Index = 0; Index < Texts.size(); ++Index )
   {
-    Texts[Index].Text = "M" + std::to_string( Index % 50 );
+    Texts[Index].Text = std::string( "M" ).append( std::to_string( Index % 50 ) );
   }
   pBatch->SetTexts( Texts );
   for ( std::size_t Index = 0; Index < Texts.size(); ++Index )

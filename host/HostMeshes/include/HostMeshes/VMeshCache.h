@@ -12,9 +12,9 @@ namespace HostMeshes
 /// skeletons, "tetra_stripe.fbx", from the beginning.
 ///
 /// A name is a file's, with its extension, below one of its category's folders; the first folder that has it wins. One
-/// that is absolute or leaves the folder stands for nothing. A file that cannot be read is told of once in the log and
-/// left alone until the folders of its category change; a name that no folder has is a detail of the log. Each file is
-/// read once, whatever categories ask for it. Thread: any. The destructor waits for the file that is being read.
+/// that is absolute or leaves the folder stands for nothing. A file that is not there or cannot be read is told of once
+/// in the log and left alone until the folders of its category change. Each file is read once, whatever categories ask
+/// for it. Thread: any. The destructor waits for the file that is being read.
 class VMeshCache final : public HarrowPluginInterface::VMeshSceneCache
 {
 public:
