@@ -43,7 +43,7 @@ std::shared_ptr< const VMeshScene > SceneOf( HostSources::EPerformerMesh i_Which
   AddBones( Mesh, *pScene );
   VMeshMaterial& rMaterial = pScene->Materials.emplace_back();
   rMaterial.Name = "Suit";
-  rMaterial.Colour = { 0.62F, 0.64F, 0.68F };
+  rMaterial.Colour = { 0.86F, 0.88F, 0.92F };
   VMeshSurface& rSurface = pScene->Surfaces.emplace_back();
   rSurface.Name = "Body";
   rSurface.UVs.assign( Mesh.Positions.size(), {} );
