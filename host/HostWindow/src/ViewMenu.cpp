@@ -164,7 +164,7 @@ void VViewMenu::AddNames()
                                         { tr( "Normal" ), { { "LabelSize", 13 } } },
                                         { tr( "Large" ), { { "LabelSize", 18 } } },
                                         { tr( "Huge" ), { { "LabelSize", 26 } } } } );
-  AddChoices( tr( "N&umber of Names" ), { { tr( "The 50 Nearest" ), { { "LabelLimit", 50 } } },
+  AddChoices( tr( "N&umber of Names" ), { { tr( "The 60 Nearest" ), { { "LabelLimit", 60 } } },
                                           { tr( "The 150 Nearest" ), { { "LabelLimit", 150 } } },
                                           { tr( "The 1000 Nearest" ), { { "LabelLimit", 1000 } } } } );
   AddChoices( tr( "&Distance of Names" ), { { tr( "Up to 5 m" ), { { "LabelDistance", 5000 } } },

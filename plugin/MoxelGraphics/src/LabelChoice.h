@@ -15,7 +15,7 @@ struct VLabelCandidate
   std::uint8_t Rank = 0;                                 ///< the lower, the sooner
   bool bHeld = false;                                    ///< shown until now
   float Away = 0;                                        ///< among those of one rank the nearest comes first
-  float X = 0, Y = 0;                                    ///< the label's place, pixels from the lower left
+  std::int32_t X = 0, Y = 0;                             ///< the label's place, pixels from the lower left
   std::int16_t Left = 0, Bottom = 0, Right = 0, Top = 0; ///< of its text about that place, y up
   float Strength = 1;                                    ///< that it would be shown with
   bool bChosen = false;
@@ -30,11 +30,17 @@ public:
   void Choose( std::vector< VLabelCandidate >& io_rCandidates, int i_Limit, QSize i_Viewport );
 
 private:
+  void Order( const std::vector< VLabelCandidate >& i_rCandidates );
   bool Take( const VLabelCandidate& i_rCandidate );
+  std::uint64_t& WordAt( int i_Row, int i_Word )
+  {
+    return m_Taken[static_cast< std::size_t >( i_Row ) * m_Words + static_cast< std::size_t >( i_Word )];
+  }
 
-  std::vector< std::uint64_t > m_Order; ///< rank, distance and place of each candidate
+  std::vector< std::uint64_t > m_Order, m_Sorted; ///< rank and distance of each candidate, and its place
   int m_Columns = 0, m_Rows = 0;
-  std::vector< std::uint8_t > m_Taken; ///< by cell of the viewport
+  std::size_t m_Words = 0;              ///< of a row
+  std::vector< std::uint64_t > m_Taken; ///< a bit for each cell of the viewport, row by row
 };
 
 } // namespace MoxelGraphics

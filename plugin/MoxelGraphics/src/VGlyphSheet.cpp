@@ -22,8 +22,10 @@ namespace
 constexpr int SheetWidth = 1024;
 constexpr int MostRows = 4096; ///< any device takes a texture of so many
 constexpr int HeightStep = 64;
-constexpr double WidestText = 22; ///< in heights of the text
+constexpr int JoinedRows = MostRows / 2; ///< beyond it only glyphs are added
+constexpr double WidestText = 22;        ///< in heights of the text
 constexpr qsizetype LongestText = 256;
+constexpr float Darkness = 0.8F; ///< of the edge
 
 QFont MakeFont( int i_Pixels, bool i_bBold )
 {
@@ -44,7 +46,7 @@ std::int16_t Short( int i_Value )
 
 VGlyphSheet::VGlyphSheet( int i_Pixels )
   : m_Pixels( i_Pixels )
-  , m_Soft( std::max( 2, ( i_Pixels + 3 ) / 7 ) )
+  , m_Soft( std::max( 1, ( i_Pixels + 1 ) / 8 ) )
   , m_Plain( MakeFont( i_Pixels, false ) )
   , m_Bold( MakeFont( i_Pixels, true ) )
 {
@@ -98,6 +100,7 @@ const VTextLayout& VGlyphSheet::Layout( const std::string& i_rText, bool i_bBold
     Result.Width = static_cast< std::int32_t >( std::ceil( Line.naturalTextWidth() ) );
   }
   Result.Count = static_cast< std::uint32_t >( m_Placed.size() ) - Result.First;
+  Join( Result );
   return *m_Layouts[i_bBold].insert( Text, Result );
 }
 
@@ -120,6 +123,48 @@ void VGlyphSheet::Place( const QGlyphRun& i_rRun, double i_Baseline )
           { Short( X + rCell.Left ), Short( Y + rCell.Top ), rCell.Width, rCell.Height, rCell.X, rCell.Y } );
     }
   }
+}
+
+/// Puts the glyphs of a text together in a cell of its own. Where they meet the stronger counts, so that the edge of
+/// one does not darken another.
+void VGlyphSheet::Join( VTextLayout& io_rLayout )
+{
+  const std::vector< VPlacedGlyph > Glyphs( m_Placed.begin() + io_rLayout.First, m_Placed.end() );
+  int Left = INT16_MAX, Top = INT16_MAX, Right = INT16_MIN, Bottom = INT16_MIN;
+  for ( const VPlacedGlyph& rGlyph : Glyphs )
+  {
+    Left = std::min< int >( Left, rGlyph.X );
+    Top = std::min< int >( Top, rGlyph.Y );
+    Right = std::max( Right, rGlyph.X + rGlyph.Width );
+    Bottom = std::max( Bottom, rGlyph.Y + rGlyph.Height );
+  }
+  VCell Cell;
+  if ( Glyphs.size() < 2 || Right - Left > SheetWidth || m_RowY + m_RowHeight + Bottom - Top > JoinedRows ||
+       !Reserve( Right - Left, Bottom - Top, Cell ) )
+  {
+    return;
+  }
+  const auto At = [this]( int i_X, int i_Y )
+  {
+    return &m_Pixmap[( static_cast< std::size_t >( i_Y ) * SheetWidth + static_cast< std::size_t >( i_X ) ) * 2];
+  };
+  for ( const VPlacedGlyph& rGlyph : Glyphs )
+  {
+    for ( int Row = 0; Row < rGlyph.Height; ++Row )
+    {
+      const std::uint8_t* const pFrom = At( rGlyph.SheetX, rGlyph.SheetY + Row );
+      std::uint8_t* const pTo = At( Cell.X + rGlyph.X - Left, Cell.Y + rGlyph.Y - Top + Row );
+      std::transform( pFrom, pFrom + std::ptrdiff_t{ 2 } * rGlyph.Width, pTo, pTo,
+                      []( std::uint8_t i_A, std::uint8_t i_B )
+                      {
+                        return std::max( i_A, i_B );
+                      } );
+    }
+  }
+  m_Placed.resize( io_rLayout.First );
+  m_Placed.push_back( { Short( Left ), Short( Top ), Cell.Width, Cell.Height, Cell.X, Cell.Y } );
+  io_rLayout.Count = 1;
+  m_bWritten = false;
 }
 
 const VGlyphSheet::VCell& VGlyphSheet::CellOf( const QRawFont& i_rFont, quint64 i_FontKey, quint32 i_Glyph )
@@ -236,8 +281,9 @@ void VGlyphSheet::Copy( const QImage& i_rImage, const VCell& i_rCell )
           Edge = std::max( Edge, static_cast< float >( Alpha( X + Dx, Y + Dy ) ) * ( 1 - Far * Far ) );
         }
       }
-      *pOut++ = static_cast< std::uint8_t >( Alpha( X, Y ) );
-      *pOut++ = static_cast< std::uint8_t >( Edge );
+      const auto Ink = static_cast< float >( Alpha( X, Y ) );
+      *pOut++ = static_cast< std::uint8_t >( Ink );
+      *pOut++ = static_cast< std::uint8_t >( Ink + Edge * Darkness * ( 1 - Ink / 255 ) );
     }
   }
   m_bWritten = false;

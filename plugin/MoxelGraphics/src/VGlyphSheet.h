@@ -23,8 +23,8 @@ class VRenderContext;
 namespace MoxelGraphics
 {
 
-/// A glyph of a text that was laid out: where it stands to the start of the text's baseline, and where it lies in the
-/// sheet; pixels, y down.
+/// A piece of a text that was laid out, the whole or a glyph: where it stands to the start of the text's baseline, and
+/// where it lies in the sheet; pixels, y down.
 struct VPlacedGlyph
 {
   std::int16_t X = 0, Y = 0;
@@ -35,12 +35,13 @@ struct VPlacedGlyph
 /// A text that was laid out.
 struct VTextLayout
 {
-  std::uint32_t First = 0, Count = 0; ///< of the sheet's glyphs
+  std::uint32_t First = 0, Count = 0; ///< of the sheet's pieces
   std::int32_t Width = 0;             ///< pixels
 };
 
-/// The glyphs of texts of one height in device pixels: each drawn once, with a soft edge around it (green) beside its
-/// own shape (red). Thread: render thread.
+/// The glyphs of texts of one height in device pixels: each drawn once, its own shape (red) and that over the soft dark
+/// edge around it (green). While there is room, a text lies in the sheet as a whole and is one piece; of a text that
+/// came too late for that each letter is one. Thread: render thread.
 class VGlyphSheet
 {
 public:
@@ -67,6 +68,7 @@ private:
 
   QString Prepare( const std::string& i_rText, const QFont& i_rFont ) const;
   void Place( const QGlyphRun& i_rRun, double i_Baseline );
+  void Join( VTextLayout& io_rLayout );
   const VCell& CellOf( const QRawFont& i_rFont, quint64 i_FontKey, quint32 i_Glyph );
   QImage Draw( const QRawFont& i_rFont, quint32 i_Glyph, QPoint& o_rTopLeft ) const;
   VCell Keep( const QImage& i_rImage, QPoint i_TopLeft );

@@ -269,7 +269,7 @@ void VRenderSubjectLabels::PlaceSubject( const VNamed& i_rNamed )
                   FindHead( Stretch( rGroup.Poses, rRecord.Bones ), PlaceOf, bYUp, rPoint ) ||
                   FindHead( Stretch( rGroup.Solved, rRecord.Markers ), Itself, bYUp, rPoint ) ||
                   FindHead( std::span( &rRecord.Root, 1 ), PlaceOf, bYUp, rPoint );
-  rPoint.bMarked = ( rRecord.Flags & CoreGraphics::EInstanceSelected ) != 0;
+  Mark( rPoint, ( rRecord.Flags & CoreGraphics::EInstanceSelected ) != 0 );
 }
 
 void VRenderSubjectLabels::PlaceMarkers( const VNamed& i_rNamed )
@@ -291,13 +291,20 @@ void VRenderSubjectLabels::PlaceMarkers( const VNamed& i_rNamed )
       rPoint.Y = rPlace.Y;
       rPoint.Z = rPlace.Z;
       rPoint.Radius = std::isfinite( rPlace.Radius ) ? std::clamp( rPlace.Radius, 0.0F, 100.0F ) : 0.0F;
-      rPoint.bMarked = Marker < rFlags.size() && ( rFlags[Marker] & CoreGraphics::EInstanceSelected ) != 0;
+      Mark( rPoint, Marker < rFlags.size() && ( rFlags[Marker] & CoreGraphics::EInstanceSelected ) != 0 );
     }
   }
 }
 
+void VRenderSubjectLabels::Mark( VLabelPoint& o_rPoint, bool i_bOn )
+{
+  m_bMarksDiffer |= o_rPoint.bMarked != i_bOn;
+  o_rPoint.bMarked = i_bOn;
+}
+
 void VRenderSubjectLabels::Place()
 {
+  m_bMarksDiffer = false;
   for ( const VNamed& rNamed : m_Named )
   {
     PlaceSubject( rNamed );
@@ -310,9 +317,11 @@ void VRenderSubjectLabels::Place()
   for ( std::size_t Index = 0; Index < m_SceneLabels.size(); ++Index )
   {
     const auto& [rItem, rPosition, bFlag, rText] = *m_SceneLabels[Index];
-    m_Labels.Points()[First + Index] = { rPosition[0], rPosition[1], rPosition[2], 0, true, bFlag };
+    VLabelPoint& rPoint = m_Labels.Points()[First + Index];
+    Mark( rPoint, bFlag );
+    rPoint = { rPosition[0], rPosition[1], rPosition[2], 0, true, bFlag };
   }
-  m_Labels.Moved();
+  m_Labels.Moved( m_bMarksDiffer );
 }
 
 void VRenderSubjectLabels::Render( CoreGraphics::VRenderContext& io_rContext, const VSceneOptions& i_rOptions,

@@ -133,11 +133,15 @@ TEST_F( VLabelTest, TheNearestStayAndTheOthersFadeWithoutFlicker )
   Row( 4, 500 );
   PlaceRow( 500, false, 0.12F );
   Style.Limit = 2;
-  Draw();
+  const QRect Before = Lit( Draw() );
   EXPECT_EQ( Strengths(), ( std::vector< float >{ 1, 1, 0, 0 } ) );
   PlaceRow( 500, true, 0.12F );
   Now += 0.1;
-  Draw();
+  const QRect Moved = Lit( Draw() );
+  EXPECT_EQ( Strengths(), ( std::vector< float >{ 1, 1, 0, 0 } ) ) << "it is not yet time for another choice";
+  EXPECT_NE( Moved, Before ) << "what is shown goes along with its point";
+  Now += 0.1;
+  Draw(); // nothing moves any more, but a choice is due
   const std::vector< float > Half = Strengths();
   for ( std::size_t Index = 0; Index < 4; ++Index )
   {

@@ -2,12 +2,13 @@
 
 // Many short texts in the picture, each beside or above a point of the world, in one draw.
 //
-// A text is laid out once for each size that a view asks for; its glyphs lie in one texture, drawn at the very pixels
-// of that size, so that they are as crisp as any other text on that screen. A frame in which something moved writes 16
-// bytes a letter that is shown, any other frame nothing. Which labels are shown is chosen for each view: the nearest,
-// as many as the limit allows, that do not cover one another. What is no longer chosen fades out and what is chosen
-// anew fades in, so that nothing flickers while two change places; the first frame of a view, and the first after
-// something was set otherwise, shows the final state at once.
+// A text is laid out once for each size that a view asks for, and lies in one texture, drawn at the very pixels of that
+// size, so that it is as crisp as any other text on that screen. A frame in which something moved writes one rectangle
+// a label that is shown, any other frame nothing. Which labels are shown is chosen for each view: the nearest, as many
+// as the limit allows, that do not cover one another. That is not done in each frame: while things move it is every
+// fifth of a second, and in between what is shown moves along and what is gone goes. What is no longer chosen fades out
+// and what is chosen anew fades in, so that nothing flickers while two change places; the first frame of a view, and
+// the first after something was set otherwise, shows the final state at once.
 
 #include <cstdint>
 #include <functional>
@@ -57,7 +58,7 @@ struct VLabelStyle
 {
   int Pixels = 13;    ///< height of the texts in item pixels
   float Distance = 0; ///< mm from the eye at which labels are gone; 0: none. Views without perspective have no distance
-  int Limit = 150;    ///< labels at a time
+  int Limit = 60;     ///< labels at a time
   std::uint32_t Switches = 0; ///< what the view shows; the bits are the user's own
   friend bool operator==( const VLabelStyle&, const VLabelStyle& ) = default;
 };
@@ -74,7 +75,12 @@ public:
   const std::vector< VLabelText >& Texts() const { return m_Texts; }
   /// One a text, to be written; whoever wrote calls `Moved`.
   std::span< VLabelPoint > Points() { return m_Points; }
-  void Moved() { ++m_PointsGeneration; }
+  /// Whether some are marked that were not, or no longer.
+  void Moved( bool i_bMarks = false )
+  {
+    ++m_PointsGeneration;
+    m_MarksGeneration += i_bMarks ? 1 : 0;
+  }
 
   /// Draws into the overlay pass of a view. `i_bSettled`: without fades.
   void Draw( CoreGraphics::VRenderContext& io_rContext, const VLabelStyle& i_rStyle, bool i_bSettled = false );
@@ -90,18 +96,30 @@ private:
   struct VView;
   struct VSheet;
   struct VGl;
+  /// What a choice asks of a text.
+  struct VTrait
+  {
+    std::uint32_t Needs = 0;
+    std::int32_t Unless = -1;
+    std::uint32_t UnlessNeeds = 0;
+    bool bName = false, bBeside = false;
+  };
 
   VView& ViewOf( CoreGraphics::VRenderContext& io_rContext ) const;
   VSheet& SheetOf( int i_Pixels );
+  void Advance( CoreGraphics::VRenderContext& io_rContext, VView& io_rView, const VSheet& i_rSheet,
+                const VLabelStyle& i_rStyle, bool i_bSettled ) const;
   void Choose( CoreGraphics::VRenderContext& io_rContext, VView& io_rView, const VSheet& i_rSheet,
                const VLabelStyle& i_rStyle ) const;
   bool IsWanted( std::size_t i_Label, std::uint32_t i_Switches ) const;
   void Fade( VView& io_rView, float i_Step ) const;
+  void Follow( CoreGraphics::VRenderContext& io_rContext, VView& io_rView, const VSheet& i_rSheet, float i_Step ) const;
   bool Write( VView& io_rView, const VSheet& i_rSheet ) const;
 
   std::vector< VLabelText > m_Texts;
+  std::vector< VTrait > m_Traits; ///< by text
   std::vector< VLabelPoint > m_Points;
-  std::uint64_t m_TextsGeneration = 1, m_PointsGeneration = 1, m_SheetSerial = 0;
+  std::uint64_t m_TextsGeneration = 1, m_PointsGeneration = 1, m_MarksGeneration = 1, m_SheetSerial = 0;
   std::function< double() > m_Clock;
   std::unique_ptr< VGl > m_pGl;
   std::vector< std::unique_ptr< VSheet > > m_Sheets; ///< of the sizes in use, the one drawn last in front

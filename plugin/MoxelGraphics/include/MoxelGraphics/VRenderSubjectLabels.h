@@ -58,12 +58,14 @@ private:
   void Place();
   void PlaceSubject( const VNamed& i_rNamed );
   void PlaceMarkers( const VNamed& i_rNamed );
+  void Mark( VLabelPoint& o_rPoint, bool i_bOn );
 
   VMoxelScene& m_rScene;
   VGroups m_Groups{};
   VLabelBatch m_Labels;
   VSeen m_Seen;
   bool m_bMade = false;
+  bool m_bMarksDiffer = false;
   std::vector< VNamed > m_Named;
   std::vector< const struct VSceneLabel* > m_SceneLabels; ///< the scene's own, good until its next update
   std::vector< std::string > m_SceneTexts;

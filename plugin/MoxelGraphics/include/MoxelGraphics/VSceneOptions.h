@@ -110,7 +110,7 @@ struct VSceneOptions
   bool MarkerNames = false;
   int LabelSize = 13;             ///< height of names in item pixels
   float LabelDistance = 20000.0f; ///< mm from the eye, beyond which names fade out; 0 for no end
-  int LabelLimit = 150;           ///< so many names are shown at once, the nearest
+  int LabelLimit = 60;            ///< so many names are shown at once, the nearest
   bool Manipulator = true;
   QString SubjectPreset;
   VDisplayRecord PropSubject;
