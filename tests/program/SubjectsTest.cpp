@@ -79,6 +79,74 @@ TEST( Subjects, StandInThePoseThatIsAskedFor )
   EXPECT_LT( Crouch.Body.width(), 0.8 * T.Body.width() );
 }
 
+TEST( Subjects, ClicksOnABoneAMarkerAndAStickReportTheirKinds )
+{
+  HARROW_NEEDS_MODULE();
+  const TestSupport::VTemporaryDir Folder;
+  const QStringList View{ "--cameras", "0", "--time", "0.5", "--size", "640x360", "--set", "Reconstructions=false" };
+  const auto Only = []( const char* pName )
+  {
+    QStringList Arguments;
+    for ( const char* pOther : { "Bones", "Markers", "Sticks", "Skin", "Clusters", "Origins" } )
+    {
+      Arguments << "--set"
+                << QString( "LabellingSubject-%1=%2" ).arg( pOther, pOther == QString( pName ) ? "true" : "false" );
+    }
+    return Arguments;
+  };
+  const char* const Names[] = { "Bones", "Markers", "Sticks" };
+  const char* const Counts[] = { "bones", "markers", "sticks" };
+  QImage Pictures[3];
+  for ( int Kind = 0; Kind < 3; ++Kind )
+  {
+    const QString File = QString::fromStdString( ( Folder.Path() / "one.png" ).string() );
+    const QJsonObject Report = Render( View + Only( Names[Kind] ) + QStringList{ "--output", File } );
+    EXPECT_TRUE( Report["log"].toArray().isEmpty() );
+    const QJsonObject Shown = Report["subjects"].toObject()["LabellingSubject"].toObject()["subjects"].toObject();
+    EXPECT_EQ( Shown["names"].toArray().size(), 2 );
+    for ( int Other = 0; Other < 3; ++Other )
+    {
+      EXPECT_EQ( Shown[Counts[Other]].toInt() > 20, Other == Kind ) << Names[Kind] << ", " << Counts[Other];
+    }
+    ASSERT_TRUE( Pictures[Kind].load( File ) );
+  }
+  QStringList Clicks;
+  for ( int Kind = 0; Kind < 3; ++Kind )
+  {
+    // What one picture alone shows, where most of what is around it is shown by it alone too.
+    const auto IsOwn = [&]( int i_X, int i_Y )
+    {
+      const QRgb Colour = Pictures[Kind].pixel( i_X, i_Y );
+      return Colour != Pictures[( Kind + 1 ) % 3].pixel( i_X, i_Y ) &&
+             Colour != Pictures[( Kind + 2 ) % 3].pixel( i_X, i_Y );
+    };
+    QPoint Best;
+    int Most = 0;
+    for ( int Pixel = 0; Pixel < 636 * 356; ++Pixel )
+    {
+      const QPoint At( 2 + Pixel % 636, 2 + Pixel / 636 );
+      int Own = IsOwn( At.x(), At.y() ) ? 1 : -30;
+      for ( int Near = 0; Near < 25; ++Near )
+      {
+        Own += IsOwn( At.x() - 2 + Near % 5, At.y() - 2 + Near / 5 ) ? 1 : 0;
+      }
+      Best = Own > Most ? At : Best;
+      Most = std::max( Own, Most );
+    }
+    Clicks << Only( Names[Kind] ) << "--click" << Text( Best );
+  }
+  std::vector< int > Kinds;
+  for ( const QJsonValue& rAction : Render( View + Clicks )["actions"].toArray() )
+  {
+    const QJsonArray Selection = rAction["selection"].toArray();
+    if ( rAction["action"] == "click" )
+    {
+      Kinds.push_back( Selection.size() == 1 ? Selection[0]["kind"].toInt() : -1 );
+    }
+  }
+  EXPECT_EQ( Kinds, ( std::vector< int >{ 8, 6, 7 } ) );
+}
+
 TEST( Subjects, PosesThatAreNoneAreToldAndOtherWindowsHaveNone )
 {
   HARROW_NEEDS_MODULE();
