@@ -52,7 +52,7 @@ protected:
     std::vector< VLabelText > Texts;
     for ( int Index = 0; Index < i_Count; ++Index )
     {
-      Texts.push_back( { "m" + std::to_string( Index ) } );
+      Texts.push_back( { std::string( "m" ).append( std::to_string( Index ) ) } );
     }
     pBatch->SetTexts( Texts );
     PlaceRow( i_Aside );
