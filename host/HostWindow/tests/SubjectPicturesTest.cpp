@@ -195,14 +195,12 @@ QRect Changed( const VMask& i_rMask )
 }
 } // namespace
 
-TEST_F( VSubjectPictures, EachSwitchChangesWhatItNamesInCountsAndInThePictureAndNothingElse )
+TEST_F( VSubjectPictures, EachSwitchChangesTheCountThatItNamesAndNothingElse )
 {
   const QMap< QString, int > Labelled = LabelledCounts( Stage().Session().Options(), Seconds );
   ASSERT_GT( Labelled["MissingMarkers"], 4 );
   ASSERT_GT( Labelled["SticksDuringGaps"], Labelled["Sticks"] );
   const QStringList Usual{ "Enabled", "Bones", "Markers", "Sticks", "MissingMarkers", "Origins", "Clusters" };
-  const QRect Body = Changed( VMask( Only( "LabellingSubject", { "Skin", "Targets", "Joints", "SticksDuringGaps" } ),
-                                     Only( "LabellingSubject", {} ) ) );
   for ( const QString& rBlock : Blocks )
   {
     SetBlock( rBlock, Usual );
@@ -245,14 +243,32 @@ TEST_F( VSubjectPictures, EachSwitchChangesWhatItNamesInCountsAndInThePictureAnd
     Stage().Set( rBlock + "-Enabled", true );
     Stage().Settle();
   }
-  // Seen alone, beside what would hide it.
-  for ( const VSwitch& rSwitch : Switches )
+}
+
+TEST_F( VSubjectPictures, EachSwitchChangesThePictureWhereItsSubjectsAre )
+{
+  // The prop is out of sight, and there are no meshes of scenes.
+  for ( const char* pBlock : { "LabellingSubject", "SolvingSubject", "RetargetingSubject" } )
   {
-    const bool bGap = QString( rSwitch.pName ) == "SticksDuringGaps";
-    const QImage With = Only( "LabellingSubject", QStringList{ rSwitch.pName } << ( bGap ? "Sticks" : "" ) );
-    const VMask Mask( With, Only( "LabellingSubject", QStringList{ bGap ? "Sticks" : "" } ) );
-    EXPECT_FALSE( Changed( Mask ).isEmpty() ) << rSwitch.pName;
-    EXPECT_TRUE( Body.adjusted( -8, -8, 8, 8 ).contains( Changed( Mask ) ) ) << rSwitch.pName;
+    const QImage Empty = Only( pBlock, {} );
+    const QRect Body = Changed( VMask( Only( pBlock, { "Skin", "Bones", "Targets", "Joints" } ), Empty ) );
+    ASSERT_GT( Body.height(), 100 );
+    for ( const VSwitch& rSwitch : Switches )
+    {
+      SCOPED_TRACE( std::string( pBlock ) + "-" + rSwitch.pName );
+      const QStringList Beside{ QString( rSwitch.pName ) == "SticksDuringGaps" ? "Sticks" : "" };
+      const QImage Without = Only( pBlock, Beside );
+      QVariantMap Counted = Counts();
+      const int Off = TakeCount( Counted, pBlock, rSwitch.pCount );
+      const QImage With = Only( pBlock, Beside + QStringList{ rSwitch.pName } );
+      Counted = Counts();
+      const int On = TakeCount( Counted, pBlock, rSwitch.pCount );
+      const QRect Found = Changed( VMask( With, Without ) );
+      EXPECT_EQ( !Found.isEmpty(), On > Off ) << On << " against " << Off;
+      EXPECT_TRUE( Found.isEmpty() || Body.adjusted( -8, -8, 8, 8 ).contains( Found ) );
+    }
+    Stage().Set( QString( pBlock ) + "-Enabled", false );
+    EXPECT_EQ( Stage().Picture(), Empty );
   }
 }
 
