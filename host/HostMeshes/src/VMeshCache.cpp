@@ -73,6 +73,8 @@ struct VMeshCache::VState
   const std::filesystem::path Reader;
   mutable std::mutex Guard;
   mutable std::condition_variable Wake;
+  const std::map< std::string, VMeshRef > StandIns{
+      { BoneMeshName, MakeBoneMesh() } }; ///< for files that are not there
   std::map< std::string, VMeshRef > BuiltIns;
   std::map< std::string, VCategory > Categories;
   std::deque< VJob > Jobs;
@@ -144,14 +146,21 @@ VMeshCache::VMeshRef VMeshCache::VState::Find( const std::string& i_rName,
     ZEK::Log( MeshLog(), ZEK::ELogWarning, "\"%1%\" is no name of a mesh: it leads out of the folders", i_rName );
     return nullptr;
   }
+  const auto ItStandIn = StandIns.find( i_rName );
+  const VMeshRef pStandIn = ItStandIn != StandIns.end() ? ItStandIn->second : nullptr;
   for ( const std::filesystem::path& rFolder : i_rFolders )
   {
     std::error_code Error;
     const std::filesystem::path Path = rFolder / i_rName;
     if ( std::filesystem::is_regular_file( Path, Error ) )
     {
-      return ReadFile( Path );
+      const VMeshRef pMesh = ReadFile( Path );
+      return pMesh ? pMesh : pStandIn;
     }
+  }
+  if ( pStandIn )
+  {
+    return pStandIn;
   }
   ZEK::Log( MeshLog(), ZEK::ELogWarning, "Mesh \"%1%\" is in none of its %2% folders", i_rName, i_rFolders.size() );
   return nullptr;
@@ -191,7 +200,6 @@ VMeshCache::VMeshRef VMeshCache::VState::ReadFile( const std::filesystem::path& 
 VMeshCache::VMeshCache( std::filesystem::path i_Reader )
   : m_pState( std::make_unique< VState >( std::move( i_Reader ) ) )
 {
-  m_pState->BuiltIns[BoneMeshName] = MakeBoneMesh();
 }
 
 VMeshCache::~VMeshCache() = default;
@@ -246,6 +254,7 @@ VMeshCache::VMeshRef VMeshCache::Request( const std::string& i_rCategory, const 
   {
     return nullptr;
   }
+  VMeshRef pMesh;
   {
     const std::lock_guard Lock( m_pState->Guard );
     if ( const auto ItBuiltIn = m_pState->BuiltIns.find( i_rName ); ItBuiltIn != m_pState->BuiltIns.end() )
@@ -258,11 +267,13 @@ VMeshCache::VMeshRef VMeshCache::Request( const std::string& i_rCategory, const 
     {
       return ItEntry->second.pMesh;
     }
-    rCategory.Entries[i_rName].bQueued = true;
+    const auto ItStandIn = m_pState->StandIns.find( i_rName );
+    pMesh = ItStandIn != m_pState->StandIns.end() ? ItStandIn->second : nullptr;
+    rCategory.Entries[i_rName] = { pMesh, true };
     m_pState->Jobs.push_back( { i_rCategory, i_rName } );
   }
   m_pState->Wake.notify_all();
-  return nullptr;
+  return pMesh;
 }
 
 bool VMeshCache::CanRead( const std::filesystem::path& i_rPath ) const

@@ -146,7 +146,10 @@ TEST_F( VMeshCacheTest, ABuiltInMeshIsThereAtOnceAndBeforeFiles )
   m_pCache->AddBuiltIn( "own.obj", nullptr );
   EXPECT_EQ( Which( "own.obj" ), 1 );
   EXPECT_EQ( m_Changes, Changes + 2 );
-  // The bone is one from the beginning: closed, its faces outwards, a unit long.
+}
+
+TEST_F( VMeshCacheTest, TheBoneIsThereFromTheBeginningAndAFileOfItsNameIsReadInItsPlace )
+{
   const auto pBone = VMeshCache().Request( "Subject", "tetra_stripe.fbx" );
   ASSERT_TRUE( pBone && pBone->Surfaces.size() == 1 );
   const auto& rBone = pBone->Surfaces[0];
@@ -161,7 +164,24 @@ TEST_F( VMeshCacheTest, ABuiltInMeshIsThereAtOnceAndBeforeFiles )
     const double FromAxis = rA[1] * rNormal[1] + rA[2] * rNormal[2] + ( rA[0] - 0.15 ) * rNormal[0];
     EXPECT_GT( FromAxis, 0 ) << "face " << Index / 3;
   }
-  EXPECT_NEAR( Volume, 0.14 * 0.14 / 3, 1e-6 );
+  EXPECT_NEAR( Volume, 0.14 * 0.14 / 3, 1e-6 ); // closed and a unit long
+
+  const auto Bone = [&]
+  {
+    EXPECT_TRUE( m_pCache->WaitUntilRead( std::chrono::seconds( 60 ) ) );
+    return m_pCache->Request( "Subject", "tetra_stripe.fbx" );
+  };
+  m_pCache->SetSearchFolders( "Subject", { First } );
+  const auto pOwn = Bone();
+  EXPECT_TRUE( pOwn && pOwn == Bone() );
+  EXPECT_EQ( Said( "tetra_stripe.fbx" ), 0u );
+  EXPECT_EQ( m_Changes, 0 );
+  // A file is read in its place, and what cannot be read does not take it away.
+  TestSupport::ExpectFailureLine( "The mesh cannot be read: tetra_stripe.fbx: FBX-Parser unexpected end of file" );
+  Write( Second / "tetra_stripe.fbx", "nothing" );
+  m_pCache->SetSearchFolders( "Subject", { Second } );
+  EXPECT_EQ( Bone(), pOwn );
+  EXPECT_EQ( TestSupport::LogTexts( "Meshes", ZEK::ELogFailure ).size(), 1u );
 }
 
 TEST_F( VMeshCacheTest, ManyThreadsAskWhileFoldersChangeAndTheCacheGoesInTheMiddleOfIt )

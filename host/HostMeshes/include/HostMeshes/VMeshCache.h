@@ -8,8 +8,8 @@
 namespace HostMeshes
 {
 
-/// The meshes of the search folders, read on a thread of its own, and meshes that come with the program: the bone of
-/// skeletons, "tetra_stripe.fbx", from the beginning.
+/// The meshes of the search folders, read on a thread of its own, and meshes that come with the program. The bone of
+/// skeletons, "tetra_stripe.fbx", is there from the beginning; a file of that name replaces it.
 ///
 /// A name is a file's, with its extension, below one of its category's folders; the first folder that has it wins. One
 /// that is absolute or leaves the folder stands for nothing. A file that is not there or cannot be read is told of once
