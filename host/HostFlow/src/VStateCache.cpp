@@ -138,6 +138,14 @@ bool VStateCache::FetchMany( const VFlowTimeRange& i_rRange, std::vector< VFlowS
       o_rStates.push_back( rPlace.State );
     }
   }
+  for ( const VFlowStateRef& rState : m_Around )
+  {
+    const VFlowTimeKey Key = rState->GetKey();
+    if ( Key >= i_rRange.First && Key <= i_rRange.Last )
+    {
+      o_rStates.push_back( rState );
+    }
+  }
   return true;
 }
 
@@ -188,15 +196,37 @@ IResult VStateCache::Add( const VFlowStateRef& i_rState )
 void VStateCache::Clear()
 {
   std::vector< VPlace > Gone;
+  std::vector< VFlowStateRef > GoneAround;
   {
     const std::lock_guard Lock( m_Guard );
     Gone.resize( m_Ring.size() );
     Gone.swap( m_Ring );
+    GoneAround.swap( m_Around );
     m_First = 0;
     m_Count = 0;
   }
   Gone.clear();
+  GoneAround.clear();
   m_Notifier6.Fire();
+}
+
+void VStateCache::SetAround( std::vector< VFlowStateRef >& io_rStates, bool i_bTell )
+{
+  for ( const VFlowStateRef& rState : io_rStates )
+  {
+    if ( const auto* pState = dynamic_cast< const VFlowState* >( rState.Get() ) )
+    {
+      pState->Freeze();
+    }
+  }
+  {
+    const std::lock_guard Lock( m_Guard );
+    m_Around.swap( io_rStates );
+  }
+  if ( i_bTell )
+  {
+    m_StatesChanged.Fire();
+  }
 }
 
 void VStateCache::SetStaticItems( std::vector< VFlowItemRef > i_Items )

@@ -45,6 +45,7 @@ public:
   void SetStaticItems( std::vector< ZEK::VFlowItemRef > i_Items ) override;
   void SetStatus( std::uint32_t i_Status ) override;
   void NamesChanged() override { m_Notifier5.Fire(); }
+  void SetAround( std::vector< ZEK::VFlowStateRef >& io_rStates, bool i_bTell ) override;
   void GetStaticItems( ZEK::IResult& o_rStatus, std::vector< ZEK::VFlowItemRef >& o_rItems ) const override;
 
 private:
@@ -65,6 +66,7 @@ private:
   std::vector< VPlace > m_Ring;
   std::size_t m_First = 0;
   std::size_t m_Count = 0;
+  std::vector< ZEK::VFlowStateRef > m_Around;
   std::uint32_t m_Status = 1;
   std::vector< ZEK::VFlowItemRef > m_StaticItems;
   ZEK::VMultiCallback< void() > m_StatesChanged;

@@ -1,5 +1,7 @@
 #include <HostSources/VSourcePump.h>
 
+#include "FramesAround.h"
+
 #include <ZEK/Log.h>
 
 #include <algorithm>
@@ -19,6 +21,11 @@ namespace
 
 using VClock = std::chrono::steady_clock;
 
+/// After so long without another frame whoever looks on is told of those around.
+constexpr std::chrono::milliseconds QuietTime( 50 );
+/// A source that takes so long for a frame is not asked for those around until later.
+constexpr std::chrono::milliseconds SlowFrame( 5 );
+
 const VLogCategory& Category()
 {
   static const VLogCategory& rCategory = GlobalLog().Category( "Source" );
@@ -36,8 +43,11 @@ struct VSourcePump::VImpl
   void Follow( bool i_bOn );
   void RunLive();
   void RunFollow();
-  IResult TryMakeAndAdd( std::int64_t i_Index, bool i_bClear );
-  bool MakeAndAdd( std::int64_t i_Index, bool i_bClear );
+  IResult TryMake( std::int64_t i_Index, VFlowStateRef& o_rState );
+  IResult TryMakeAndAdd( std::int64_t i_Index, bool i_bClear, bool i_bKnown );
+  bool MakeAndAdd( std::int64_t i_Index, bool i_bClear, bool i_bKnown = false );
+  void HandOverAround( bool i_bTell );
+  bool WaitOrLookAround( std::unique_lock< std::mutex >& io_rLock );
 
   std::shared_ptr< IFrameSource > pSource;
   std::shared_ptr< IFlowWritableStateCache > pCache;
@@ -58,6 +68,8 @@ struct VSourcePump::VImpl
   bool bAgain = false; // what the frame that is shown lacked has come
   bool bBusy = false;
   bool bSeek = false;
+  bool bForget = false; // the source makes other states than before
+  VFramesAround Around; // of the pump's thread while it runs
   std::int64_t Asked = 0;
   std::int64_t Shown = -1;
   std::uint64_t Added = 0;
@@ -80,21 +92,12 @@ VSourcePump::~VSourcePump()
 }
 
 /// What a source or a listener of the cache throws, a lack of memory above all, must not end the process.
-IResult VSourcePump::VImpl::TryMakeAndAdd( std::int64_t i_Index, bool i_bClear )
+IResult VSourcePump::VImpl::TryMake( std::int64_t i_Index, VFlowStateRef& o_rState )
 {
   try
   {
-    VFlowStateRef State;
-    IResult Result;
-    {
-      const std::lock_guard Lock( SourceGuard );
-      Result = pSource->MakeState( i_Index, Maker, State );
-    }
-    if ( Result.IsOk() && i_bClear )
-    {
-      pCache->Clear();
-    }
-    return Result.IsOk() ? pCache->Add( State ) : Result;
+    const std::lock_guard Lock( SourceGuard );
+    return pSource->MakeState( i_Index, Maker, o_rState );
   }
   catch ( const std::bad_alloc& )
   {
@@ -106,9 +109,40 @@ IResult VSourcePump::VImpl::TryMakeAndAdd( std::int64_t i_Index, bool i_bClear )
   }
 }
 
-bool VSourcePump::VImpl::MakeAndAdd( std::int64_t i_Index, bool i_bClear )
+IResult VSourcePump::VImpl::TryMakeAndAdd( std::int64_t i_Index, bool i_bClear, bool i_bKnown )
 {
-  const IResult Result = TryMakeAndAdd( i_Index, i_bClear );
+  VFlowStateRef State = i_bKnown ? Around.Find( i_Index ) : VFlowStateRef();
+  const IResult Result = State ? IResult( IResult::Ok ) : TryMake( i_Index, State );
+  if ( Result.IsError() )
+  {
+    return Result;
+  }
+  try
+  {
+    if ( i_bClear )
+    {
+      pCache->Clear();
+    }
+    const IResult Put = pCache->Add( State );
+    if ( Put.IsOk() )
+    {
+      Around.Shown( i_Index, State );
+    }
+    return Put;
+  }
+  catch ( const std::bad_alloc& )
+  {
+    return IResult::AllocationFailure;
+  }
+  catch ( ... )
+  {
+    return IResult::FailedWithException;
+  }
+}
+
+bool VSourcePump::VImpl::MakeAndAdd( std::int64_t i_Index, bool i_bClear, bool i_bKnown )
+{
+  const IResult Result = TryMakeAndAdd( i_Index, i_bClear, i_bKnown );
   bool bFirstFailure = false;
   {
     const std::lock_guard Lock( Guard );
@@ -178,21 +212,71 @@ void VSourcePump::VImpl::RunLive()
   }
 }
 
+void VSourcePump::VImpl::HandOverAround( bool i_bTell )
+{
+  try
+  {
+    Around.HandOver( Shown, i_bTell ); // only the pump's thread writes it
+  }
+  catch ( ... )
+  {
+    Log( Category(), ELogWarning, "What lies around frame %1% of \"%2%\" could not be shown", Shown, pSource->Name() );
+  }
+}
+
+/// True when there is something to do; false after it did a bit of what can wait.
+bool VSourcePump::VImpl::WaitOrLookAround( std::unique_lock< std::mutex >& io_rLock )
+{
+  const auto IsDue = [this]
+  {
+    return bStop || bAsked || bAgain;
+  };
+  if ( std::exchange( bForget, false ) )
+  {
+    Around.Forget();
+  }
+  const std::int64_t Next = Shown < 0 ? -1 : Around.Next( Shown, pSource->FrameCount() );
+  const bool bResting = Shown >= 0 && Around.IsResting();
+  if ( Next < 0 && !bResting && !Around.HasUntold() )
+  {
+    Wake.wait( io_rLock, IsDue );
+    return true;
+  }
+  const bool bDue = Next >= 0 ? IsDue() : Wake.wait_for( io_rLock, QuietTime, IsDue );
+  io_rLock.unlock();
+  if ( !bDue && Next >= 0 )
+  {
+    VFlowStateRef State;
+    const auto Begin = VClock::now();
+    const IResult Result = TryMake( Next, State );
+    Around.Made( Next, Result.IsOk() ? State : VFlowStateRef(), VClock::now() - Begin > SlowFrame );
+  }
+  else if ( !bDue && bResting )
+  {
+    Around.EndRest();
+  }
+  else
+  {
+    HandOverAround( !bDue );
+  }
+  io_rLock.lock();
+  return bDue;
+}
+
 void VSourcePump::VImpl::RunFollow()
 {
   std::unique_lock Lock( Guard );
   while ( true )
   {
-    Wake.wait( Lock,
-               [this]
-               {
-                 return bStop || bAsked || bAgain;
-               } );
+    if ( !WaitOrLookAround( Lock ) )
+    {
+      continue;
+    }
     if ( bStop )
     {
       return;
     }
-    bAgain = false;
+    const bool bKnown = !std::exchange( bAgain, false ) && !std::exchange( bForget, false );
     if ( !bAsked && Shown < 0 )
     {
       continue;
@@ -203,7 +287,11 @@ void VSourcePump::VImpl::RunFollow()
     bAsked = false;
     bBusy = true;
     Lock.unlock();
-    const bool bAdded = MakeAndAdd( Index, bClear );
+    if ( !bKnown )
+    {
+      Around.Forget();
+    }
+    const bool bAdded = MakeAndAdd( Index, bClear, bKnown );
     Lock.lock();
     bBusy = false;
     bSeek = bSeek || ( bClear && !bAdded ); // the frame that comes instead stands before the others as well
@@ -240,6 +328,7 @@ void VSourcePump::VImpl::Start( bool i_bLive, std::int64_t i_First )
     bFailing = false;
     bAgain = false;
     Shown = -1;
+    bForget = true;
     Thread = std::thread( i_bLive ? &VImpl::RunLive : &VImpl::RunFollow, this );
     bRunning = true; // only now: nobody may wait for a thread that could not be made
   }
@@ -319,6 +408,13 @@ void VSourcePump::WithSource( const std::function< void( IFrameSource& ) >& i_rF
 {
   const std::lock_guard Lock( m_pImpl->SourceGuard );
   i_rFunction( *m_pImpl->pSource );
+  const std::lock_guard Forget( m_pImpl->Guard );
+  m_pImpl->bForget = true;
+}
+
+void VSourcePump::KeepAround( std::int64_t i_Frames, VTakeAround i_Take )
+{
+  m_pImpl->Around = VFramesAround( i_Frames, std::move( i_Take ) );
 }
 
 std::int64_t VSourcePump::ShownIndex() const

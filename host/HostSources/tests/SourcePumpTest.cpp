@@ -11,6 +11,7 @@
 #include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <set>
 #include <thread>
 
 using namespace ZEK;
@@ -126,6 +127,84 @@ TEST_F( SourcePump, FollowsAndEmptiesTheCacheOnAStepBackAndOnASeek )
   }
   EXPECT_EQ( Pump.ShownIndex(), 50 );
   EXPECT_EQ( Pump.AddedCount(), 6u );
+}
+
+TEST_F( SourcePump, WhatLiesAroundComesWhateverIsShownAndTheFrameShownStaysTheNewest )
+{
+  constexpr std::int64_t Frames = 5;
+  pSource->Count = 40;
+  Pump.KeepAround( Frames,
+                   [this]( std::vector< VFlowStateRef >& io_rStates, bool i_bTell )
+                   {
+                     pCache->SetAround( io_rStates, i_bTell );
+                   } );
+  std::atomic< std::int64_t > Asked{ -1 };
+  std::atomic< int > Wrong{ 0 }, Told{ 0 };
+  const VConnection Watch = pCache->StatesChanged().Connect(
+      [&]
+      {
+        ++Told;
+        Wrong += Newest() == Asked ? 0 : 1;
+      },
+      nullptr );
+  const auto Around = [&]( std::int64_t i_Index )
+  {
+    const std::int64_t Ticks = pSource->TicksPerFrame();
+    std::vector< VFlowStateRef > States;
+    pCache->FetchMany( { { ( i_Index - Frames ) * Ticks, 1, 2 }, { ( i_Index + Frames ) * Ticks, Ticks, 2 } }, States,
+                       0 );
+    std::set< std::int64_t > Found;
+    for ( const VFlowStateRef& rState : States )
+    {
+      Found.insert( rState->GetKey().Frame / Ticks );
+    }
+    return Found;
+  };
+  Pump.StartFollow();
+  // Sought, played, stayed, stepped back, played on, jumped ahead to the end, looped.
+  for ( const auto& [Index, bSeek] : { std::pair{ 10, true },
+                                       { 11, false },
+                                       { 13, false },
+                                       { 13, false },
+                                       { 12, false },
+                                       { 13, false },
+                                       { 38, false },
+                                       { 0, false },
+                                       { 20, true } } )
+  {
+    SCOPED_TRACE( Index );
+    Asked = Index;
+    const int Before = Told;
+    Pump.Show( Index, bSeek );
+    Pump.WaitShown();
+    std::set< std::int64_t > Expected;
+    for ( std::int64_t Frame = std::max< std::int64_t >( Index - Frames, 0 );
+          Frame <= std::min< std::int64_t >( Index + Frames, 39 ); ++Frame )
+    {
+      Expected.insert( Frame );
+    }
+    // One when the frame is shown, one when what lies around is complete.
+    for ( int Wait = 0; Wait < 5000 && Told < Before + 2; ++Wait )
+    {
+      std::this_thread::sleep_for( std::chrono::milliseconds( 1 ) );
+    }
+    std::set< std::int64_t > Found = Around( Index );
+    EXPECT_TRUE( std::includes( Found.begin(), Found.end(), Expected.begin(), Expected.end() ) ) << Found.size();
+    EXPECT_EQ( Newest(), Index );
+    EXPECT_EQ( Pump.ShownIndex(), Index );
+  }
+  EXPECT_EQ( Wrong, 0 );
+  // A frame that is wanted does not wait for those around the last one, and what the source changes is made anew.
+  Pump.WithSource( []( IFrameSource& ) {} );
+  pSource->Hold( true );
+  Asked = 21;
+  Pump.Show( 21, true );
+  pSource->Hold( false );
+  Pump.WaitShown();
+  EXPECT_EQ( Newest(), 21 );
+  Pump.Stop();
+  EXPECT_EQ( std::count( pSource->Made.begin(), pSource->Made.end(), 12 ), 1 ) << "known ones are not made again";
+  EXPECT_EQ( std::count( pSource->Made.begin(), pSource->Made.end(), 21 ), 2 );
 }
 
 TEST_F( SourcePump, ShowsOnlyTheNewestOfWhatWaitsButForgetsNoSeek )

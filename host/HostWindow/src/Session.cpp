@@ -3,6 +3,7 @@
 #include "PerformerMeshes.h"
 
 #include <CoreMoxelTypes/FlowTypes.h>
+#include <HostFlow/VFlowFramework.h>
 #include <HostMeshes/ReadMesh.h>
 #include <HostQml/Modules.h>
 
@@ -18,6 +19,7 @@ namespace
 constexpr std::uint32_t LiveClock = 1;
 constexpr std::uint32_t PlaybackClock = 2;
 constexpr int TickMs = 8;
+constexpr std::int64_t FramesAround = 60; ///< to each side of the one that is shown
 
 /// Passes on to stderr what the user asked to see there; the ring beside it gets at least the warnings.
 class VQuietStderr final : public ZEK::ILogSink
@@ -158,6 +160,15 @@ void VSession::OpenRecording( std::shared_ptr< const HostSources::VRecording > i
   m_pRecording = std::make_shared< HostSources::VRecordingSource >( std::move( i_pRecording ) );
   m_pPlaybackPump = std::make_unique< HostSources::VSourcePump >( m_pRecording, m_pHost->Contexts()->PlaybackCache(),
                                                                   Maker( PlaybackClock ) );
+  // What lies around a frame is for views that show where markers were and will be.
+  if ( auto pCache = std::dynamic_pointer_cast< HostFlow::IHostStateCache >( m_pHost->Contexts()->PlaybackCache() ) )
+  {
+    m_pPlaybackPump->KeepAround( FramesAround,
+                                 [pCache]( std::vector< ZEK::VFlowStateRef >& io_rStates, bool i_bTell )
+                                 {
+                                   pCache->SetAround( io_rStates, i_bTell );
+                                 } );
+  }
   ApplyUpAxis( m_pPlaybackPump.get(), m_pRecording.get(), m_FoundUp );
   m_LastShown = -1;
   const ZEK::IResult Opened = Clock().Open( m_pRecording->FrameCount(), m_pRecording->TicksPerFrame() );
@@ -277,7 +288,6 @@ namespace
 void AddAround( HostSources::IFrameSource& io_rSource, const HostSources::VStateMaker& i_rMaker,
                 const ZEK::IFlowState& i_rState, std::int64_t i_Index, ZEK::IFlowWritableStateCache& io_rCache )
 {
-  constexpr std::int64_t FramesAround = 60;
   ZEK::VFlowItemRef Video;
   i_rState.FindItem( Video, ZEK::FlowTag< CoreMoxelTypes::FlowVideoFrame >, ZEK::EFlowTimeMatch::Overlap );
   const std::int64_t First = std::max< std::int64_t >( i_Index - FramesAround, 0 );

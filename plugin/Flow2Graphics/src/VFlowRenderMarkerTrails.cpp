@@ -236,9 +236,14 @@ bool VFlowRenderMarkerTrails::FillTrails( const MoxelGraphics::VSceneOptions& i_
   {
     return false;
   }
+  const std::uint64_t Looks = std::exchange( m_Looks, m_rFlowScene.Looks() );
   if ( m_Followed != m_States )
   {
     Follow();
+  }
+  else if ( m_Looks != Looks )
+  {
+    m_KnownFrom = m_FutureAsked = m_Key.Frame; // others may have come around the one that is still shown
   }
   const std::int64_t Past = LengthOf( i_rOptions.trialLengthPast, i_rOptions.TrailUnit, m_Key );
   const std::int64_t Future = LengthOf( i_rOptions.trialLengthFuture, i_rOptions.TrailUnit, m_Key );

@@ -130,7 +130,8 @@ void VFlowScene::CreateRenderTypes()
     return &pSubjects->Group( i_Group ).Group();
   };
   pTrails->SetGroups( { Lists( EGroupSubject ), Lists( EGroupProp ) } );
-  pHalo->SetGroups( { Lists( EGroupRigidObject ), Lists( EGroupSubject ), Lists( EGroupProp ), Lists( EGroupSolving ) } );
+  pHalo->SetGroups(
+      { Lists( EGroupRigidObject ), Lists( EGroupSubject ), Lists( EGroupProp ), Lists( EGroupSolving ) } );
   pLabels->SetGroups( { Lists( EGroupRigidObject ), Lists( EGroupSubject ), Lists( EGroupProp ), Lists( EGroupSolving ),
                         Lists( EGroupRetargeting ), Lists( EGroupSceneMesh ) } );
 
@@ -142,8 +143,8 @@ void VFlowScene::CreateRenderTypes()
   {
     m_RenderList.push_back( std::move( rpType ) );
   }
-  m_RenderList.insert( m_RenderList.end(), { pBackdrop, m_pCameras, pData2D, pData3D, pGeometry, pVolume, pTrails, pHalo,
-                                             pLabels, pAxis } );
+  m_RenderList.insert( m_RenderList.end(), { pBackdrop, m_pCameras, pData2D, pData3D, pGeometry, pVolume, pTrails,
+                                             pHalo, pLabels, pAxis } );
   m_FlowRenderTypes = { pFloor,
                         pPlates,
                         pReconstructions,
@@ -186,6 +187,7 @@ bool VFlowScene::ProcessPending()
   {
     return bRan;
   }
+  ++m_Looks;
   const ZEK::VFlowStateRef State = FetchState();
   if ( State && State->ItemCount() != 0 )
   {

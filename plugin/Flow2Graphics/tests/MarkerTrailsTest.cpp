@@ -202,6 +202,36 @@ TEST_F( MarkerTrails, GoToBothSidesAsFarAsIsKeptAndBreakInGaps )
   ExpectSame( Drawn(), Expected( 399, 299, 399 ) );
 }
 
+TEST_F( MarkerTrails, WhatComesAroundAFrameThatIsShownAlreadyIsTaken )
+{
+  const ZEK::VFlowStateRef Now = State( 130 );
+  (void)pScene->pKept->Add( Now );
+  const auto Look = [&]
+  {
+    pScene->Show( Now );
+    pScene->Look( Options );
+    return Drawn();
+  };
+  EXPECT_TRUE( Look().empty() );
+  std::vector< ZEK::VFlowStateRef > Around;
+  for ( std::int64_t Frame = 122; Frame <= 135; ++Frame )
+  {
+    Around.push_back( State( Frame ) );
+  }
+  pScene->pKept->SetAround( Around, true );
+  ExpectSame( Look(), Expected( 130, 122, 135 ) );
+  for ( const std::uint32_t Mode : { 0u, 2u } )
+  {
+    ZEK::VFlowStateRef Kept;
+    pScene->pKept->Fetch( Kept, 31, Mode, 0 );
+    EXPECT_EQ( Kept.Get(), Now.Get() ) << "the one shown is still the newest, and the oldest";
+  }
+  EXPECT_FALSE( pScene->pKept->Contains( { 131 * Span, Span, 1 }, 0 ) );
+  pScene->pKept->Clear();
+  pScene->pKept->FetchMany( { { 0, 1, 1 }, { 200 * Span, 1, 1 } }, Around, 0 );
+  EXPECT_TRUE( Around.empty() );
+}
+
 TEST_F( MarkerTrails, LiveTheyGrowFromWhatComesAndAllocateNothing )
 {
   Options.trialLengthFuture = 5;

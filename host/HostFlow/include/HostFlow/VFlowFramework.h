@@ -33,6 +33,10 @@ public:
   virtual void SetStatus( std::uint32_t i_Status ) = 0;
   /// Fires `Notifier5`: objects of the frames to come have other names.
   virtual void NamesChanged() = 0;
+  /// States for those who look around the newest: `FetchMany` finds them behind those of the ring, nothing else does,
+  /// and what is newest or oldest stays what it was. They take the place of the former ones, which the argument has
+  /// then; `Clear` drops them. `i_bTell` fires `StatesChanged`. Null states are not allowed.
+  virtual void SetAround( std::vector< ZEK::VFlowStateRef >& io_rStates, bool i_bTell ) = 0;
 };
 
 /// Makes states. Pooled: a state that goes away leaves its memory to the next. Handles of all calls share one pool.

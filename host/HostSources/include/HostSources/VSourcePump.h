@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <vector>
 
 namespace HostSources
 {
@@ -17,6 +18,10 @@ namespace HostSources
 class VSourcePump
 {
 public:
+  /// Hands over what lies around the frame that is shown and gets back what it handed over before, to be cleared. True:
+  /// to be told to whoever looks on, as nothing else happens for the moment.
+  using VTakeAround = std::function< void( std::vector< ZEK::VFlowStateRef >&, bool ) >;
+
   VSourcePump( std::shared_ptr< IFrameSource > i_pSource, std::shared_ptr< ZEK::IFlowWritableStateCache > i_pCache,
                const VStateMaker& i_rMaker );
   /// Stops.
@@ -36,6 +41,10 @@ public:
   void Show( std::int64_t i_Index, bool i_bSeek = false );
   /// Returns when the newest frame asked for is in the cache (or failed), or the pump does not follow.
   void WaitShown();
+
+  /// In follow mode, the pump makes in the time it has left so many frames to each side of the one that is shown, those
+  /// to come first; never beside one with video, which would have to be decoded frame by frame. Before the first start.
+  void KeepAround( std::int64_t i_Frames, VTakeAround i_Take );
 
   /// Runs a function on the source while no frame is being made, on the calling thread.
   void WithSource( const std::function< void( IFrameSource& ) >& i_rFunction );

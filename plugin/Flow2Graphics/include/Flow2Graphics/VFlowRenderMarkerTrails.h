@@ -68,6 +68,7 @@ private:
   ZEK::VFlowTimeKey m_FollowedKey;
   std::unique_ptr< VTrailItems > m_pFollowed;
   std::int64_t m_KnownFrom = 0;   ///< ticks; from here to the present all was asked for
+  std::uint64_t m_Looks = 0;      ///< of the scene, when it was asked last
   std::int64_t m_FutureAsked = 0; ///< up to which the future was asked for, in the present state
   std::array< std::int64_t, 2 > m_Wanted{}, m_WantedBefore{}; ///< ticks of past and future, the most of any view, at
                                                               ///< this state and at the one before

@@ -72,6 +72,8 @@ public:
   /// The subjects of it; null before the render types are made. Thread: any.
   std::shared_ptr< VFlowRenderSubjects > Subjects() const;
   const std::vector< std::shared_ptr< IFlowRenderType > >& FlowRenderTypes() const { return m_FlowRenderTypes; }
+  /// How often it was looked for a state so far, also where that was the one that is shown already.
+  std::uint64_t Looks() const { return m_Looks; }
   /// The states that are kept of a stretch of time, in any order; none where nothing is kept. Thread: render thread.
   virtual void FetchAround( const ZEK::VFlowTimeRange& /*i_rRange*/, std::vector< ZEK::VFlowStateRef >& o_rStates )
   {
@@ -97,6 +99,7 @@ private:
   std::shared_ptr< VFlowRenderSubjects > m_pSubjects;
   ZEK::VConnection m_MeshCacheChanged;
   // What the types hold; the state is kept so that no other can be taken for it.
+  std::uint64_t m_Looks = 0;
   ZEK::VFlowStateRef m_TakenState;
   std::uint64_t m_TakenSelection = 0;
   std::atomic< bool > m_bStale{ true };
