@@ -459,3 +459,38 @@ TEST( Session, ShowsTheFrameNearestToATimeAndTakesTheUpAxisGiven )
   ASSERT_TRUE( State );
   EXPECT_EQ( State->GetKey().Frame, 120 * Session.Source()->TicksPerFrame() );
 }
+
+TEST( Session, PlaybackHasWhatLiesAroundTheFrameItShows )
+{
+  const TestSupport::VTemporaryDir Folder;
+  qputenv( "XDG_CONFIG_HOME", Folder.Path().c_str() );
+  VSession Session( {} );
+  const auto pRecording = std::make_shared< HostSources::VRecording >();
+  pRecording->FrameCount = 1000;
+  pRecording->Labels = pRecording->FileLabels = { "a" };
+  pRecording->Points.resize( 1000 );
+  Session.OpenRecording( pRecording );
+  Session.Clock().Play();
+  EXPECT_TRUE( SpinUntil(
+      [&]
+      {
+        return Session.ShownFrame() > 20;
+      } ) );
+  for ( const std::int64_t Paused : { std::int64_t( -1 ), std::int64_t( 500 ), std::int64_t( 499 ) } )
+  {
+    Session.Clock().Pause();
+    Paused < 0 ? void() : Session.Clock().SeekFrame( Paused );
+    const std::int64_t Ticks = Session.Source()->TicksPerFrame(), Shown = Session.ShownFrame();
+    const auto pCache = Session.Context()->Cache();
+    std::vector< ZEK::VFlowStateRef > Ahead;
+    ZEK::VFlowStateRef State;
+    EXPECT_TRUE( SpinUntil(
+        [&]
+        {
+          pCache->Fetch( State, 31, 2, 0 );
+          pCache->FetchMany( { { ( Shown + 1 ) * Ticks, 1, 2 }, { ( Shown + 60 ) * Ticks, Ticks, 2 } }, Ahead, 0 );
+          return State && State->GetKey().Frame == Shown * Ticks && Ahead.size() == 60;
+        } ) )
+        << Shown << ' ' << Ahead.size();
+  }
+}
