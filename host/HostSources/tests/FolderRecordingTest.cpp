@@ -206,7 +206,8 @@ TEST_F( FolderRecording, ThePersonIsFoundBesideTheBystander )
     }
   }
   EXPECT_EQ( Known, 21u );
-  const auto pKept = Read( TestSupport::RecordingsDir() / "multicam-person" / "static", ZEK::IResult::Ok, { "xyz", {} } );
+  const auto pKept =
+      Read( TestSupport::RecordingsDir() / "multicam-person" / "static", ZEK::IResult::Ok, { "xyz", {} } );
   EXPECT_THAT( m_Notes, testing::HasSubstr( "as was asked" ) );
   ExpectPoint( *pKept, 0, "RHip", -80.589, 869.695, 76.164, 1e-2 );
   const VRecordingInfo Info = DescribeRecording( *pR );

@@ -200,7 +200,8 @@ void AddRender( CLI::App& io_rApp, VRenderOptions& o_rRender )
       ->capture_default_str();
   AddPoses( io_rApp, o_rRender.Poses );
   io_rApp
-      .add_option( "--source", o_rRender.Sources, "\"simulated\" or a recording (C3D, TRC, BVH, MOT, a folder of cameras)" )
+      .add_option( "--source", o_rRender.Sources,
+                   "\"simulated\" or a recording (C3D, TRC, BVH, MOT, a folder of cameras)" )
       ->expected( 1, -1 )
       ->capture_default_str()
       ->type_name( "simulated|FILE" );

@@ -1,7 +1,7 @@
 #pragma once
 
-#include <HostSources/VReadOptions.h>
 #include <HostSources/VProgress.h>
+#include <HostSources/VReadOptions.h>
 #include <HostSources/VRecording.h>
 
 #include <ZEK/Result.h>
