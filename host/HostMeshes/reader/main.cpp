@@ -16,6 +16,9 @@ int main( int i_Count, char** i_ppArguments )
   // No picture of the memory is left behind, and no more is taken than a mesh may need.
   const rlimit NoCore{ 0, 0 };
   (void)setrlimit( RLIMIT_CORE, &NoCore );
+  // Who would end it may be gone.
+  const rlimit Time{ 120, 120 };
+  (void)setrlimit( RLIMIT_CPU, &Time );
 #ifdef HARROW_LIMIT_MEMORY
   const rlimit Memory{ 6ull << 30u, 6ull << 30u };
   (void)setrlimit( RLIMIT_AS, &Memory );

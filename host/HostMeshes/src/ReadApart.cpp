@@ -3,17 +3,21 @@
 #include "MeshBytes.h"
 
 #include <QtCore/QCoreApplication>
+#include <QtCore/QElapsedTimer>
 #include <QtCore/QProcess>
 
 namespace HostMeshes
 {
 namespace
 {
-constexpr int LongestReading = 120'000; // ms
+constexpr int LongestReading = 45'000;                          // ms; less than a picture waits for its meshes
+constexpr int LookEvery = 50;                                   // ms
+constexpr std::size_t LargestOutcome = std::size_t{ 1 } << 30u; // bytes
 } // namespace
 
 ZEK::IResult ReadMeshApart( const std::filesystem::path& i_rReader, const std::filesystem::path& i_rPath,
-                            HarrowPluginInterface::VMeshScene& o_rMesh, std::string& o_rMessage )
+                            HarrowPluginInterface::VMeshScene& o_rMesh, std::string& o_rMessage,
+                            const std::atomic< bool >* i_pStop )
 {
   o_rMesh = {};
   const auto Fail = [&]( const std::string& i_rReason )
@@ -30,11 +34,17 @@ ZEK::IResult ReadMeshApart( const std::filesystem::path& i_rReader, const std::f
   {
     return Fail( "the program that reads meshes does not start" );
   }
-  if ( !Process.waitForFinished( LongestReading ) )
+  QElapsedTimer Since;
+  Since.start();
+  while ( !Process.waitForFinished( LookEvery ) && Process.state() != QProcess::NotRunning )
   {
-    Process.kill();
-    Process.waitForFinished();
-    return Fail( "it takes too long" );
+    const bool bStop = i_pStop && *i_pStop;
+    if ( bStop || Since.hasExpired( LongestReading ) )
+    {
+      Process.kill();
+      Process.waitForFinished();
+      return Fail( bStop ? "nobody waits for it any more" : "it takes too long" );
+    }
   }
   const QByteArray Bytes = Process.readAllStandardOutput();
   VMeshOutcome Outcome;
@@ -61,7 +71,13 @@ int RunMeshReader( const std::filesystem::path& i_rPath, std::FILE* io_pOutput )
 {
   VMeshOutcome Outcome;
   Outcome.bRead = ReadMesh( i_rPath, Outcome.Mesh, Outcome.Message ).IsOk();
-  const std::vector< std::byte > Bytes = PackOutcome( Outcome );
+  std::vector< std::byte > Bytes = PackOutcome( Outcome );
+  if ( Bytes.size() > LargestOutcome )
+  {
+    Outcome = {};
+    Outcome.Message = i_rPath.filename().string() + ": it is too large to be shown";
+    Bytes = PackOutcome( Outcome );
+  }
   return std::fwrite( Bytes.data(), 1, Bytes.size(), io_pOutput ) == Bytes.size() && std::fflush( io_pOutput ) == 0 ? 0
                                                                                                                     : 1;
 }

@@ -5,6 +5,7 @@
 #include "BoneMesh.h"
 #include "MeshLog.h"
 
+#include <atomic>
 #include <condition_variable>
 #include <deque>
 #include <exception>
@@ -78,7 +79,7 @@ struct VMeshCache::VState
   std::map< std::string, VMeshRef > BuiltIns;
   std::map< std::string, VCategory > Categories;
   std::deque< VJob > Jobs;
-  bool bStopping = false;
+  std::atomic< bool > bStopping = false;
   bool bBusy = false;
   std::uint64_t ReadCount = 0;
   bool bForgetFailures = false;
@@ -118,7 +119,7 @@ void VMeshCache::VState::Run()
       std::erase_if( Files,
                      []( const auto& i_rFile )
                      {
-                       return !i_rFile.second;
+                       return !i_rFile.second || i_rFile.second.use_count() == 1;
                      } );
     }
     VMeshRef pMesh = Find( Job.Name, Folders );
@@ -177,8 +178,8 @@ VMeshCache::VMeshRef VMeshCache::VState::ReadFile( const std::filesystem::path& 
   try
   {
     auto pMesh = std::make_shared< VMeshScene >();
-    const ZEK::IResult Read =
-        Reader.empty() ? ReadMesh( i_rPath, *pMesh, Message ) : ReadMeshApart( Reader, i_rPath, *pMesh, Message );
+    const ZEK::IResult Read = Reader.empty() ? ReadMesh( i_rPath, *pMesh, Message )
+                                             : ReadMeshApart( Reader, i_rPath, *pMesh, Message, &bStopping );
     if ( Read.IsOk() )
     {
       if ( !Message.empty() )

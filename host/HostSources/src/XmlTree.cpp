@@ -20,18 +20,20 @@ std::size_t Behind( std::string_view i_Text, std::string_view i_Mark, std::size_
   return At == std::string_view::npos ? i_Text.size() : At + i_Mark.size();
 }
 
-/// The end of a tag, which a quoted value may hide.
+/// The end of a tag, which a quoted value may hide. A quote is one, as for the parser, only behind "=" and behind the
+/// name of the element.
 std::size_t BehindTag( std::string_view i_Text, std::size_t i_From )
 {
-  char Quote = 0;
-  for ( std::size_t At = i_From; At < i_Text.size(); ++At )
+  constexpr std::string_view Blanks = " \t\r\n";
+  char Quote = 0, Before = 0;
+  for ( std::size_t At = i_Text.find_first_of( " \t\r\n/>?", i_From ); At < i_Text.size(); ++At )
   {
     const char Letter = i_Text[At];
     if ( Quote != 0 )
     {
       Quote = Letter == Quote ? '\0' : Quote;
     }
-    else if ( Letter == '"' || Letter == '\'' )
+    else if ( ( Letter == '"' || Letter == '\'' ) && Before == '=' )
     {
       Quote = Letter;
     }
@@ -39,6 +41,7 @@ std::size_t BehindTag( std::string_view i_Text, std::size_t i_From )
     {
       return At + 1;
     }
+    Before = Blanks.find( Letter ) == std::string_view::npos ? Letter : Before;
   }
   return i_Text.size();
 }
@@ -77,8 +80,9 @@ void CheckDepth( std::string_view i_Text )
     }
     else
     {
-      const std::size_t End = BehindTag( i_Text, At + 1 );
-      const bool bCloses = Rest.starts_with( "</" ), bEmpty = i_Text.substr( At, End - At ).ends_with( "/>" );
+      const bool bCloses = Rest.starts_with( "</" );
+      const std::size_t End = bCloses ? Behind( i_Text, ">", At ) : BehindTag( i_Text, At + 1 );
+      const bool bEmpty = i_Text.substr( At, End - At ).ends_with( "/>" );
       Depth = bCloses ? Depth - std::min< std::size_t >( Depth, 1 ) : Depth + ( bEmpty ? 0 : 1 );
       if ( Depth > Deepest )
       {

@@ -268,6 +268,8 @@ TEST( Motion, DamagedFilesGiveTheirWholeRowsOrAReason )
   {
     Deep += "<a b='>'>";
   }
+  // A quote in a name hides nothing.
+  const std::string Quotes[] = { "<a\"" + Deep, "<a=\"x></a=\"x>" + Deep, "<a x\"='1'>" + Deep };
   std::string Far = With( Motion, "0.5 90 1", "0.5 90 1e9" );
   const std::string Tilt = "<dependent_coordinate_name>tilt</dependent_coordinate_name>",
                     Turn = "<dependent_coordinate_name>turn</dependent_coordinate_name>";
@@ -291,6 +293,9 @@ TEST( Motion, DamagedFilesGiveTheirWholeRowsOrAReason )
       { Motion, "", EndOfData, "made.osim: expected an XML element" },
       { Motion, "<a>", InvalidFormat, "made.osim: line 1: expected XML" },
       { Motion, Deep, NotSupported, "at most 200 elements within each other" },
+      { Motion, Quotes[0], NotSupported, "at most 200 elements within each other" },
+      { Motion, Quotes[1], NotSupported, "at most 200 elements within each other" },
+      { Motion, Quotes[2], NotSupported, "at most 200 elements within each other" },
       { Motion, "<!DOCTYPE a [<!ENTITY b 'c'>]><a/>", NotSupported, "a declaration of the type of document" },
       { Motion, std::string( "<a>\0</a>", 8 ), InvalidFormat, "found a zero byte" },
       { Motion, "<html/>", InvalidFormat, "the root element of a model, found \"html\"" },

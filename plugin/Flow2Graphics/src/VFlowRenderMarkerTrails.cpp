@@ -92,7 +92,7 @@ void VFlowRenderMarkerTrails::Fetch( std::int64_t i_First, std::int64_t i_Last )
   m_rFlowScene.FetchAround( { { i_First, 1, m_Key.Clock }, { i_Last, 1, m_Key.Clock } }, m_Fetched );
   for ( const ZEK::VFlowStateRef& rState : m_Fetched )
   {
-    // The state that came last at a time counts, and the present itself is known.
+    // Two states of one time are the same, and the present itself is known.
     if ( rState && !m_pHistory->Has( rState->GetKey().Frame ) )
     {
       m_pHistory->Add( rState->GetKey().Frame, VTrailItems::Of( *rState ) );

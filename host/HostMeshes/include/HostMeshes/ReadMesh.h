@@ -3,6 +3,7 @@
 #include <HarrowPluginInterface/VMeshScene.h>
 #include <ZEK/Result.h>
 
+#include <atomic>
 #include <cstddef>
 #include <cstdio>
 #include <filesystem>
@@ -29,8 +30,10 @@ ZEK::IResult ReadMesh( std::span< const std::byte > i_Bytes, const std::string& 
                        HarrowPluginInterface::VMeshScene& o_rMesh, std::string& o_rMessage );
 
 /// The same by a process of its own, the program "harrow-mesh-reader": nothing that is in a file ends this one.
+/// That process is ended soon after `i_pStop`, where there is one, became true.
 ZEK::IResult ReadMeshApart( const std::filesystem::path& i_rReader, const std::filesystem::path& i_rPath,
-                            HarrowPluginInterface::VMeshScene& o_rMesh, std::string& o_rMessage );
+                            HarrowPluginInterface::VMeshScene& o_rMesh, std::string& o_rMessage,
+                            const std::atomic< bool >* i_pStop = nullptr );
 /// That program, where it lies beside the running one; else empty. Needs the application object.
 std::filesystem::path FindMeshReader();
 /// What that program does. The result is its exit code.

@@ -14,7 +14,8 @@ namespace HostMeshes
 /// A name is a file's, with its extension, below one of its category's folders; the first folder that has it wins. One
 /// that is absolute or leaves the folder stands for nothing. A file that is not there or cannot be read is told of once
 /// in the log and left alone until the folders of its category change. Each file is read once, whatever categories ask
-/// for it. Thread: any. The destructor waits for the file that is being read.
+/// for it. Thread: any. The destructor ends the reading of a file by
+/// the reader, and waits for one that is read in this process.
 class VMeshCache final : public HarrowPluginInterface::VMeshSceneCache
 {
 public:
