@@ -240,6 +240,7 @@ void VFlowRenderSubject::PlaceMarkers( const VLabelledSet& i_rSet )
   m_Reconstructions.clear();
   if ( m_Group.Markers.empty() )
   {
+    ++m_Group.MarkerGeneration; // whoever drew markers is to forget them
     return;
   }
   PlaceByModel( bSet );
@@ -395,8 +396,11 @@ bool VFlowRenderSubject::FindFlags( const MoxelGraphics::VSelectionRegistry& i_r
     if ( Found.Count != 0 )
     {
       m_Flags.resize( i_rMembers.Count(), 0 );
-      std::fill_n( m_Flags.begin() + Found.First, Found.Count,
-                   static_cast< std::uint8_t >( rMark.Flags >> FlagShift ) );
+      // An item may be marked under its number alone and in full.
+      for ( std::uint32_t Index = Found.First; Index < Found.First + Found.Count; ++Index )
+      {
+        m_Flags[Index] |= static_cast< std::uint8_t >( rMark.Flags >> FlagShift );
+      }
     }
   }
   if ( m_Flags == io_rFlags )

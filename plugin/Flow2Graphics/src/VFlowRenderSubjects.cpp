@@ -146,7 +146,8 @@ void VFlowRenderSubjects::CollectTaken()
   for ( std::size_t Index = 0; Index < EGroupCount; ++Index )
   {
     const std::span< const std::uint8_t > Used = m_Groups[Index]->Used();
-    if ( ( Index == EGroupSolving && m_bSolvingOwn ) || Used.size() != m_Found.size() )
+    // Markers of retargeted subjects are not drawn.
+    if ( Index == EGroupRetargeting || ( Index == EGroupSolving && m_bSolvingOwn ) || Used.size() != m_Found.size() )
     {
       continue;
     }

@@ -198,6 +198,11 @@ void VSubjectSelectionMaker< Types >::Motion( const VExtractor& i_rExtractor, st
   {
     ReadMotion( *pMotion, o_rMotion );
   }
+  else if constexpr ( std::same_as< Types, VFlowSceneMeshTypes > )
+  {
+    static constexpr Rigid AtOrigin;
+    o_rMotion.pRoot = &AtOrigin; // what nothing moves stands where it was made
+  }
 }
 
 template < typename Types >

@@ -133,7 +133,10 @@ public:
     {
       m_bWritten = m_Buffer.Write( std::span( m_Instances ) );
     }
-    io_rContext.SetRenderState( io_rLook.State );
+    // What is to be found hides what lies behind it, however it is blended when it is seen.
+    CoreGraphics::VRenderState State = io_rLook.State;
+    State.depthWrite = true;
+    io_rContext.SetRenderState( State );
     for ( std::size_t Index = 0; m_bWritten && Index < m_Draws.size(); ++Index )
     {
       const std::size_t Begin = m_Draws[Index].Begin;

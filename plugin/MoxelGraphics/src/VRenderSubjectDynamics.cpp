@@ -284,7 +284,7 @@ void VRenderSubjectDynamics::RenderSeen( const VPass& i_rPass )
   }
   default:
     // Through the skin, and over it.
-    if ( bBones && rRecord.SkinXRay )
+    if ( bBones && rRecord.SkinXRay && i_rPass.rOptions.Show3DOverlay )
     {
       DrawBones( i_rPass, true );
     }
@@ -340,7 +340,8 @@ void VRenderSubjectDynamics::RenderSkins( const VPass& i_rPass )
   {
     if ( bSkin )
     {
-      rSkins.Draw( i_rPass.rContext, i_rPass.rDraw.rGroup, i_rPass.Group, false );
+      rSkins.Draw( i_rPass.rContext, i_rPass.rDraw.rGroup, i_rPass.Group, false,
+                   i_rPass.rOptions.HighlightCurrentSubject );
     }
     if ( bVisible )
     {
@@ -351,7 +352,8 @@ void VRenderSubjectDynamics::RenderSkins( const VPass& i_rPass )
   if ( i_rPass.Pass == ERenderPassTranslucent && bXRay && ( bVisible || !bSkin ) &&
        i_rPass.rContext.RenderMode() != ERenderModeSelection )
   {
-    rSkins.Draw( i_rPass.rContext, i_rPass.rDraw.rGroup, i_rPass.Group, true );
+    rSkins.Draw( i_rPass.rContext, i_rPass.rDraw.rGroup, i_rPass.Group, true,
+                 i_rPass.rOptions.HighlightCurrentSubject );
     if ( bVisible )
     {
       i_rPass.rCounts.Set( ESubjectSkins, rSkins.Counts( i_rPass.Group ).Drawn );

@@ -3,6 +3,7 @@
 #include <CoreGraphics/VRenderContext.h>
 
 #include <algorithm>
+#include <utility>
 
 namespace MoxelGraphics
 {
@@ -49,6 +50,13 @@ VVertex MakeVertex( const VMeshSurface& i_rSurface, std::size_t i_Vertex, bool i
                   } );
   Vertex.Weights = rInfluence.Weights;
   return Vertex;
+}
+
+bool IsPictureSound( const VMeshPicture& i_rPicture )
+{
+  return i_rPicture.Width > 0 && i_rPicture.Height > 0 &&
+         i_rPicture.Pixels.size() / 4 / static_cast< std::size_t >( i_rPicture.Width ) >=
+             static_cast< std::size_t >( i_rPicture.Height );
 }
 
 bool IsSurfaceSound( const VMeshScene& i_rMesh, const VMeshSurface& i_rSurface )
@@ -104,6 +112,11 @@ bool VSkinMesh::IsSound( const VMeshScene& i_rMesh )
                       [&]( const VMeshSurface& i_rSurface )
                       {
                         return IsSurfaceSound( i_rMesh, i_rSurface );
+                      } ) &&
+         std::all_of( i_rMesh.Materials.begin(), i_rMesh.Materials.end(),
+                      []( const VMeshMaterial& i_rMaterial )
+                      {
+                        return !i_rMaterial.pPicture || IsPictureSound( *i_rMaterial.pPicture );
                       } );
 }
 
@@ -181,16 +194,18 @@ void VSkinMesh::BindTexture( VRenderContext& io_rContext, VPart& io_rPart )
     rTexture.Bind( io_rContext, 0 );
     return;
   }
-  const VMeshPicture* const pPicture = io_rPart.rMaterial.pPicture.get();
+  const VMeshPicture* const pPicture = io_rPart.pTexture ? io_rPart.rMaterial.pPicture.get() : nullptr;
   const auto Stride = pPicture ? std::size_t{ 4 } * static_cast< std::size_t >( pPicture->Width ) : 4;
   const bool bWritten = pPicture ? rTexture.Write( io_rContext, ETexel::RGBA8, pPicture->Width, pPicture->Height,
                                                    pPicture->Pixels.data(), Stride )
                                  : rTexture.Write( io_rContext, ETexel::RGBA8, 1, 1, White.data(), Stride );
   if ( !bWritten )
   {
-    // Too large for this device.
-    io_rPart.pTexture.reset();
-    BindTexture( io_rContext, io_rPart );
+    // Too large for this device, white then; one that refuses a single texel refuses everything.
+    if ( std::exchange( io_rPart.pTexture, nullptr ) )
+    {
+      BindTexture( io_rContext, io_rPart );
+    }
     return;
   }
   // Pictures of meshes go on beyond their rims.

@@ -251,8 +251,8 @@ void VSubjectSkins::VState::TellUnmatched( const VSubjectRecord& i_rRecord )
   }
 }
 
-void VSubjectSkins::Draw( VRenderContext& io_rContext, const VSubjectGroup& i_rGroup, std::size_t i_Index,
-                          bool i_bXRay )
+void VSubjectSkins::Draw( VRenderContext& io_rContext, const VSubjectGroup& i_rGroup, std::size_t i_Index, bool i_bXRay,
+                          bool i_bHighlightCurrent )
 {
   VState& rState = *m_pState;
   VState::VHeld& rHeld = rState.Groups.at( i_Index );
@@ -267,7 +267,8 @@ void VSubjectSkins::Draw( VRenderContext& io_rContext, const VSubjectGroup& i_rG
     const VWornMesh::EState State = rpWorn->Pose( i_rGroup );
     rHeld.Counts.Waiting += State == VWornMesh::EState::Waiting ? 1 : 0;
     rHeld.Counts.Unmatched += State == VWornMesh::EState::Unmatched ? 1 : 0;
-    Draw.Word = ( rRecord.Id & EIdMask ) | std::uint32_t{ rRecord.Flags } << 21U;
+    const auto Shown = static_cast< std::uint8_t >( i_bHighlightCurrent ? 0xFF : ~EInstancePrimary );
+    Draw.Word = ( rRecord.Id & EIdMask ) | ( std::uint32_t{ rRecord.Flags } & Shown ) << 21U;
     const bool bPicked = Mode != ERenderModeNormal;
     if ( State != VWornMesh::EState::Posed ||
          ( bPicked && ( ( rRecord.Id & EIdMask ) == 0 || rState.rScene.IgnoreId( Draw.Word, Mode ) ) ) )
@@ -296,7 +297,8 @@ bool VSubjectSkins::VState::DrawWorn( VDraw& io_rDraw, VWornMesh& io_rWorn, bool
 
 bool VSubjectSkins::VState::DrawSkin( VDraw& io_rDraw, VWornMesh& io_rWorn )
 {
-  VSkinLook& rLook = io_rDraw.bXRay ? SkinXRay : Skin;
+  // Both looks have one program in the modes of picking, and so one memory of what it holds.
+  VSkinLook& rLook = io_rDraw.bXRay && io_rDraw.rContext.RenderMode() == ERenderModeNormal ? SkinXRay : Skin;
   VSkinUniforms* const pUniforms = rLook.Use( io_rDraw.rContext );
   if ( !pUniforms )
   {

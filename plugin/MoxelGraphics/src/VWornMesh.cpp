@@ -60,6 +60,12 @@ void VWornMesh::SetMesh( std::shared_ptr< VSkinMesh > i_pMesh, const VSubjectGro
 
 VWornMesh::EState VWornMesh::Pose( const VSubjectGroup& i_rGroup )
 {
+  // Poses by bone of the mesh may come later than it.
+  if ( m_pMesh && m_Way != EWay::ByMeshBones && m_PoseGeneration != i_rGroup.PoseGeneration &&
+       !i_rGroup.Records[m_Record].Mesh.Bones.empty() )
+  {
+    SetMesh( m_pMesh, i_rGroup );
+  }
   if ( !m_pMesh || !m_bMatched )
   {
     return m_pMesh ? EState::Unmatched : EState::Waiting;

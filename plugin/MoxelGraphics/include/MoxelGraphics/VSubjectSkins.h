@@ -42,8 +42,9 @@ public:
 
   /// The skins of one group, in the look of the context's render mode. `i_Index` is the group's place, below
   /// `GroupCount`: what is worked out from a group is kept by it until the group's generations move.
+  /// Without `i_bHighlightCurrent` the current subject looks merely selected.
   void Draw( CoreGraphics::VRenderContext& io_rContext, const VSubjectGroup& i_rGroup, std::size_t i_Index,
-             bool i_bXRay );
+             bool i_bXRay, bool i_bHighlightCurrent = true );
   /// Parts of a skin go red as their bones lose health.
   void SetHighlightMissing( bool i_bOn );
   const VCounts& Counts( std::size_t i_Index ) const;
