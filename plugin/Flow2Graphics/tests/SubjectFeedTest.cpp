@@ -283,6 +283,7 @@ TEST_F( VSubjects, SettingsSayWhoIsAPropAndWhoIsHidden )
                                 Maker.Item< FlowSceneMesh >( { "room.fbx", 8 }, "Room" ),
                                 Maker.Item< FlowSceneMeshDynamicParameters >( Place, "Room" ),
                                 Maker.Item< FlowSceneMeshSettings >( { true, 2.5F }, "Room" ),
+                                Maker.Item< FlowSceneMesh >( { "still.fbx", 7 }, "Still" ),
                                 Maker.Item< FlowSceneMesh >( { "off.fbx", 9 }, "Off" ),
                                 Maker.Item< FlowSceneMeshSettings >( { false, 1 }, "Off" ) } ) );
   EXPECT_EQ( Names( EGroupProp ), std::vector< std::string >{ "Cane" } );
@@ -291,13 +292,22 @@ TEST_F( VSubjects, SettingsSayWhoIsAPropAndWhoIsHidden )
   EXPECT_EQ( Group( EGroupProp ).Markers[0].X, 0 );
   EXPECT_EQ( Scene.Reconstructions().UnlabelledPoints().Reconstruction, std::vector< std::uint32_t >{ 1 } )
       << "the point of the hidden one does not vanish";
-  EXPECT_EQ( Names( EGroupSceneMesh ), std::vector< std::string >{ "Room" } );
+  EXPECT_EQ( Names( EGroupSceneMesh ), ( std::vector< std::string >{ "Room", "Still" } ) );
+  EXPECT_EQ( Group( EGroupSceneMesh ).Records[1].Root, MoxelGraphics::VSubjectRecord().Root ) << "nothing moves it";
   const MoxelGraphics::VSubjectRecord& rRoom = Group( EGroupSceneMesh ).Records[0];
   EXPECT_EQ( rRoom.Mesh.Name, "room.fbx" );
   EXPECT_EQ( rRoom.Mesh.Scale, 2.5F );
   EXPECT_EQ( rRoom.Mesh.AnimationTime, 1.5 );
   EXPECT_EQ( rRoom.Mesh.Bones.size(), 2u );
   EXPECT_EQ( rRoom.Root[11], 50 );
+
+  // Whoever draws markers learns that there are none any more.
+  const std::uint64_t Drawn = Group( EGroupSubject ).MarkerGeneration;
+  VSubject Bare = Person( 3, "Ada" );
+  Bare.Markers.clear();
+  Scene.Show( Maker.State( 1, { Maker.Item< FlowSubject >( Bare, "Ada" ) } ) );
+  EXPECT_TRUE( Group( EGroupSubject ).Markers.empty() && !Group( EGroupSubject ).IsEmpty() );
+  EXPECT_NE( Group( EGroupSubject ).MarkerGeneration, Drawn );
 }
 
 TEST_F( VSubjects, JointStatesPoseTheBonesAsTheirKinematicsDo )
