@@ -133,8 +133,8 @@ void VFlowRenderMarkerTrails::MarkChosen()
   for ( const auto& [rItem, Flags] : m_rScene.Registry().Marks() )
   {
     const bool bMarker = rItem.Kind == ZEK::ESelectMarker, bPoint = rItem.Kind == ZEK::ESelectReconstruction;
-    const bool bSubject = rItem.Kind == ZEK::ESelectSubject || rItem.Kind == ZEK::ESelectSegment ||
-                          rItem.Kind == ZEK::ESelectRigidObject;
+    const bool bSubject =
+        rItem.Kind == ZEK::ESelectSubject || rItem.Kind == ZEK::ESelectSegment || rItem.Kind == ZEK::ESelectRigidObject;
     if ( ( Flags & MoxelGraphics::EIdSelected ) == 0 || !( bMarker || bPoint || bSubject ) )
     {
       continue;
